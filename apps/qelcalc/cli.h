@@ -1,0 +1,41 @@
+// Small command-line helpers shared by the modes of qelcalc.
+#ifndef QELCALC_CLI_H
+#define QELCALC_CLI_H
+
+#include <map>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+namespace qelcalc {
+
+// A usage or input error: reported as one line on stderr, exit status 2.
+struct UsageError : std::runtime_error {
+  using std::runtime_error::runtime_error;
+};
+
+// Arguments split into positional words, "--name value" options and flags.
+struct Arguments {
+  std::vector<std::string> positional;
+  std::map<std::string, std::string> options;
+  std::vector<std::string> flags;
+};
+
+// flagNames lists the options that take no value (e.g. "upper").
+Arguments parseArguments(int argc, char** argv, int first,
+                         const std::vector<std::string>& flagNames);
+
+// Parses a whole string as a finite or infinite double; anything else is a
+// UsageError naming what.
+double parseNumber(const std::string& text, const std::string& what);
+
+// Reads one number per line (blank lines skipped) from a file, or from
+// standard input when path is "-".
+std::vector<double> readNumbers(const std::string& path);
+
+// Formats a result with 17 significant digits, NaN as "NaN".
+std::string formatNumber(double value);
+
+}  // namespace qelcalc
+
+#endif

@@ -1,0 +1,179 @@
+// Distribution mode: evaluates any exported density, cumulative probability
+// or inverse, on one number or on a column read from a file or stdin.
+#include "distribution_mode.h"
+
+#include <qel/distributions.h>
+
+#include <cmath>
+#include <functional>
+#include <utility>
+#include <vector>
+
+#include "cli.h"
+
+namespace qelcalc {
+
+namespace {
+
+using Values = std::vector<double>;
+
+struct Parameter {
+  std::string name;
+  double defaultValue;  // NaN: the parameter must be given
+};
+
+struct Family {
+  std::string name;
+  std::vector<Parameter> parameters;
+  std::function<double(double, const Values&)> pdf, inv;
+  std::function<double(double, const Values&, bool)> cdf;
+  std::function<void(double*, const double*, unsigned long, const Values&)> pdfArray, invArray;
+  std::function<void(double*, const double*, unsigned long, const Values&, bool)> cdfArray;
+};
+
+template <class... P>
+struct Signatures {
+  using Scalar = double (*)(double, P...);
+  using ScalarCdf = double (*)(double, P..., bool);
+  using Array = void (*)(double*, const double*, unsigned long, P...);
+  using ArrayCdf = void (*)(double*, const double*, unsigned long, P..., bool);
+};
+
+// Binds exported functions whose parameters are all doubles to the generic
+// Family interface: the parameter vector is unpacked in declaration order.
+template <std::size_t... I>
+Family bindFamily(std::string name, std::vector<Parameter> parameters,
+                  typename Signatures<decltype(static_cast<double>(I))...>::Scalar pdf,
+                  typename Signatures<decltype(static_cast<double>(I))...>::ScalarCdf cdf,
+                  typename Signatures<decltype(static_cast<double>(I))...>::Scalar inv,
+                  typename Signatures<decltype(static_cast<double>(I))...>::Array pdfArray,
+                  typename Signatures<decltype(static_cast<double>(I))...>::ArrayCdf cdfArray,
+                  typename Signatures<decltype(static_cast<double>(I))...>::Array invArray,
+                  std::index_sequence<I...>) {
+  Family f;
+  f.name = std::move(name);
+  f.parameters = std::move(parameters);
+  f.pdf = [pdf](double x, const Values& p) { return pdf(x, p[I]...); };
+  f.inv = [inv](double x, const Values& p) { return inv(x, p[I]...); };
+  f.cdf = [cdf](double x, const Values& p, bool upper) { return cdf(x, p[I]..., upper); };
+  f.pdfArray = [pdfArray](double* o, const double* x, unsigned long n, const Values& p) {
+    pdfArray(o, x, n, p[I]...);
+  };
+  f.invArray = [invArray](double* o, const double* x, unsigned long n, const Values& p) {
+    invArray(o, x, n, p[I]...);
+  };
+  f.cdfArray = [cdfArray](double* o, const double* x, unsigned long n, const Values& p,
+                          bool upper) { cdfArray(o, x, n, p[I]..., upper); };
+  return f;
+}
+
+// FAMILY(Name, "name", {params}) binds the six exported functions of Name.
+#define QELCALC_FAMILY(Name, text, N, ...)                                            \
+  bindFamily(text, __VA_ARGS__, &qel::Name##Pdf, &qel::Name##Cdf, &qel::Name##InvCdf, \
+             &qel::Name##Pdf, &qel::Name##Cdf, &qel::Name##InvCdf, std::make_index_sequence<N>())
+
+const std::vector<Family>& families() {
+  static const std::vector<Family> table = {
+      QELCALC_FAMILY(Cauchy, "cauchy", 2, {{"location", 0.0}, {"scale", 1.0}}),
+      QELCALC_FAMILY(Logistic, "logistic", 2, {{"location", 0.0}, {"scale", 1.0}}),
+      QELCALC_FAMILY(LogLogistic, "loglogistic", 3,
+                     {{"location", 0.0}, {"scale", 1.0}, {"threshold", 0.0}}),
+      QELCALC_FAMILY(Triangular, "triangular", 3, {{"lower", NAN}, {"mode", NAN}, {"upper", NAN}}),
+      QELCALC_FAMILY(Uniform, "uniform", 2, {{"lower", 0.0}, {"upper", 1.0}}),
+  };
+  return table;
+}
+
+#undef QELCALC_FAMILY
+
+const Family* findFamily(const std::string& name) {
+  for (const auto& f : families())
+    if (f.name == name) return &f;
+  return nullptr;
+}
+
+Values collectParameters(const Family& family, const Arguments& args) {
+  Values values;
+  for (const auto& p : family.parameters) {
+    const auto it = args.options.find(p.name);
+    if (it != args.options.end()) {
+      values.push_back(parseNumber(it->second, "--" + p.name));
+    } else if (std::isnan(p.defaultValue)) {
+      throw UsageError(family.name + " needs --" + p.name);
+    } else {
+      values.push_back(p.defaultValue);
+    }
+  }
+  for (const auto& option : args.options) {
+    if (option.first == "file") continue;
+    bool known = false;
+    for (const auto& p : family.parameters) known = known || p.name == option.first;
+    if (!known) throw UsageError(family.name + " has no parameter --" + option.first);
+  }
+  return values;
+}
+
+}  // namespace
+
+bool isDistributionFamily(const std::string& name) {
+  return findFamily(name) != nullptr;
+}
+
+void printDistributionUsage(std::ostream& out) {
+  out << "  qelcalc FAMILY pdf|cdf|inv [X] [--PARAM VALUE ...] [--upper] [--file PATH|-]\n"
+         "    Without X, reads one number per line from --file (or stdin) and writes one\n"
+         "    result per line. Families and parameters (default in brackets):\n";
+  for (const auto& f : families()) {
+    out << "      " << f.name << ":";
+    for (const auto& p : f.parameters) {
+      out << " --" << p.name;
+      if (!std::isnan(p.defaultValue)) out << " [" << formatNumber(p.defaultValue) << "]";
+    }
+    out << "\n";
+  }
+}
+
+int runDistributionMode(int argc, char** argv, std::ostream& out) {
+  const Arguments args = parseArguments(argc, argv, 1, {"upper"});
+  if (args.positional.size() < 2) throw UsageError("expected FAMILY and FUNCTION");
+  const Family* family = findFamily(args.positional[0]);
+  if (!family) throw UsageError("unknown family '" + args.positional[0] + "'");
+  const std::string& function = args.positional[1];
+  if (function != "pdf" && function != "cdf" && function != "inv") {
+    throw UsageError("unknown function '" + function + "' (use pdf, cdf or inv)");
+  }
+  if (args.positional.size() > 3) throw UsageError("too many arguments");
+  const bool upper = !args.flags.empty();
+  if (upper && function != "cdf") throw UsageError("--upper goes with cdf only");
+  const Values params = collectParameters(*family, args);
+
+  if (args.positional.size() == 3) {
+    if (args.options.count("file")) throw UsageError("give either X or --file, not both");
+    const double x = parseNumber(args.positional[2], "X");
+    double result;
+    if (function == "pdf") {
+      result = family->pdf(x, params);
+    } else if (function == "cdf") {
+      result = family->cdf(x, params, upper);
+    } else {
+      result = family->inv(x, params);
+    }
+    out << formatNumber(result) << "\n";
+    return 0;
+  }
+
+  const auto fileOption = args.options.find("file");
+  Values column = readNumbers(fileOption == args.options.end() ? "-" : fileOption->second);
+  // The array forms may write in place.
+  if (function == "pdf") {
+    family->pdfArray(column.data(), column.data(), column.size(), params);
+  } else if (function == "cdf") {
+    family->cdfArray(column.data(), column.data(), column.size(), params, upper);
+  } else {
+    family->invArray(column.data(), column.data(), column.size(), params);
+  }
+  for (double v : column) out << formatNumber(v) << "\n";
+  return 0;
+}
+
+}  // namespace qelcalc

@@ -1,0 +1,46 @@
+// qelcalc: a small command-line host for libqel. It registers the SIGFPE
+// handler once, as every host must, and then runs one mode per invocation.
+#include <qel/basic_types.h>
+
+#include <exception>
+#include <iostream>
+#include <string>
+
+#include "cli.h"
+#include "distribution_mode.h"
+
+namespace {
+
+void printUsage(std::ostream& out) {
+  out << "usage:\n";
+  qelcalc::printDistributionUsage(out);
+  out << "  qelcalc --help\n";
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  if (qel::RegisterLynSigfpeHandler() != qel::qelOk) {
+    std::cerr << "qelcalc: cannot install the floating-point signal handler\n";
+    return 1;
+  }
+  if (argc < 2 || std::string(argv[1]) == "--help" || std::string(argv[1]) == "-h") {
+    printUsage(argc < 2 ? std::cerr : std::cout);
+    return argc < 2 ? 2 : 0;
+  }
+  try {
+    const std::string mode = argv[1];
+    if (qelcalc::isDistributionFamily(mode))
+      return qelcalc::runDistributionMode(argc, argv, std::cout);
+    throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
+  } catch (const qelcalc::UsageError& e) {
+    std::cerr << "qelcalc: " << e.what() << "\n";
+    return 2;
+  } catch (const std::exception& e) {
+    // An exception that left the library (for instance an overflow the kernel
+    // does not catch) leaves the thread armed; restore it before reporting.
+    qel::ResetFpuStates();
+    std::cerr << "qelcalc: computation failed: " << e.what() << "\n";
+    return 1;
+  }
+}

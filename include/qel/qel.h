@@ -1,0 +1,8 @@
+// Umbrella header of libqel.
+#ifndef QEL_QEL_H
+#define QEL_QEL_H
+
+#include <qel/basic_types.h>
+#include <qel/distributions.h>
+
+#endif

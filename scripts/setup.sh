@@ -1,0 +1,17 @@
+#!/usr/bin/env bash
+# Installs what building and testing libqel needs, from Debian's packages,
+# when it is missing. Safe to run again.
+set -euo pipefail
+packages=(build-essential cmake git googletest libgtest-dev libbenchmark-dev libomp-dev
+          libboost-dev pkg-config binutils)
+missing=()
+for p in "${packages[@]}"; do
+  dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")
+done
+if [ ${#missing[@]} -gt 0 ]; then
+  echo "installing: ${missing[*]}"
+  sudo_cmd=""
+  [ "$(id -u)" -ne 0 ] && sudo_cmd="sudo"
+  $sudo_cmd apt-get update -qq
+  DEBIAN_FRONTEND=noninteractive $sudo_cmd apt-get install -y -qq "${missing[@]}"
+fi

@@ -1,0 +1,23 @@
+#!/usr/bin/env bash
+# Builds and runs the whole test suite: the normal build, the build under
+# AddressSanitizer and UndefinedBehaviorSanitizer, and a consumer project that
+# finds the installed library with find_package(qel).
+set -euo pipefail
+cd "$(dirname "$0")/.."
+scripts/setup.sh
+jobs=$(nproc)
+
+cmake -S . -B build -DQEL_BUILD_TESTS=ON >/dev/null
+cmake --build build -j"$jobs"
+(cd build && ctest --output-on-failure -j"$jobs")
+
+cmake -S . -B build-sanitize -DQEL_SANITIZE=ON -DQEL_BUILD_TESTS=ON >/dev/null
+cmake --build build-sanitize -j"$jobs"
+(cd build-sanitize && ASAN_OPTIONS=detect_leaks=0 ctest --output-on-failure -j"$jobs")
+
+rm -rf build/_install build/_consumer
+cmake --install build --prefix build/_install >/dev/null
+cmake -S tests/consumer -B build/_consumer -DCMAKE_PREFIX_PATH="$PWD/build/_install" >/dev/null
+cmake --build build/_consumer >/dev/null
+LD_LIBRARY_PATH="$PWD/build/_install/lib" build/_consumer/consumer
+echo "all test stages passed"

@@ -1,0 +1,47 @@
+// Triangular distribution on [lower, upper] with its peak at mode.
+#include <cmath>
+
+#include "utilities/Distributions.h"
+#include "utilities/SpecialFunctions.h"
+
+namespace qel {
+
+double mTriangularPdf(double x, double lower, double mode, double upper) {
+  if (x > upper || x < lower) return 0.0;
+  if (x > mode) return 2.0 * (upper - x) / ((upper - lower) * (upper - mode));
+  if (x == mode) return 2.0 / (upper - lower);
+  return 2.0 * (x - lower) / ((upper - lower) * (mode - lower));
+}
+
+// The tail on the far side of the mode is 1 - a^2/(b c) with a, b, c the
+// distances of x, the mode and the other end from the near end. It is written
+// as ((b - a) c + a (c - a)) / (b c), a sum of non-negative terms, so that it
+// keeps full relative accuracy where it is small.
+double mTriangularCdf(double x, double lower, double mode, double upper, bool upperTail) {
+  if (x <= lower) return upperTail ? 1.0 : 0.0;
+  if (x >= upper) return upperTail ? 0.0 : 1.0;
+  const double width = upper - lower;
+  if (x <= mode) {
+    const double a = x - lower;
+    const double b = mode - lower;
+    if (!upperTail) return a * a / (width * b);
+    return ((mode - x) * width + a * (upper - x)) / (width * b);
+  }
+  const double a = upper - x;
+  const double b = upper - mode;
+  if (upperTail) return a * a / (width * b);
+  return ((x - mode) * width + a * (x - lower)) / (width * b);
+}
+
+double mTriangularInvCdf(double p, double lower, double mode, double upper) {
+  if (p == 1.0) return upper;
+  const double width = upper - lower;
+  const double atMode = (mode - lower) / width;
+  // A probability outside [0, 1] meets the square root of a negative number:
+  // the checked root reports it as std::invalid_argument, as a trapped invalid
+  // operation would.
+  if (p >= atMode) return upper - mSqrt((1.0 - p) * width * (upper - mode), true);
+  return lower + mSqrt(p * width * (mode - lower), true);
+}
+
+}  // namespace qel

@@ -1,0 +1,43 @@
+# The demo host: answers on one number and on a column, and one-line errors
+# with a non-zero exit status for bad input.
+# Usage: cmake -DQELCALC=path -DWORK=dir -P check_qelcalc.cmake
+
+function(run expect_rc expect_out)
+  execute_process(COMMAND ${QELCALC} ${ARGN} OUTPUT_VARIABLE out ERROR_VARIABLE err
+                  RESULT_VARIABLE rc INPUT_FILE ${WORK}/qelcalc_input.txt)
+  if(NOT rc EQUAL expect_rc)
+    message(SEND_ERROR "qelcalc ${ARGN}: exit ${rc}, expected ${expect_rc} (${err})")
+  endif()
+  if(NOT "${out}" MATCHES "${expect_out}")
+    message(SEND_ERROR "qelcalc ${ARGN}: output '${out}' does not match '${expect_out}'")
+  endif()
+  if(NOT expect_rc EQUAL 0)
+    string(REGEX MATCHALL "\n" newlines "${err}")
+    list(LENGTH newlines n)
+    if(NOT n EQUAL 1 OR NOT err MATCHES "^qelcalc: ")
+      message(SEND_ERROR "qelcalc ${ARGN}: expected a one-line error, got '${err}'")
+    endif()
+  endif()
+endfunction()
+
+file(WRITE ${WORK}/qelcalc_input.txt "0.25\n\n0.5\n1\n")
+file(WRITE ${WORK}/qelcalc_bad.txt "0.25\nabc\n")
+
+run(0 "^0\\.5\n$" logistic cdf 0)
+run(0 "^0\\.18242552380635[0-9]*\n$" logistic cdf 1.5 --location 0 --scale 1 --upper)
+run(0 "^12\\.706204736174[0-9]*\n$" cauchy inv 0.975 --scale 1)
+run(0 "^NaN\n$" cauchy inv 1)
+run(0 "^-1\\.09861228866810[0-9]*\n0\nNaN\n$" logistic inv)
+run(0 "^-1\\.09861228866810[0-9]*\n0\nNaN\n$" logistic inv --file -)
+run(0 "^0\\.25\n0\\.5\n1\n$" uniform cdf --file ${WORK}/qelcalc_input.txt)
+run(2 "^$" triangular pdf 0.5 --lower 0 --upper 1)
+run(2 "^$" gauss cdf 1)
+run(2 "^$" logistic median 1)
+run(2 "^$" logistic cdf one)
+run(2 "^$" logistic cdf 1 --shape 2)
+run(2 "^$" logistic cdf 1 --scale)
+run(2 "^$" logistic pdf 1 --upper)
+run(2 "^$" logistic cdf --file ${WORK}/no_such_file.txt)
+run(2 "^$" logistic cdf --file ${WORK}/qelcalc_bad.txt)
+# An overflow that no kernel catches is reported, not a crash.
+run(1 "^$" loglogistic inv 0.999999999999 --scale 100)
