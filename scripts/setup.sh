@@ -2,7 +2,7 @@
 # Installs what building and testing libqel needs, from Debian's packages,
 # when it is missing. Safe to run again.
 set -euo pipefail
-packages=(build-essential cmake git googletest libgtest-dev libbenchmark-dev libomp-dev
+packages=(build-essential cmake git googletest libgtest-dev libbenchmark-dev
           libboost-dev pkg-config binutils)
 missing=()
 for p in "${packages[@]}"; do

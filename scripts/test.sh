@@ -20,4 +20,9 @@ cmake --install build --prefix build/_install >/dev/null
 cmake -S tests/consumer -B build/_consumer -DCMAKE_PREFIX_PATH="$PWD/build/_install" >/dev/null
 cmake --build build/_consumer >/dev/null
 LD_LIBRARY_PATH="$PWD/build/_install/lib" build/_consumer/consumer
+# The same consumer built through pkg-config alone.
+PKG_CONFIG_PATH="$PWD/build/_install/lib/pkgconfig" \
+  c++ -std=c++17 tests/consumer/main.cpp -o build/_consumer/consumer_pc \
+  $(PKG_CONFIG_PATH="$PWD/build/_install/lib/pkgconfig" pkg-config --cflags --libs qel)
+LD_LIBRARY_PATH="$PWD/build/_install/lib" build/_consumer/consumer_pc
 echo "all test stages passed"
