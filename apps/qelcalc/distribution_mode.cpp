@@ -120,9 +120,12 @@ bool isDistributionFamily(const std::string& name) {
 }
 
 void printDistributionUsage(std::ostream& out) {
-  out << "  qelcalc FAMILY pdf|cdf|inv [X] [--PARAM VALUE ...] [--upper] [--file PATH|-]\n"
+  out << "  qelcalc FAMILY pdf|cdf|inv [X] [--PARAM VALUE ...] [--upper|--upper-tail] [--file "
+         "PATH|-]\n"
          "    Without X, reads one number per line from --file (or stdin) and writes one\n"
-         "    result per line. Families and parameters (default in brackets):\n";
+         "    result per line. --upper (or --upper-tail, for families with a parameter\n"
+         "    named upper) gives the upper tail. Families and parameters (defaults in\n"
+         "    brackets):\n";
   for (const auto& f : families()) {
     out << "      " << f.name << ":";
     for (const auto& p : f.parameters) {
@@ -133,18 +136,28 @@ void printDistributionUsage(std::ostream& out) {
   }
 }
 
+bool hasParameter(const Family& family, const std::string& name) {
+  for (const auto& p : family.parameters)
+    if (p.name == name) return true;
+  return false;
+}
+
 int runDistributionMode(int argc, char** argv, std::ostream& out) {
-  const Arguments args = parseArguments(argc, argv, 1, {"upper"});
+  const Family* family = argc > 1 ? findFamily(argv[1]) : nullptr;
+  if (!family) throw UsageError("unknown family '" + std::string(argc > 1 ? argv[1] : "") + "'");
+  // --upper asks for the upper tail, unless the family has a parameter of that
+  // name (Triangular, Uniform); --upper-tail works everywhere.
+  std::vector<std::string> flagNames = {"upper-tail"};
+  if (!hasParameter(*family, "upper")) flagNames.push_back("upper");
+  const Arguments args = parseArguments(argc, argv, 1, flagNames);
   if (args.positional.size() < 2) throw UsageError("expected FAMILY and FUNCTION");
-  const Family* family = findFamily(args.positional[0]);
-  if (!family) throw UsageError("unknown family '" + args.positional[0] + "'");
   const std::string& function = args.positional[1];
   if (function != "pdf" && function != "cdf" && function != "inv") {
     throw UsageError("unknown function '" + function + "' (use pdf, cdf or inv)");
   }
   if (args.positional.size() > 3) throw UsageError("too many arguments");
   const bool upper = !args.flags.empty();
-  if (upper && function != "cdf") throw UsageError("--upper goes with cdf only");
+  if (upper && function != "cdf") throw UsageError("the upper tail goes with cdf only");
   const Values params = collectParameters(*family, args);
 
   if (args.positional.size() == 3) {
