@@ -5,6 +5,8 @@
 #include <qel/random.h>
 #include <sys/time.h>
 
+#include <cmath>
+
 #include "utilities/MathUtilities.h"
 
 namespace qel {

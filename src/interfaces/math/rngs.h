@@ -20,7 +20,6 @@
 #ifndef QEL_SRC_INTERFACES_MATH_RNGS_H
 #define QEL_SRC_INTERFACES_MATH_RNGS_H
 
-#include <cmath>
 #include <cstdint>
 
 namespace qel {
@@ -47,8 +46,10 @@ class CmUniformGenerator {
     const double s = static_cast<double>(mFirst) / mFirstModulus +
                      static_cast<double>(mSecond) / mSecondModulus +
                      static_cast<double>(mThird) / mThirdModulus;
-    double whole;
-    return std::modf(s, &whole);
+    // The fractional part as modf gives it: 0 <= s < 3, so the integer part
+    // converts exactly and the difference is exact. Done inline because modf
+    // is a library call that would cost as much as the rest of the draw.
+    return s - static_cast<double>(static_cast<std::int32_t>(s));
   }
 
   // New state from the clock.
