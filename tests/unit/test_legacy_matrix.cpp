@@ -8,6 +8,7 @@
 #include <algorithm>
 #include <cmath>
 #include <limits>
+#include <map>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -44,6 +45,9 @@ double factorTolerance(const std::string& name) {
 
 TEST(LegacyMatrix, CholeskyFactorsMatchHighPrecision) {
   int factors = 0, applied = 0;
+  // "apply" rows use the matrix of the "factor" row of the same name, which
+  // comes first.
+  std::map<std::string, std::vector<double>> inputs;
   for (const auto& row : qeltest::loadReferenceData("legacy_cholesky.csv", 2)) {
     const std::string& kind = row.text[0];
     const std::string& name = row.text[1];
@@ -52,6 +56,7 @@ TEST(LegacyMatrix, CholeskyFactorsMatchHighPrecision) {
     const double* data = row.numbers.data() + 1;
     if (kind == "factor") {
       ++factors;
+      inputs[name].assign(data, data + packedSize(n));
       const Symmetric a(n, data);
       const Upper u = a.CholeskyDecomp();
       ASSERT_EQ(u.order(), n);
@@ -78,13 +83,7 @@ TEST(LegacyMatrix, CholeskyFactorsMatchHighPrecision) {
       ++applied;
       const std::vector<double> z(data, data + n), mean(data + n, data + 2 * n);
       const double* expected = data + 2 * n;
-      double packed[21];
-      for (const auto& other : qeltest::loadReferenceData("legacy_cholesky.csv", 2)) {
-        if (other.text[0] == "factor" && other.text[1] == name) {
-          std::copy(other.numbers.begin() + 1, other.numbers.begin() + 1 + packedSize(n), packed);
-        }
-      }
-      const Upper u = Symmetric(n, packed).CholeskyDecomp();
+      const Upper u = Symmetric(n, inputs.at(name).data()).CholeskyDecomp();
       const std::vector<double> y = u.transpose() * z + mean;
       ASSERT_EQ(y.size(), static_cast<std::size_t>(n));
       for (int i = 0; i < n; ++i) {
