@@ -35,19 +35,8 @@ double Seeder() {
   return Seed();
 }
 
-CmUniformGenerator::CmUniformGenerator()
-    : mFirst(0),
-      mSecond(0),
-      mThird(0),
-      mPushed(0),
-      mSavedFirst(0),
-      mSavedSecond(0),
-      mSavedThird(0),
-      mFirstModulus(32363.0),
-      mSecondModulus(31727.0),
-      mThirdModulus(31657.0) {
-  mSetState(Seed());
-}
+// A seed of 0 asks for the clock, so the default generator is that one.
+CmUniformGenerator::CmUniformGenerator() : CmUniformGenerator(0.0) {}
 
 CmUniformGenerator::CmUniformGenerator(double seed)
     : mFirst(0),
