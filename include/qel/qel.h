@@ -4,5 +4,6 @@
 
 #include <qel/basic_types.h>
 #include <qel/distributions.h>
+#include <qel/order_statistics.h>
 
 #endif
