@@ -45,3 +45,14 @@ run(2 "^$" logistic cdf --file ${WORK}/no_such_file.txt)
 run(2 "^$" logistic cdf --file ${WORK}/qelcalc_bad.txt)
 # An overflow that no kernel catches is reported, not a crash.
 run(1 "^$" loglogistic inv 0.999999999999 --scale 100)
+
+# describe: summary lines of a column, from a file or stdin.
+file(WRITE ${WORK}/qelcalc_describe.txt "2\n4\n4\n4\n5\n5\n7\n9\n")
+run(0 "^n 8\nmean 5\nstddev 2\\.13808993529939[0-9]*\nskewness 0\\.8184875533567[0-9]*\nkurtosis 0\\.94062499999999[0-9]*\nsum 40\n$"
+    describe --file ${WORK}/qelcalc_describe.txt)
+run(0 "^n 3\nmean 0\\.58333333333333[0-9]*\nstddev 0\\.38188130791298[0-9]*\nskewness 0\\.93521952958282[0-9]*\nkurtosis NaN\nsum 1\\.75\n$"
+    describe)
+run(2 "^$" describe --file ${WORK}/qelcalc_bad.txt)
+run(2 "^$" describe --file ${WORK}/no_such_file.txt)
+run(2 "^$" describe 3)
+run(2 "^$" describe --upper 1)

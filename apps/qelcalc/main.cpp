@@ -7,6 +7,7 @@
 #include <string>
 
 #include "cli.h"
+#include "describe_mode.h"
 #include "distribution_mode.h"
 
 namespace {
@@ -14,6 +15,7 @@ namespace {
 void printUsage(std::ostream& out) {
   out << "usage:\n";
   qelcalc::printDistributionUsage(out);
+  qelcalc::printDescribeUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -32,6 +34,7 @@ int main(int argc, char** argv) {
     const std::string mode = argv[1];
     if (qelcalc::isDistributionFamily(mode))
       return qelcalc::runDistributionMode(argc, argv, std::cout);
+    if (mode == "describe") return qelcalc::runDescribeMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

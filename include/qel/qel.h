@@ -3,6 +3,7 @@
 #define QEL_QEL_H
 
 #include <qel/basic_types.h>
+#include <qel/descriptive.h>
 #include <qel/distributions.h>
 #include <qel/order_statistics.h>
 
