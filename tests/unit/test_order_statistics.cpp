@@ -207,3 +207,91 @@ TEST(Mode, CapacityAndFrequencyRules) {
 }
 
 }  // namespace
+
+namespace {
+
+double plainMean(std::vector<double> const& v, std::size_t from, std::size_t to) {
+  long double sum = 0.0L;
+  for (std::size_t i = from; i < to; ++i) sum += v[i];
+  return static_cast<double>(sum / static_cast<long double>(to - from));
+}
+
+// The number of observations dropped at each end follows the rounding rule
+// of each form; the input is unsorted and must stay as it was.
+TEST(TrimmedMeans, DropCountsOfTheFixedAndWholeObservationRules) {
+  for (unsigned n : {1u, 2u, 9u, 10u, 19u, 29u, 30u, 41u}) {
+    std::vector<double> sorted(n);
+    for (unsigned i = 0; i < n; ++i) sorted[i] = 1.5 * i * i - 3.0;  // uneven gaps
+    std::vector<double> x = sorted;
+    std::reverse(x.begin(), x.end());
+    std::swap(x.front(), x[n / 2]);
+    std::vector<double> original = x;
+
+    // Fixed rule: 5% rounded half up, k = 1 for n = 10, 0 for n = 9.
+    std::size_t k = static_cast<std::size_t>((5 * n + 50) / 100);
+    int status = -1;
+    double lyn = qel::v1::GetLynTrimmedMean(x.data(), n, &status);
+    EXPECT_EQ(status, 0);
+    EXPECT_NEAR(lyn, plainMean(sorted, k, n - k),
+                1e-15 * std::fabs(plainMean(sorted, 0, n)) + 1e-15)
+        << n;
+    EXPECT_EQ(x, original);
+
+    for (double trim : {0.0, 0.1, 0.25}) {
+      std::size_t drop = static_cast<std::size_t>(n * trim);  // rounded down
+      double whole = qel::v1::GetTrimmedMean(x.data(), n, trim, &status);
+      EXPECT_EQ(status, 0);
+      if (2 * drop >= n) {
+        EXPECT_TRUE(std::isnan(whole)) << n << " " << trim;
+      } else {
+        EXPECT_NEAR(whole, plainMean(sorted, drop, n - drop),
+                    1e-15 * std::fabs(plainMean(sorted, 0, n)) + 1e-15)
+            << n << " " << trim;
+      }
+    }
+  }
+  EXPECT_EQ(qel::v1::LynTrimmedMeanOnSorted(std::vector<double>{4.25}.data(), 1), 4.25);
+  const double four[] = {1.0, 2.0, 3.0, 10.0};
+  EXPECT_TRUE(std::isnan(qel::v1::TrimmedMeanOnSorted(four, 4, 0.5)));
+  EXPECT_EQ(qel::v1::TrimmedMeanOnSorted(four, 4, 0.49), 2.5);
+  EXPECT_TRUE(std::isnan(qel::v1::TrimmedMeanOnSorted(four, 4, -0.5)));
+  int status = -1;
+  EXPECT_TRUE(std::isnan(qel::v1::GetLynTrimmedMean(nullptr, 0, &status)));
+  EXPECT_EQ(status, 0);
+  status = -1;
+  EXPECT_TRUE(std::isnan(qel::v1::GetTrimmedMean(nullptr, 0, 0.1, &status)));
+  EXPECT_EQ(status, 0);
+}
+
+// Fractional end weights: with h = n*trim, g = floor(h), the observations
+// g and n-g-1 weigh 1 - (h - g), those between them 1.
+TEST(TrimmedMeans, FractionalEndWeights) {
+  std::vector<double> sorted = {-7.0, -1.0, 0.5, 2.0, 2.0, 3.0, 4.5, 8.0, 9.0, 30.0};
+  auto weighted = [&sorted](unsigned g, double w) {
+    long double sum = w * sorted[g] + w * sorted[sorted.size() - 1 - g];
+    for (std::size_t i = g + 1; i + 1 + g < sorted.size(); ++i) sum += sorted[i];
+    return static_cast<double>(sum / (sorted.size() - 2 * g - 2 + 2 * w));
+  };
+  unsigned n = static_cast<unsigned>(sorted.size());
+  EXPECT_NEAR(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.15), weighted(1, 0.5), 1e-15);
+  EXPECT_NEAR(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.375), weighted(3, 0.25), 1e-15);
+  EXPECT_NEAR(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.0), weighted(0, 1.0), 1e-15);
+  // A whole number of observations: the whole-observation mean.
+  EXPECT_NEAR(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.2),
+              qel::v1::TrimmedMeanOnSorted(sorted.data(), n, 0.2), 1e-15);
+  // Half trimmed: the middle one of an odd count, nothing of an even one.
+  EXPECT_EQ(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), 9, 0.5), 2.0);
+  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.5)));
+  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.75)));
+  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, -0.2)));
+  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, kNaN)));
+  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), 0, 0.1)));
+
+  // A large common offset: the compensated update keeps the small spread.
+  std::vector<double> offset(1001);
+  for (std::size_t i = 0; i < offset.size(); ++i) offset[i] = 1e12 + 0.001 * double(i);
+  double expected = 1e12 + 0.001 * 500.0;  // symmetric weights around the middle
+  EXPECT_NEAR(qel::v1::LynTrimmedMeanOnSorted(offset.data(), 1001, 0.1234), expected, 2e-4);
+}
+
+}  // namespace
