@@ -21,17 +21,19 @@ class DifferenceRectangle {
   DifferenceRectangle(std::vector<int> const& indexX, double const* x,
                       std::vector<int> const& cumulativeX, std::vector<int> const& indexY,
                       double const* y, std::vector<int> const& cumulativeY)
-      : indexX_(indexX),
-        x_(x),
+      : rowValues_(indexX.size()),
+        columnValues_(indexY.size()),
         cumulativeX_(cumulativeX),
-        indexY_(indexY),
-        y_(y),
-        cumulativeY_(cumulativeY) {}
+        cumulativeY_(cumulativeY) {
+    // Contiguous copies in ascending order: every round walks them all.
+    for (std::size_t i = 0; i < indexX.size(); ++i) rowValues_[i] = x[indexX[i]];
+    for (std::size_t j = 0; j < indexY.size(); ++j) columnValues_[j] = y[indexY[j]];
+  }
 
-  int rows() const { return static_cast<int>(indexX_.size()); }
-  int columns() const { return static_cast<int>(indexY_.size()); }
-  double rowValue(int i) const { return x_[indexX_[i]]; }
-  double columnValue(int j) const { return y_[indexY_[j]]; }
+  int rows() const { return static_cast<int>(rowValues_.size()); }
+  int columns() const { return static_cast<int>(columnValues_.size()); }
+  double rowValue(int i) const { return rowValues_[i]; }
+  double columnValue(int j) const { return columnValues_[j]; }
 
   long long rowWeight(int row, int right, int left) const {
     return mCalculateWeightDiff(row, right, left, cumulativeX_, cumulativeY_);
@@ -67,12 +69,21 @@ class DifferenceRectangle {
     return w;
   }
 
+  void gather(CmSelectionBounds const& b, std::vector<double>& differences,
+              std::vector<long long>& weights) const {
+    for (int i = 0; i < rows(); ++i) {
+      long long f = cumulativeX_[i] - cumulativeAt(cumulativeX_, i - 1);
+      for (int j = b.lower[i] + 1; j <= b.upper[i]; ++j) {
+        differences.push_back(columnValue(j) - rowValue(i));
+        weights.push_back(f * (cumulativeY_[j] - cumulativeAt(cumulativeY_, j - 1)));
+      }
+    }
+  }
+
  private:
-  std::vector<int> const& indexX_;
-  double const* x_;
+  std::vector<double> rowValues_;
+  std::vector<double> columnValues_;
   std::vector<int> const& cumulativeX_;
-  std::vector<int> const& indexY_;
-  double const* y_;
   std::vector<int> const& cumulativeY_;
 };
 

@@ -1,8 +1,9 @@
 // The pruning search shared by the Walsh-average and the pairwise-difference
 // selection (Johnson and Mizoguchi 1978; Monahan 1984, ACM TOMS 616). A
 // Geometry supplies the matrix: rows(), rowWeight(i, right, left),
-// rowMedian(i) (the value of the row's weighted median cell in play) and
-// bounds(pivot, tolerance), which sets the marks and answers CmBandWeights.
+// rowMedian(i) (the value of the row's weighted median cell in play),
+// bounds(pivot, tolerance), which sets the marks and answers CmBandWeights,
+// and gather(), which lists the cells in play with their weights.
 #ifndef QEL_SRC_BASIC_STATISTICS_NONPARAMETRICUTIL_SEARCH_H
 #define QEL_SRC_BASIC_STATISTICS_NONPARAMETRICUTIL_SEARCH_H
 
@@ -41,6 +42,12 @@ double medianPivot(Geometry const& g, CmSelectionBounds& b) {
   return mSelectOrderStat<long long, long long>(rank, b.rowMedians.data(), b.rowWeights);
 }
 
+// Once this few cells are left, they are listed and selected directly: the
+// last rounds of pruning would each still walk every row.
+inline double gatherLimit(int rows) {
+  return 4.0 * rows + 64.0;
+}
+
 // The k-th smallest cell in play (a value of the matrix, not halved). Each
 // round drops the side of the pivot's band that cannot hold rank k. On
 // success the cells below the band are dropped too, so that a later search
@@ -51,10 +58,21 @@ double find(Geometry const& g, CmSelectionBounds& b, double tolerance, double st
   const double nan = std::numeric_limits<double>::quiet_NaN();
   double total = cellsInPlay(g, b);
   if (!(k >= 1.0 && k <= total)) return nan;
-  bool medianChosen = !std::isfinite(startPivot);
-  double pivot = medianChosen ? medianPivot(g, b) : startPivot;
   int m = g.rows();
+  bool medianChosen = !std::isfinite(startPivot);
+  double pivot = startPivot;
   for (;;) {
+    if (total <= gatherLimit(m)) {
+      std::vector<double> values;
+      std::vector<long long> weights;
+      g.gather(b, values, weights);
+      pivot =
+          mSelectOrderStat<long long, long long>(static_cast<long long>(k), values.data(), weights);
+      if (std::isnan(pivot)) return nan;
+      g.bounds(b, pivot, tolerance);
+      break;
+    }
+    if (medianChosen) pivot = medianPivot(g, b);
     if (std::isnan(pivot)) return nan;
     CmBandWeights w = g.bounds(b, pivot, tolerance);
     double before = total;
@@ -66,16 +84,16 @@ double find(Geometry const& g, CmSelectionBounds& b, double tolerance, double st
       for (int i = 0; i < m; ++i) b.lower[i] = b.highMark[i];
       total = w.above;
     } else {
-      for (int i = 0; i < m; ++i) b.lower[i] = b.lowMark[i];
-      if (pivotOut) *pivotOut = pivot;
-      return pivot;
+      break;
     }
     // A median pivot always drops at least one cell; only data holding NaN
     // can break the order the search relies on.
     if (medianChosen && !(total < before)) return nan;
-    pivot = medianPivot(g, b);
     medianChosen = true;
   }
+  for (int i = 0; i < m; ++i) b.lower[i] = b.lowMark[i];
+  if (pivotOut) *pivotOut = pivot;
+  return pivot;
 }
 
 inline int clampColumn(int column, int low, int high) {

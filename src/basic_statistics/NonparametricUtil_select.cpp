@@ -1,9 +1,7 @@
-// Weighted selection (three-way quickselect in the manner of Hoare's FIND,
-// with Dijkstra's three-way partition), the median of three and the lower
-// bound over cumulative frequencies.
+// Weighted selection (three-way quickselect in the manner of Hoare's FIND),
+// the median of three and the lower bound over cumulative frequencies.
 #include <algorithm>
 #include <limits>
-#include <numeric>
 #include <utility>
 
 #include "basic_statistics/NonparametricUtil.h"
@@ -19,35 +17,38 @@ double mMedianOfThree(double a, double b, double c) {
 
 namespace {
 
-// A part of the index list still to be partitioned, with the ranks (a range
-// of the sorted rank list) that fall inside it and the weight below it.
+// A value with its weight. The list is partitioned in place; entries of
+// weight zero never hold a rank and are left out from the start.
+template <typename W>
+struct Weighted {
+  double value;
+  W weight;
+};
+
+// A part of the list still to be partitioned, with the ranks (a range of the
+// sorted rank list) that fall inside it and the weight below it.
 template <typename R>
 struct SelectTask {
-  std::size_t first, last;  // index list [first, last)
+  std::size_t first, last;  // items [first, last)
   std::size_t rankFirst, rankLast;
   R base;
 };
 
 // Pivot of a round: the median of three for a rank of 2 or more, which keeps
-// sorted and reversed inputs linear; for rank 1 the smallest value of
-// positive weight, which is the answer itself. False if no such value.
+// sorted and reversed inputs linear; for rank 1 the smallest value, which is
+// the answer itself.
 template <typename W>
-bool choosePivot(long double remainingRank, std::vector<std::size_t> const& idx, std::size_t first,
-                 std::size_t last, double const* values, std::vector<W> const& weights,
-                 double* pivot) {
+double choosePivot(long double remainingRank, std::vector<Weighted<W>> const& items,
+                   std::size_t first, std::size_t last) {
   if (remainingRank >= 2) {
-    *pivot = mMedianOfThree(values[idx[first]], values[idx[first + (last - 1 - first) / 2]],
-                            values[idx[last - 1]]);
-    return true;
+    return mMedianOfThree(items[first].value, items[first + (last - 1 - first) / 2].value,
+                          items[last - 1].value);
   }
-  bool found = false;
-  for (std::size_t i = first; i < last; ++i) {
-    if (weights[idx[i]] > 0 && (!found || values[idx[i]] < *pivot)) {
-      *pivot = values[idx[i]];
-      found = true;
-    }
+  double pivot = items[first].value;
+  for (std::size_t i = first + 1; i < last; ++i) {
+    if (items[i].value < pivot) pivot = items[i].value;
   }
-  return found;
+  return pivot;
 }
 
 }  // namespace
@@ -66,46 +67,56 @@ void mSelectOrderStats(std::vector<R> const& ranks, double const* values,
   std::sort(rankOrder.begin(), rankOrder.end(),
             [&ranks](std::size_t a, std::size_t b) { return ranks[a] < ranks[b]; });
 
-  std::vector<std::size_t> idx(weights.size());
-  std::iota(idx.begin(), idx.end(), std::size_t(0));
+  std::vector<Weighted<W>> items;
+  items.reserve(weights.size());
+  for (std::size_t i = 0; i < weights.size(); ++i) {
+    if (weights[i] > 0) items.push_back({values[i], weights[i]});
+  }
   std::vector<SelectTask<R>> pending;
-  pending.push_back({0, idx.size(), 0, rankOrder.size(), R(0)});
+  pending.push_back({0, items.size(), 0, rankOrder.size(), R(0)});
   while (!pending.empty()) {
     SelectTask<R> task = pending.back();
     pending.pop_back();
     if (task.rankFirst == task.rankLast || task.first == task.last) continue;
-    double pivot = 0.0;
     long double remaining = static_cast<long double>(ranks[rankOrder[task.rankFirst]]) - task.base;
-    if (!choosePivot(remaining, idx, task.first, task.last, values, weights, &pivot)) continue;
+    double pivot = choosePivot(remaining, items, task.first, task.last);
 
-    // [first, lo) below the pivot, [lo, hi) equal (and incomparable), [hi,
-    // last) above.
-    std::size_t lo = task.first, i = task.first, hi = task.last;
-    R weightBelow = 0, weightEqual = 0;
-    while (i < hi) {
-      double v = values[idx[i]];
-      if (v < pivot) {
-        weightBelow += weights[idx[i]];
-        std::swap(idx[lo++], idx[i++]);
-      } else if (v > pivot) {
-        std::swap(idx[i], idx[--hi]);
-      } else {
-        weightEqual += weights[idx[i]];
-        ++i;
-      }
+    // Three-way split in two branch-free Lomuto passes (the comparisons of
+    // a selection are unpredictable, so moving every item costs less than
+    // a mispredicted branch). First [first, lo) below the pivot.
+    std::size_t lo = task.first;
+    R weightBelow = 0;
+    for (std::size_t i = task.first; i < task.last; ++i) {
+      Weighted<W> item = items[i];
+      bool below = item.value < pivot;
+      items[i] = items[lo];
+      items[lo] = item;
+      lo += below;
+      weightBelow += below ? item.weight : W(0);
     }
     std::size_t r = task.rankFirst;
     while (r < task.rankLast && ranks[rankOrder[r]] - task.base <= weightBelow) ++r;
-    std::size_t lowerRanks = r;
+    if (r > task.rankFirst) pending.push_back({task.first, lo, task.rankFirst, r, task.base});
+    if (r == task.rankLast) continue;
+
+    // Then [lo, mid) equal to the pivot (and incomparable, such as NaN),
+    // [mid, last) above it.
+    std::size_t mid = lo;
+    R weightEqual = 0;
+    for (std::size_t i = lo; i < task.last; ++i) {
+      Weighted<W> item = items[i];
+      bool equal = !(item.value > pivot);
+      items[i] = items[mid];
+      items[mid] = item;
+      mid += equal;
+      weightEqual += equal ? item.weight : W(0);
+    }
     while (r < task.rankLast && ranks[rankOrder[r]] - task.base <= weightBelow + weightEqual) {
       result[rankOrder[r]] = pivot;
       ++r;
     }
-    if (lowerRanks > task.rankFirst) {
-      pending.push_back({task.first, lo, task.rankFirst, lowerRanks, task.base});
-    }
     if (r < task.rankLast) {
-      pending.push_back({hi, task.last, r, task.rankLast, task.base + weightBelow + weightEqual});
+      pending.push_back({mid, task.last, r, task.rankLast, task.base + weightBelow + weightEqual});
     }
   }
 }

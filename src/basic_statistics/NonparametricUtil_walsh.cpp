@@ -20,23 +20,45 @@ long long cumulativeAt(std::vector<int> const& cumulative, int i) {
   return i < 0 ? 0 : cumulative[i];
 }
 
+// Walsh averages of row `row` in columns (left, right].
+inline long long weightAvg(int row, int right, int left, std::vector<int> const& cumulative) {
+  int r = std::min(row, right);
+  if (r < 0 || r <= left) return 0;
+  long long f = frequency(cumulative, row);
+  long long weight;
+  if (f == 1) {
+    weight = cumulative[r];
+  } else if (r == row) {
+    // The diagonal cell pairs the f copies of one value with each other.
+    weight = f * cumulativeAt(cumulative, row - 1) + f * (f + 1) / 2;
+  } else {
+    weight = f * cumulative[r];
+  }
+  if (left >= 0) weight -= f * cumulative[left];
+  return weight;
+}
+
 class WalshTriangle {
  public:
+  // The values are copied in ascending order once: every round walks them
+  // all, and contiguous reads beat the scattered x[index[i]].
   WalshTriangle(std::vector<int> const& index, double const* x, std::vector<int> const& cumulative)
-      : index_(index), x_(x), cumulative_(cumulative) {}
+      : values_(index.size()), cumulative_(cumulative) {
+    for (std::size_t i = 0; i < index.size(); ++i) values_[i] = x[index[i]];
+  }
 
-  int rows() const { return static_cast<int>(index_.size()); }
-  double value(int i) const { return x_[index_[i]]; }
+  int rows() const { return static_cast<int>(values_.size()); }
+  double value(int i) const { return values_[i]; }
 
   long long rowWeight(int row, int right, int left) const {
-    return mCalculateWeightAvg(row, right, left, cumulative_);
+    return weightAvg(row, right, left, cumulative_);
   }
 
   // Sum of the row's weighted median cell among the columns in play: the
   // cell holding rank (weight + 1) / 2 counted from the left bound.
   double rowMedian(int row, CmSelectionBounds const& b) const {
     int left = b.lower[row], right = std::min(row, b.upper[row]);
-    long long target = (mCalculateWeightAvg(row, right, left, cumulative_) + 1) / 2;
+    long long target = (weightAvg(row, right, left, cumulative_) + 1) / 2;
     long long f = frequency(cumulative_, row);
     int lastOffDiagonal = std::min(right, row - 1);
     long long offDiagonal =
@@ -73,9 +95,19 @@ class WalshTriangle {
     return w;
   }
 
+  void gather(CmSelectionBounds const& b, std::vector<double>& sums,
+              std::vector<long long>& weights) const {
+    for (int i = 0; i < rows(); ++i) {
+      long long f = frequency(cumulative_, i);
+      for (int j = b.lower[i] + 1; j <= b.upper[i]; ++j) {
+        sums.push_back(value(i) + value(j));
+        weights.push_back(j == i ? f * (f + 1) / 2 : f * frequency(cumulative_, j));
+      }
+    }
+  }
+
  private:
-  std::vector<int> const& index_;
-  double const* x_;
+  std::vector<double> values_;
   std::vector<int> const& cumulative_;
 };
 
@@ -99,20 +131,7 @@ void mResetBoundsAvg(int rows, CmSelectionBounds& bounds) {
 }
 
 long long mCalculateWeightAvg(int row, int right, int left, std::vector<int> const& cumulative) {
-  int r = std::min(row, right);
-  if (r < 0 || r <= left) return 0;
-  long long f = frequency(cumulative, row);
-  long long weight;
-  if (f == 1) {
-    weight = cumulative[r];
-  } else if (r == row) {
-    // The diagonal cell pairs the f copies of one value with each other.
-    weight = f * cumulativeAt(cumulative, row - 1) + f * (f + 1) / 2;
-  } else {
-    weight = f * cumulative[r];
-  }
-  if (left >= 0) weight -= f * cumulative[left];
-  return weight;
+  return weightAvg(row, right, left, cumulative);
 }
 
 CmBandWeights mBoundsAvg(std::vector<int> const& index, double const* x,

@@ -143,8 +143,8 @@ TEST(Selection, WeightsForTheDiagonalCountPairsOfEqualValues) {
 TEST(Selection, EveryWalshAverageOfSmallTiedSamples) {
   std::mt19937 rng(7);
   for (int trial = 0; trial < 160; ++trial) {
-    int n = 1 + trial % 16;
-    std::vector<double> x = tiedSample(rng, n, 1 + trial % 5, 0.25);
+    int n = 1 + (trial % 16) * 3;  // up to 46: beyond the direct listing of few cells
+    std::vector<double> x = tiedSample(rng, n, 1 + trial % 5 * 3, 0.25);
     std::vector<double> expected = sortedWalshAverages(x);
     for (bool merge : {true, false}) {
       Compressed c = compress(x, merge);
@@ -185,9 +185,9 @@ TEST(Selection, EveryWalshAverageOfSmallTiedSamples) {
 TEST(Selection, EveryPairwiseDifferenceOfSmallTiedSamples) {
   std::mt19937 rng(11);
   for (int trial = 0; trial < 160; ++trial) {
-    int n1 = 1 + trial % 9, n2 = 1 + (trial / 9) % 11;
-    std::vector<double> x = tiedSample(rng, n1, 1 + trial % 4, 0.5);
-    std::vector<double> y = tiedSample(rng, n2, 1 + trial % 3, 0.5);
+    int n1 = 1 + (trial % 9) * 4, n2 = 1 + ((trial / 9) % 11) * 3;
+    std::vector<double> x = tiedSample(rng, n1, 1 + trial % 4 * 4, 0.5);
+    std::vector<double> y = tiedSample(rng, n2, 1 + trial % 3 * 5, 0.5);
     std::vector<double> expected = sortedDifferences(x, y);
     for (bool merge : {true, false}) {
       Compressed cx = compress(x, merge), cy = compress(y, !merge);
