@@ -1,0 +1,61 @@
+// Allocation failure in the functions that allocate scratch: they catch
+// std::bad_alloc themselves and answer 30001 with NaN outputs. The global
+// operator new of the test program is replaced so that a test can make the
+// next allocation fail.
+#include <gtest/gtest.h>
+#include <qel/basic_types.h>
+#include <qel/descriptive.h>
+
+#include <cmath>
+#include <cstdlib>
+#include <new>
+
+namespace {
+bool failNextAllocation = false;
+}  // namespace
+
+void* operator new(std::size_t size) {
+  if (failNextAllocation) {
+    failNextAllocation = false;
+    throw std::bad_alloc();
+  }
+  if (void* p = std::malloc(size ? size : 1)) return p;
+  throw std::bad_alloc();
+}
+// The replacement new takes its memory from malloc, so free is the matching
+// release; the compiler cannot see that pairing.
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wmismatched-new-delete"
+void operator delete(void* p) noexcept {
+  std::free(p);
+}
+void operator delete(void* p, std::size_t) noexcept {
+  std::free(p);
+}
+#pragma GCC diagnostic pop
+
+namespace {
+
+TEST(AllocationFailure, RankAndSpearmanReportOutOfMemory) {
+  const double x[] = {3.0, 1.0, 2.0};
+  const double y[] = {1.0, 2.0, 3.0};
+  double rank[3] = {0.0, 0.0, 0.0};
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v1::GetRank(x, 3, rank), qel::qelFailOutOfMemory);
+  failNextAllocation = false;
+  for (double r : rank) EXPECT_TRUE(std::isnan(r));
+
+  int status = -1;
+  failNextAllocation = true;
+  EXPECT_TRUE(std::isnan(qel::v1::GetSpearmanCorrelation(x, y, 3, &status)));
+  failNextAllocation = false;
+  EXPECT_EQ(status, qel::qelFailOutOfMemory);
+
+  // With memory again, the same calls succeed.
+  EXPECT_EQ(qel::v1::GetRank(x, 3, rank), qel::qelOk);
+  EXPECT_EQ(rank[0], 3.0);
+  EXPECT_EQ(qel::v1::GetSpearmanCorrelation(x, y, 3, &status), -0.5);
+  EXPECT_EQ(status, qel::qelOk);
+}
+
+}  // namespace
