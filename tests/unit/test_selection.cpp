@@ -24,7 +24,9 @@ struct Compressed {
 Compressed compress(std::vector<double> const& x, bool mergeTies) {
   std::vector<int> order(x.size());
   std::iota(order.begin(), order.end(), 0);
-  std::sort(order.begin(), order.end(), [&x](int a, int b) { return x[a] < x[b]; });
+  // NaN last, as a sort order puts it; the rest ascending.
+  std::sort(order.begin(), order.end(),
+            [&x](int a, int b) { return x[a] < x[b] || (!std::isnan(x[a]) && std::isnan(x[b])); });
   Compressed c;
   for (std::size_t k = 0; k < order.size(); ++k) {
     if (mergeTies && k > 0 && x[order[k]] == x[order[k - 1]]) {
@@ -291,6 +293,39 @@ TEST(Selection, ToleranceBandsCountNearlyEqualSums) {
   EXPECT_EQ(w.band, band);
   EXPECT_EQ(w.above, above);
   EXPECT_GT(band, 1.0);
+}
+
+// Empty and single samples, ranks out of range, and data holding NaN: the
+// search answers NaN or one of the candidates, and always returns.
+TEST(Selection, DegenerateSamplesAndNaN) {
+  std::vector<int> none;
+  qel::CmSelectionBounds bounds;
+  qel::mResetBoundsAvg(0, bounds);
+  EXPECT_TRUE(std::isnan(qel::mFinderAvg(none, nullptr, none, bounds, 0.0, 1.0, 1.0)));
+  const double one[] = {-2.5};
+  std::vector<int> index = {0}, cumulative = {1};
+  qel::mResetBoundsAvg(1, bounds);
+  EXPECT_EQ(qel::mFinderAvg(index, one, cumulative, bounds, 0.0, 7.0, 1.0), -2.5);
+  qel::mResetBoundsDiff(1, 0, bounds);
+  EXPECT_TRUE(std::isnan(
+      qel::mFinderDiff(index, one, cumulative, none, nullptr, none, bounds, 0.0, 0.0, 1.0)));
+
+  std::mt19937 rng(17);
+  std::vector<double> x = tiedSample(rng, 90, 20, 1.0);
+  for (int i = 0; i < 90; i += 7) x[i] = std::nan("");
+  std::vector<double> averages;  // unsorted: NaN has no place in an order
+  for (int i = 0; i < 90; ++i) {
+    for (int j = i; j < 90; ++j) averages.push_back((x[i] + x[j]) * 0.5);
+  }
+  Compressed c = compress(x, false);
+  for (std::size_t k = 1; k <= averages.size(); k += 97) {
+    qel::mResetBoundsAvg(90, bounds);
+    double found =
+        qel::mFinderAvg(c.index, x.data(), c.cumulative, bounds, 0.0, std::nan(""), double(k));
+    bool candidate =
+        std::isnan(found) || std::find(averages.begin(), averages.end(), found) != averages.end();
+    EXPECT_TRUE(candidate) << found;
+  }
 }
 
 }  // namespace
