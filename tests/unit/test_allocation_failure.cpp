@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <qel/basic_types.h>
 #include <qel/descriptive.h>
+#include <qel/order_statistics.h>
 
 #include <cmath>
 #include <cstdlib>
@@ -56,6 +57,47 @@ TEST(AllocationFailure, RankAndSpearmanReportOutOfMemory) {
   EXPECT_EQ(rank[0], 3.0);
   EXPECT_EQ(qel::v1::GetSpearmanCorrelation(x, y, 3, &status), -0.5);
   EXPECT_EQ(status, qel::qelOk);
+}
+
+// The order statistics that sort a copy: the copy fails, the outputs are
+// NaN (or reset) and the code or status is 30001.
+TEST(AllocationFailure, OrderStatisticsReportOutOfMemory) {
+  const double x[] = {4.0, 1.0, 4.0, 2.0};
+  const double p[] = {0.25, 0.5};
+  double q[2] = {0.0, 0.0};
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v1::GetSampleQuantiles(x, 4, 7, q, p, 2), qel::qelFailOutOfMemory);
+  failNextAllocation = false;
+  EXPECT_TRUE(std::isnan(q[0]) && std::isnan(q[1]));
+
+  int status = -1;
+  failNextAllocation = true;
+  EXPECT_TRUE(std::isnan(qel::v1::GetLynTrimmedMean(x, 4, &status)));
+  failNextAllocation = false;
+  EXPECT_EQ(status, qel::qelFailOutOfMemory);
+  status = -1;
+  failNextAllocation = true;
+  EXPECT_TRUE(std::isnan(qel::v1::GetTrimmedMean(x, 4, 0.25, &status)));
+  failNextAllocation = false;
+  EXPECT_EQ(status, qel::qelFailOutOfMemory);
+
+  double modes[2] = {0.0, 0.0};
+  unsigned count = 9, frequency = 9;
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v1::GetMode(x, 4, modes, 2, &count, &frequency), qel::qelFailOutOfMemory);
+  failNextAllocation = false;
+  EXPECT_TRUE(std::isnan(modes[0]) && std::isnan(modes[1]));
+  EXPECT_EQ(count, 0u);
+  EXPECT_EQ(frequency, 0u);
+
+  // With memory again, the same calls succeed.
+  EXPECT_EQ(qel::v1::GetSampleQuantiles(x, 4, 7, q, p, 2), qel::qelOk);
+  EXPECT_EQ(q[1], 3.0);
+  EXPECT_EQ(qel::v1::GetTrimmedMean(x, 4, 0.25, &status), 3.0);
+  EXPECT_EQ(status, qel::qelOk);
+  EXPECT_EQ(qel::v1::GetMode(x, 4, modes, 2, &count, &frequency), qel::qelOk);
+  EXPECT_EQ(modes[0], 4.0);
+  EXPECT_EQ(count, 1u);
 }
 
 }  // namespace
