@@ -6,7 +6,7 @@ beta ratio and the derivatives of the incomplete gamma integral.
 Writes, under tests/data/:
   special_unary.csv      function,x,y,expected      (y = 0 for one-argument functions)
   polygamma.csv          x,order,expected           (-1)^(k+1) psi^(k-1)(x)/(k-1)!, k = order+1
-  incomplete_gamma.csv   region,a,x,P,Q
+  incomplete_gamma.csv   region,a,x,P,Q,cond  (cond: relative condition number of P in x)
   incomplete_beta.csv    branch,a,b,x,y,I,Ic,cond,condc (y = 1 - x exactly, or 1 for tiny x;
                          cond: relative condition number of each tail in x)
   digami.csv             x,p,d1,...,d6
@@ -58,13 +58,23 @@ def unary_rows():
         lambda x, y: mpmath.log1p(x))
     add("erf", linspace(-6, 6, 121) + [1e-10, -1e-10, 0.5, 4.0, 5.79, 5.81],
         lambda x, y: mpmath.erf(x))
-    add("erfc", linspace(-6, 27, 133) + [0.5, -0.5, 4.0, -4.0, -5.59, -5.61, 26.5],
+    # erfc down to its last normal values (x^2 <= -exparg(1), about 26.6).
+    add("erfc", linspace(-6, 26.5, 131) + [0.5, -0.5, 4.0, -4.0, -5.59, -5.61, 26.6],
         lambda x, y: mpmath.erfc(x))
     add("erfcx", linspace(-5, 30, 141) + [1e2, 1e4, 1e8],
         lambda x, y: mpmath.exp(x * x) * mpmath.erfc(x))
     psix = [x for x in linspace(-3.9, 0.45, 88) if abs(x - round(x)) > 1e-3]
-    add("psi708", psix + linspace(0.5, 3, 51) + logspace(3.01, 1e15, 40) + [1e-10, -1e-10, 1.4616321449683622],
-        lambda x, y: mpmath.digamma(x))
+    # For psi708 the y column is the scale of the reflection formula,
+    # |psi(1 - x)| + |pi cot(pi x)| for x < 0.5 and |psi(x)| otherwise: its
+    # error is relative to that scale.
+    psiargs = psix + linspace(0.5, 3, 51) + logspace(3.01, 2.1e9, 40) + [1e-10, -1e-10, 1.4616321449683622]
+    for x in psiargs:
+        X = d(x)
+        if x < 0.5:
+            scale = abs(mpmath.digamma(1 - X)) + abs(mpmath.pi * mpmath.cot(mpmath.pi * X))
+        else:
+            scale = abs(mpmath.digamma(X))
+        rows.append(["psi708", float(x), float(scale), mpmath.digamma(X)])
     add("lngamma", logspace(1e-12, 1e6, 61) + linspace(0.5, 3.0, 26),
         lambda x, y: mpmath.loggamma(x))
     add("xgamma", linspace(0.1, 20, 60), lambda x, y: mpmath.gamma(x))
@@ -153,7 +163,10 @@ def gamma_rows():
         else:
             Q = mpmath.gammainc(A, X, mpmath.inf, regularized=True)
             P = 1 - Q
-        rows.append([gamma_region(float(a), float(x)), float(a), float(x), P, Q])
+        # Relative condition number of P in x: x times the density over P.
+        dens = mpmath.exp(A * mpmath.log(X) - X - mpmath.loggamma(A))
+        rows.append([gamma_region(float(a), float(x)), float(a), float(x), P, Q,
+                     mpmath.mpf(float(dens / P)) if P > 0 else mpf(0)])
     return rows
 
 
@@ -332,7 +345,7 @@ def digami_rows():
 def main():
     write_rows(os.path.join(DATA, "special_unary.csv"), "function,x,y,expected", unary_rows())
     write_rows(os.path.join(DATA, "polygamma.csv"), "x,order,expected", polygamma_rows())
-    write_rows(os.path.join(DATA, "incomplete_gamma.csv"), "region,a,x,P,Q", gamma_rows())
+    write_rows(os.path.join(DATA, "incomplete_gamma.csv"), "region,a,x,P,Q,cond", gamma_rows())
     write_rows(os.path.join(DATA, "incomplete_beta.csv"), "branch,a,b,x,y,I,Ic,cond,condc", beta_rows())
     write_rows(os.path.join(DATA, "digami.csv"), "x,p,d1,d2,d3,d4,d5,d6", digami_rows())
 
