@@ -8,8 +8,8 @@
 namespace qel {
 
 // w = I_x(a, b), w1 = 1 - w, y = 1 - x given by the caller. ierr: 0 none,
-// 1 a or b negative, 2 a = b = 0, 3 x outside [0, 1], 4 y outside [0, 1],
-// 5 x + y not 1 within 3 eps, 6 x = a = 0, 7 y = b = 0. Never throws.
+// 1 a or b negative (or NaN or infinite), 2 a = b = 0, 3 x outside [0, 1], 4 y outside [0, 1],
+// 5 x + y not 1 within 3 eps (NaN x or y: 3 or 4), 6 x = a = 0, 7 y = b = 0. Never throws.
 void BRATIO(double a, double b, double x, double y, double* w, double* w1, int* ierr);
 
 // BRATIO(a, b, x, 1 - x given as y); w, or w1 when complement is true. An

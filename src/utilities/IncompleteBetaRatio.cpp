@@ -235,7 +235,9 @@ void BRATIO(double a, double b, double x, double y, double* w, double* w1, int* 
   double eps = spmpar(1);
   *w = 0.0;
   *w1 = 0.0;
-  if (a < 0.0 || b < 0.0) {
+  // Written so that NaN fails each test (and infinite a or b counts as
+  // invalid): the series and fractions below would not end on them.
+  if (!(a >= 0.0 && b >= 0.0 && a < HUGE_VAL && b < HUGE_VAL)) {
     *ierr = 1;
     return;
   }
@@ -243,11 +245,11 @@ void BRATIO(double a, double b, double x, double y, double* w, double* w1, int* 
     *ierr = 2;
     return;
   }
-  if (x < 0.0 || x > 1.0) {
+  if (!(x >= 0.0 && x <= 1.0)) {
     *ierr = 3;
     return;
   }
-  if (y < 0.0 || y > 1.0) {
+  if (!(y >= 0.0 && y <= 1.0)) {
     *ierr = 4;
     return;
   }
