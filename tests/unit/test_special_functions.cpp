@@ -93,32 +93,38 @@ TEST(SpecialFunctions, HelpersMatchHighPrecisionValues) {
   }
 }
 
-TEST(SpecialFunctions, PolygammaOrdersZeroToFive) {
+TEST(SpecialFunctions, PolygammaOrdersZeroToFiveAndHigh) {
   const auto rows = qeltest::loadReferenceData("polygamma.csv", 0);
-  std::vector<double> worst(6, 0.0);
+  std::map<int, double> worst;
   std::vector<double> out;
   for (const auto& row : rows) {
     const double x = row.numbers[0];
     const int order = static_cast<int>(row.numbers[1]);
     const double expected = row.numbers[2];
     int nz = -1;
-    // All six orders in one call, and the highest order alone.
-    qel::mPsiDerivatives(x, 0, false, 6, out, nz);
-    ASSERT_EQ(out.size(), 6u);
-    EXPECT_EQ(nz, 0);
-    double error = qeltest::relativeError(out[order], expected);
-    if (order == 0) {
-      // -psi cancels near its zero at 1.4616: absolute there.
-      error = std::fabs(out[0] - expected) / std::max(std::fabs(expected), 1.0);
-    }
+    // -psi cancels near its zero at 1.4616: absolute there.
+    auto errorOf = [&](double actual) {
+      if (order == 0) return std::fabs(actual - expected) / std::max(std::fabs(expected), 1.0);
+      return qeltest::relativeError(actual, expected);
+    };
     qel::mPsiDerivatives(x, order, false, 1, out, nz);
-    error = std::max(error, order == 0
-                                ? std::fabs(out[0] - expected) / std::max(std::fabs(expected), 1.0)
-                                : qeltest::relativeError(out[0], expected));
+    ASSERT_EQ(out.size(), 1u);
+    double error = errorOf(out[0]);
+    if (order <= 5) {
+      // All six low orders in one call: the lower ones come from the terms
+      // of the highest.
+      qel::mPsiDerivatives(x, 0, false, 6, out, nz);
+      ASSERT_EQ(out.size(), 6u);
+      EXPECT_EQ(nz, 0);
+      error = std::max(error, errorOf(out[order]));
+    }
     worst[order] = std::max(worst[order], error);
-    EXPECT_LE(error, 1e-14) << "order " << order << " x=" << x << " line " << row.line;
+    // The factor x^-(n+1) is formed as exp(-(n+1) ln x): its rounding grows
+    // with the exponent (5e-14 at order 100, x = 80).
+    const double tolerance = 1e-14 + 2.3e-16 * (order + 1) * std::fabs(std::log(x));
+    EXPECT_LE(error, tolerance) << "order " << order << " x=" << x << " line " << row.line;
   }
-  for (int n = 0; n < 6; ++n) std::printf("  order %d: max error %.2e\n", n, worst[n]);
+  for (const auto& [n, error] : worst) std::printf("  order %3d: max error %.2e\n", n, error);
 }
 
 TEST(SpecialFunctions, DigammaAndScaledForm) {

@@ -105,6 +105,11 @@ def polygamma_rows():
             n = k - 1
             val = (-1) ** k * mpmath.polygamma(n, X) / mpmath.factorial(n)
             rows.append([float(x), n, val])
+    # A few high orders, up to the limit of 100, on both sides of xmin.
+    for x in [0.05, 0.7, 3.0, 25.0, 80.0, 400.0]:
+        for n in [10, 40, 100]:
+            val = (-1) ** (n + 1) * mpmath.polygamma(n, d(x)) / mpmath.factorial(n)
+            rows.append([float(x), n, val])
     return rows
 
 
