@@ -1,6 +1,7 @@
 // Rounding, combinatorics, the alternating-series sum and subset enumeration.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <set>
