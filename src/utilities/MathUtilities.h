@@ -6,6 +6,8 @@
 #ifndef QEL_SRC_UTILITIES_MATHUTILITIES_H
 #define QEL_SRC_UTILITIES_MATHUTILITIES_H
 
+#include <vector>
+
 namespace qel {
 
 double mGetFuzzMax(double x);
@@ -28,6 +30,88 @@ double GET_NEAREST_INTEGER(const double* x);
 double GET_FLOOR(const double* x);
 double GET_CEILING(const double* x);
 bool LEQUAL(const double* a, const double* b, const double* relative, const double* absolute);
+
+// Rounding. Powers of ten are applied in chunks of at most 1e308, so that
+// no intermediate power overflows.
+double mScaleByPowerOfTen(double x, int p);
+// Rounds to a number of decimal places, halves away from zero. The missing
+// value and 0 come back unchanged; a result beyond the double range is the
+// missing value.
+double mRound(double x, int places);
+double mRoundToSigDigits(double x, int digits);
+// Nearest multiple of m, with the sign of x; x itself when x or m is 0.
+double mRoundToMultiple(double x, double m);
+
+// Combinatorics on the logarithm of the gamma function.
+double mLogNChooseK(int n, int k);
+int mNChooseK(int n, int k);
+int mNFactorial(int n);
+double mPermutations(double n, double k);
+double mCombinations(double n, double k);
+int N_CHOOSE_K(const unsigned* n, const unsigned* k);
+
+// A term of an alternating series for mAlternateSeriesSum. operator()(k) is
+// the k-th term; the transformation averages consecutive terms, so the term
+// carries its alternating sign.
+class CmAlternateSeriesTerm {
+ public:
+  CmAlternateSeriesTerm();
+  virtual ~CmAlternateSeriesTerm();
+  virtual double operator()(int k) = 0;
+  virtual double mGetTolerance() const;
+  virtual void mEulerVan(std::vector<double>& work, int k, double* sum,
+                         CmAlternateSeriesTerm& term);
+
+ private:
+  double mTolerance;
+};
+
+// Sum of the series from index start by the Euler-van Wijngaarden
+// transformation, until two partial sums agree to the term's tolerance.
+double mAlternateSeriesSum(int start, CmAlternateSeriesTerm& term);
+
+// The k-subsets of {0, ..., n-1} in lexicographic order.
+class CmSubsetsOfNChooseK {
+ public:
+  CmSubsetsOfNChooseK();
+  CmSubsetsOfNChooseK(const CmSubsetsOfNChooseK&) = default;
+  CmSubsetsOfNChooseK& operator=(const CmSubsetsOfNChooseK&) = default;
+  virtual ~CmSubsetsOfNChooseK();
+  // Starts the enumeration; returns the number of subsets.
+  int mInitialize(int n, int k);
+  // Copies the next subset to out; leaves out alone once all were delivered.
+  void mNextSubset(std::vector<int>& out);
+
+ private:
+  std::vector<int> mSubset;
+  int mN;
+  int mK;
+  int mCount;
+  int mIndex;
+};
+
+// The k-multisets of {0, ..., n-1} as non-decreasing sequences: first the n
+// constant ones, then the others in lexicographic order.
+class CmSubsetsOfNChooseKWithReplacement {
+ public:
+  CmSubsetsOfNChooseKWithReplacement();
+  CmSubsetsOfNChooseKWithReplacement(const CmSubsetsOfNChooseKWithReplacement&) = default;
+  CmSubsetsOfNChooseKWithReplacement& operator=(const CmSubsetsOfNChooseKWithReplacement&) =
+      default;
+  virtual ~CmSubsetsOfNChooseKWithReplacement();
+  int mInitialize(int n, int k);
+  void mNextSubset(std::vector<int>& out);
+
+ private:
+  // Advances mSubset to the next non-decreasing sequence; false at the end.
+  bool mAdvance();
+
+  std::vector<int> mSubset;
+  int mN;
+  int mK;
+  int mCount;
+  int mIndex;
+};
 
 }  // namespace qel
 
