@@ -6,6 +6,7 @@ Writes to tests/data:
   elv_gamma.csv      a,x,lower,upper,density       P(a,x), Q(a,x), x^(a-1)e^-x/Gamma(a)
   elv_poisson.csv    k,m,lower,upper,mass          P(X<=k), P(X>k), P(X=k)
   elv_ncchi2.csv     x,df,L,lower,upper            noncentral chi-square tails
+  elv_arithmetic.csv function,x1,x2,x3,x4,expected   the shared arithmetic helpers
   elv_quantiles.csv  kind,p,param,q,sensitivity,fraction
                      gamma quantiles (kind gamma_lower, gamma_upper; sensitivity =
                      q f(q)/p, so that a relative error e in q moves the probability
@@ -318,11 +319,79 @@ def gen_quantiles():
     return len(rows)
 
 
+# ---------------------------------------------------------------- arithmetic
+def ln_scaled_gamma(x):
+    """ln(Gamma(x+1) (e/x)^x)."""
+    return mpmath.loggamma(x + 1) + x - x * mpmath.log(x) if x != 0 else mpf(0)
+
+
+def lnp_binomial(k, n, p):
+    return (mpmath.loggamma(n + 1) - mpmath.loggamma(k + 1) - mpmath.loggamma(n - k + 1)
+            + (k * mpmath.log(p) if k else 0) + ((n - k) * mpmath.log(1 - p) if n - k else 0))
+
+
+def lnp_hyper(k, N, M, n):
+    def lnc(a, b):
+        return mpmath.loggamma(a + 1) - mpmath.loggamma(b + 1) - mpmath.loggamma(a - b + 1)
+    return lnc(M, k) + lnc(N - M, n - k) - lnc(N, n)
+
+
+def gen_arithmetic():
+    rows = []
+
+    def add(name, args, value):
+        rows.append([name] + [float(a) for a in args] + [0.0] * (4 - len(args)) + [value])
+
+    for x in [-0.999, -0.5, -0.02, -0.01, -0.005, -1e-8, 1e-300, 1e-8, 0.003, 0.0099, 0.01,
+              0.02, 1.0, 1e10]:
+        add("logs", [x], mpmath.log1p(d(x)))
+    for x in [-662.0, -50.0, -0.5, -0.02, -0.0099, -1e-10, 1e-300, 1e-7, 0.005, 0.01, 0.02, 1.0,
+              709.0]:
+        add("exps", [x], mpmath.expm1(d(x)))
+    for x in [1e-300, 1e-10, 0.3, 1.0, 1.5, 2.0, 2.5, 9.99, 10.0, 33.3, 171.5, 1e5, 1e300]:
+        add("ln_gamma", [x], mpmath.loggamma(d(x)))
+    for x in [1e-300, 1e-8, 1e-5, 1.5e-5, 0.3, 1.0, 8.99, 9.0, 9.01, 100.0, 1e8]:
+        add("ln_scaled_gamma", [x], ln_scaled_gamma(d(x)))
+    for x in [1e-300, 2e-16, 3e-16, 0.3, 1.0, 2.5, 9.5, 10.0, 33.3, 100.5, 171.6]:
+        add("Gamma", [x], mpmath.gamma(d(x)))
+    for x in [0.0, 1e-10, 5e-5, 1e-4, 1.0001e-4, 0.01, 0.5, 1.0]:
+        X = d(x)
+        add("gammod", [x], mpmath.euler if x == 0 else (1 - mpmath.gamma(1 + X)) / X)
+    for x in [-2.5, 1e-6, 0.5, 1.0, 1.4616321449683622, 3.7, 9.99, 10.0, 50.0, 1e6]:
+        X = d(x)
+        add("psi", [x], mpmath.digamma(X))
+        add("dpsi", [x], mpmath.psi(1, X))
+        add("d2psi", [x], mpmath.psi(2, X))
+    for x in [0.0, 0.5, -1.0, 3.0, -10.0, 37.0]:
+        add("phi", [x], mpmath.npdf(d(x)))
+    for a, x in [(0.5, 2.0), (2.0, 0.5), (0.3, 0.7), (3.0, 3.0), (50.0, 60.0), (50.0, 40.0),
+                 (9e7, 9e7 + 3e4), (9e7, 9e7 - 3e4), (1e-3, 1e-200)]:
+        A, X = d(a), d(x)
+        add("lnpgamma", [a, x], (A - 1) * mpmath.log(X) - X - mpmath.loggamma(A))
+    for a, b, x in [(0.5, 0.5, 0.3), (2.0, 3.0, 0.4), (2.0, 3.0, 0.01), (0.8, 5.0, 0.9),
+                    (5.0, 0.8, 0.1), (1e6, 2e6, 0.3334), (1e6, 2e6, 0.3332), (30.0, 1.0, 0.99)]:
+        A, B, X = d(a), d(b), d(x)
+        add("lnpbeta", [a, b, x], (A - 1) * mpmath.log(X) + (B - 1) * mpmath.log(1 - X)
+            - mpmath.log(mpmath.beta(A, B)))
+    for k, m in [(0, 3.0), (1, 0.5), (5, 0.5), (3, 3.0), (10, 3.0), (100, 120.0),
+                 (94906000, 94906265.0), (1000, 1e5)]:
+        M = d(m)
+        add("lnppoisson", [k, m], k * mpmath.log(M) - M - mpmath.loggamma(k + 1))
+    for k, n, p in [(0, 10, 0.3), (10, 10, 0.3), (3, 10, 0.3), (7, 10, 0.3), (500, 1000, 0.5),
+                    (1, 1e6, 1e-3), (5000, 1e6, 1e-3)]:
+        add("lnpbinomial", [k, n, p], lnp_binomial(k, d(n), d(p)))
+    for k, N, M, n in [(0, 20, 5, 4), (4, 20, 5, 4), (2, 20, 5, 4), (500, 2000, 1000, 1000),
+                       (3, 1e6, 100, 1000)]:
+        add("lnphyper", [k, N, M, n], lnp_hyper(k, d(N), d(M), d(n)))
+    write_rows(os.path.join(DATA, "elv_arithmetic.csv"), "function,x1,x2,x3,x4,expected", rows)
+    return len(rows)
+
+
 def main():
-    which = sys.argv[1:] or ["gamma", "poisson", "ncchi2", "quantiles"]
+    which = sys.argv[1:] or ["gamma", "poisson", "ncchi2", "quantiles", "arithmetic"]
     for name in which:
         count = {"gamma": gen_gamma, "poisson": gen_poisson, "ncchi2": gen_ncchi2,
-                 "quantiles": gen_quantiles}[name]()
+                 "quantiles": gen_quantiles, "arithmetic": gen_arithmetic}[name]()
         print(name, count, "rows", flush=True)
 
 
