@@ -209,3 +209,25 @@ def main():
 
 if __name__ == "__main__":
     main()
+
+
+def demangled_names():
+    """The demangled names of the generated functions, as nm -C prints them."""
+    def t(ty):
+        return {"EAlternative": "qel::EAlternative"}.get(ty, ty)
+
+    names = []
+    for f in FAMILIES:
+        for suffix, params, var, tail in function_sets(f):
+            types = [t(ty) for ty, _ in params] + (["bool"] if tail else [])
+            names.append(f"qel::{f['name']}{suffix}({', '.join(['double'] + types)})")
+            names.append(f"qel::{f['name']}{suffix}(double*, double const*, unsigned long, "
+                         f"{', '.join(types)})")
+    d = "double const*, double const*, int"
+    for suffix, tail in (("Pdf", False), ("Cdf", True), ("InvCdf", False)):
+        extra = ", bool" if tail else ""
+        names.append(f"qel::Discrete{suffix}(double, {d}{extra})")
+        names.append(f"qel::Discrete{suffix}(double*, double const*, unsigned long, {d}{extra})")
+    for name, first, rest in PVALUES:
+        names.append(f"qel::{name}({', '.join([t(first[0])] + [t(ty) for ty, _ in rest])})")
+    return names
