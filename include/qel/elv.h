@@ -1,0 +1,99 @@
+/* High-accuracy distribution routines with an error state of their own.
+ *
+ * Every routine returns both tails, each computed in its own right (the
+ * smaller tail as a density times a scaled series, the other as its
+ * complement), so that a tail of 1e-300 keeps its relative accuracy. The
+ * routines never throw: they report through the process-wide variables below.
+ *
+ * ELVerrno    0 no errors, 1 partial loss of significance (result set to 0),
+ *             2 argument out of range, 3 invalid combination of parameters,
+ *             4 internal failure of the algorithm.
+ * ELVmethod   which branch or series produced the result (diagnostic).
+ * ELVroutine  name of the routine that last started or set ELVerrno.
+ * ELVsteps1..3 iteration counters of the last run; ELVsteps4 is reserved.
+ *
+ * The state is shared by all threads without a lock: a status read after a
+ * call may stem from another thread's run. Outputs of a run with ELVerrno of
+ * 2 or more are not to be read (quantiles then hold -DBL_MAX).
+ */
+#ifndef QEL_ELV_H
+#define QEL_ELV_H
+
+#include <qel/export.h>
+
+#ifdef __cplusplus
+#include <cstdint>
+extern "C" {
+#else
+#include <stdint.h>
+#endif
+
+/* Error state. */
+extern QEL_API int ELVerrno;
+extern QEL_API int64_t ELVmethod;
+extern QEL_API char ELVroutine[31]; /* 30 usable bytes and the terminator */
+extern QEL_API int64_t ELVsteps1;
+extern QEL_API int64_t ELVsteps2;
+extern QEL_API int64_t ELVsteps3;
+extern QEL_API int64_t ELVsteps4;
+extern QEL_API const char* const ELVerrlist[5];
+
+/* Frame: open a run (code 0, name stored); close it. Mode 'F' always stores
+ * code and name; any other mode stores them only if code exceeds ELVerrno. */
+QEL_API void ELVstartup(const char* name);
+QEL_API void ELVexit(const char* name, int code, char mode);
+QEL_API const char* ELVstrerror(int code);
+QEL_API void ELVperror(const char* prefix);
+
+/* Shared arithmetic. The C errno becomes 33 (domain) or 34 (range) where an
+ * argument is refused; ELVerrno is not touched. */
+QEL_API double logs(double x); /* log(1 + x) */
+QEL_API double exps(double x); /* exp(x) - 1 */
+QEL_API void lnpgamma(double* out, double a, double x);
+QEL_API void lnpbeta(double* out, double a, double b, double x);
+QEL_API void lnppoisson(double k, double* out, double mean);
+QEL_API void lnpbinomial(double k, double n, double* out, double prob);
+QEL_API void lnphyper(double k, double N, double M, double n, double* out);
+QEL_API double ln_gamma(double x);
+QEL_API double ln_scaled_gamma(double x); /* log(Gamma(x+1) (e/x)^x) */
+QEL_API double Gamma(double x);
+QEL_API double gammod(double x); /* (1 - Gamma(1+x))/x on [0, 1] */
+QEL_API double psi(double x);
+QEL_API double dpsi(double x);
+QEL_API double d2psi(double x);
+QEL_API double phi(double x); /* standard normal density */
+
+/* Gamma family: shape a, unit scale. Scaled series return 0 or 4. */
+QEL_API int gamma_Iax(double* out, double a, double x);
+QEL_API int gamma_Jax(double* out, double a, double x);
+QEL_API int gamma_J_complete(double* out, double x, double a);
+QEL_API double gamma_ps(double x, double a);
+QEL_API void gamma_df(double x, double a, double* lower, double* upper, double* density);
+QEL_API int gamma_newton(double* x, char mode, double target, double a);
+QEL_API void gamma_upper_quant(double p, double a, double* q);
+QEL_API void gamma_lower_quant(double p, double a, double* q);
+QEL_API void gamma_ncdf(double x, double a, double L, double* lower, double* upper);
+
+/* Chi-square: df degrees of freedom, noncentrality L. */
+QEL_API void chi2_df(double x, double df, double* lower, double* upper, double* density);
+QEL_API void chi2_ncdf(double x, double df, double L, double* lower, double* upper);
+QEL_API void chi2_upper_quant(double p, double df, double* q);
+QEL_API void chi2_lower_quant(double p, double df, double* q);
+
+/* Poisson with mean m: lower = P(X <= k), upper = P(X > k). */
+QEL_API void poisson_df(long k, double m, double* lower, double* upper, double* mass);
+QEL_API int poisson_Ik(long k, double* out, double m);
+QEL_API int poisson_Jk(long k, double* out, double m);
+QEL_API void poisson_lower_quant(long* k, double* f, double p, double m);
+QEL_API void poisson_upper_quant(long* k, double* f, double p, double m);
+
+/* Normal quantiles (positive z with upper tail p; its negative). */
+QEL_API double inv_normal_df0(double p);
+QEL_API void normal_upper_quant(double p, double* z);
+QEL_API void normal_lower_quant(double p, double* z);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif

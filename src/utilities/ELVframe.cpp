@@ -1,0 +1,74 @@
+// Error state of the high-accuracy (ELV) routines: the process-wide status
+// variables, the texts of the codes, and the frame every routine runs in.
+//
+// A routine opens its run with ELVstartup and closes it with ELVexit. Because
+// routines call one another, an inner startup wipes the caller's code; the
+// closing rule ("F" always stores, anything else only a larger code) lets an
+// outer routine that ends normally keep an inner failure standing.
+#include <qel/elv.h>
+
+#include <cstdio>
+#include <cstring>
+
+extern "C" {
+
+int ELVerrno = 0;
+int64_t ELVmethod = 0;
+char ELVroutine[31] = {0};
+int64_t ELVsteps1 = 0;
+int64_t ELVsteps2 = 0;
+int64_t ELVsteps3 = 0;
+int64_t ELVsteps4 = 0;
+
+const char* const ELVerrlist[5] = {
+    "no errors detected",
+    "partial loss of significance (result set to 0)",
+    "argument out of admissable range",
+    "invalid combination of parameters",
+    "internal failure of algorithm",
+};
+
+}  // extern "C"
+
+namespace {
+
+void storeRoutineName(const char* name) {
+  if (name == nullptr) {
+    ELVroutine[0] = '\0';
+    return;
+  }
+  std::strncpy(ELVroutine, name, sizeof ELVroutine - 1);
+  ELVroutine[sizeof ELVroutine - 1] = '\0';
+}
+
+}  // namespace
+
+extern "C" {
+
+void ELVstartup(const char* name) {
+  ELVerrno = 0;
+  storeRoutineName(name);
+}
+
+void ELVexit(const char* name, int code, char mode) {
+  if (mode == 'F' || code > ELVerrno) {
+    ELVerrno = code;
+    storeRoutineName(name);
+  }
+}
+
+// No range check: the code must be one of 0 to 4.
+const char* ELVstrerror(int code) {
+  return ELVerrlist[code];
+}
+
+void ELVperror(const char* prefix) {
+  const char* text = (ELVerrno >= 0 && ELVerrno <= 4) ? ELVerrlist[ELVerrno] : "";
+  if (prefix == nullptr) {
+    std::fprintf(stderr, "%s (issued from: %s)\n", text, ELVroutine);
+  } else {
+    std::fprintf(stderr, "%s: %s (issued from: %s)\n", prefix, text, ELVroutine);
+  }
+}
+
+}  // extern "C"

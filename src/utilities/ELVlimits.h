@@ -1,0 +1,55 @@
+// Numeric limits shared by the high-accuracy (ELV) routines, and the small
+// helpers they use to test arguments without raising a floating-point trap.
+#ifndef QEL_SRC_UTILITIES_ELVLIMITS_H
+#define QEL_SRC_UTILITIES_ELVLIMITS_H
+
+#include <cmath>
+
+namespace qel {
+namespace elv {
+
+// A logarithm below this counts as underflowed to 0.
+constexpr double kUnderflowLog = -662.34472;
+// A logarithm above this counts as overflowed (Gamma, expansions).
+constexpr double kOverflowLog = 709.78271;
+// Largest shape parameter, Poisson mean or sample size.
+constexpr double kMaxShape = 94906265.0;
+// Integer forms: admissible strictly below this.
+constexpr long kMaxCount = 94906266;
+// Largest degrees of freedom; gamma_df answers 1 above this argument.
+constexpr double kMaxDf = 189812530.0;
+// A noncentrality L needs shape + L + kWidthFactor sqrt(L) <= kMaxShape.
+constexpr double kWidthFactor = 6.1738;
+// A distribution argument below this counts as 0.
+constexpr double kTinyArgument = 2.2250738585072014e-288;
+// Term cut-off of the scaled series, relative step limit of Newton.
+constexpr double kSeriesCutoff = 1e-9;
+// Tail probability and relative stop limit of the Poisson-mixture sums.
+constexpr double kMixtureStop = 5e-10;
+// Admissible probability argument of the quantile functions.
+constexpr double kMinQuantileP = 1e-12;
+constexpr double kMaxQuantileP = 0.5;
+// Largest double; its negative marks a failed quantile.
+constexpr double kHuge = 1.7976931348623157e308;
+
+// Range tests that are false for NaN and never compare a NaN (an ordered
+// comparison with a NaN would trap in the armed floating-point state).
+inline bool isNan(double x) {
+  return std::isnan(x);
+}
+inline bool anyNan(double a, double b) {
+  return isNan(a) || isNan(b);
+}
+inline bool anyNan(double a, double b, double c) {
+  return isNan(a) || anyNan(b, c);
+}
+
+// Exponential of a logarithm that may lie below the underflow limit.
+inline double expOrZero(double logValue) {
+  return logValue < kUnderflowLog ? 0.0 : std::exp(logValue);
+}
+
+}  // namespace elv
+}  // namespace qel
+
+#endif

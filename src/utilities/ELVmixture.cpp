@@ -1,0 +1,158 @@
+// Two-stage Poisson-mixture sums (see ELVmixture.h).
+#include "utilities/ELVmixture.h"
+
+#include <qel/elv.h>
+
+#include <cmath>
+
+#include "utilities/ELVlimits.h"
+
+namespace qel {
+namespace elv {
+
+namespace {
+
+// a b for positive factors, held at the largest double instead of
+// overflowing (a ratio of huge terms only decides the direction of a walk).
+double boundedProduct(double a, double b) {
+  if (b > 1.0 && a > kHuge / b) return kHuge;
+  return a * b;
+}
+
+// w(j-1)/w(j) times F(j-1)/F(j).
+double downRatio(const MixtureComponents& components, long j, double* factor,
+                 const MixtureSettings& settings) {
+  const double weightRatio = (j + settings.weightShift) / settings.L;
+  return boundedProduct(weightRatio, components.step(j, factor));
+}
+
+// w(j+1)/w(j) times F(j+1)/F(j).
+double upRatio(const MixtureComponents& components, long j, double* factor,
+               const MixtureSettings& settings) {
+  const double weightRatio = settings.L / (j + 1.0 + settings.weightShift);
+  return boundedProduct(weightRatio, components.step(j, factor));
+}
+
+double logPeakTerm(const MixtureComponents& components, long j, double factor,
+                   const MixtureSettings& settings) {
+  double logWeight;
+  lnpgamma(&logWeight, j + 1.0 + settings.weightShift, settings.L);
+  return logWeight + components.logComponent(j, factor);
+}
+
+MixtureResult ended(MixtureResult result, MixtureEnd end, double sum) {
+  result.end = end;
+  result.sum = sum;
+  return result;
+}
+
+bool restNegligible(double ratio, double term, double sum) {
+  return ratio < 1.0 && term / (1.0 - ratio) / sum < kMixtureStop;
+}
+
+}  // namespace
+
+long descendingMixtureStart(double L) {
+  long k = 0;
+  double f = 0.0;
+  poisson_upper_quant(&k, &f, kMixtureStop, L);
+  return ELVerrno >= 2 ? -1 : k;
+}
+
+long ascendingMixtureStart(double L) {
+  long k = 0;
+  double f = 0.0;
+  poisson_lower_quant(&k, &f, kMixtureStop, L);
+  return ELVerrno >= 2 ? -1 : k;
+}
+
+MixtureResult descendingMixtureSum(const MixtureComponents& components, long k,
+                                   const MixtureSettings& settings) {
+  MixtureResult result;
+  result.start = result.peak = result.last = k;
+  if (k < 0) return ended(result, MixtureEnd::StartFailed, -1.0);
+  double factor;
+  if (components.series(k + 1, &factor) != 0) return ended(result, MixtureEnd::SeriesFailed, -1.0);
+  components.step(k + 1, &factor);
+
+  // Stage one: climb down to the peak; above holds the terms passed, in
+  // units of the current term.
+  long j = k;
+  double above = 0.0;
+  while (j > 0) {
+    double next = factor;
+    const double ratio = downRatio(components, j, &next, settings);
+    if (ratio <= 1.0) break;
+    above = (above + 1.0) / ratio;
+    factor = next;
+    --j;
+  }
+  result.peak = result.last = j;
+  const double logPeak = logPeakTerm(components, j, factor, settings);
+  if (logPeak < kUnderflowLog) return ended(result, MixtureEnd::Underflow, 0.0);
+
+  // Stage two: sum below the peak.
+  double term = std::exp(logPeak);
+  double sum = term + above * term;
+  if (sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, sum);
+  while (j > 0) {
+    const double ratio = downRatio(components, j, &factor, settings);
+    --j;
+    term *= ratio;
+    sum += term;
+    result.last = j;
+    if (sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, sum);
+    if (restNegligible(ratio, term, sum)) break;
+  }
+  return ended(result, MixtureEnd::Normal, sum);
+}
+
+MixtureResult ascendingMixtureSum(const MixtureComponents& components, long k,
+                                  const MixtureSettings& settings) {
+  MixtureResult result;
+  result.start = result.peak = result.last = k;
+  if (k < 0) return ended(result, MixtureEnd::StartFailed, -1.0);
+  double factor;
+  if (components.series(k, &factor) != 0) return ended(result, MixtureEnd::SeriesFailed, -1.0);
+
+  // Stage one: climb up to the peak; below holds the terms passed.
+  long j = k;
+  double below = 0.0;
+  for (;;) {
+    if (j >= settings.cap) {
+      result.peak = result.last = j;
+      return ended(result, MixtureEnd::CapReached, -2.0);
+    }
+    double next = factor;
+    const double ratio = upRatio(components, j, &next, settings);
+    if (ratio <= 1.0) break;
+    below = (below + 1.0) / ratio;
+    factor = next;
+    ++j;
+  }
+  result.peak = result.last = j;
+  const double logPeak = logPeakTerm(components, j, factor, settings);
+  if (logPeak < kUnderflowLog) return ended(result, MixtureEnd::Underflow, 0.0);
+
+  // Stage two: sum above the peak.
+  double term = std::exp(logPeak);
+  double sum = term + below * term;
+  if (sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, sum);
+  for (;;) {
+    if (j >= settings.cap) {
+      result.inSecondStage = true;
+      return ended(result, MixtureEnd::CapReached, -2.0);
+    }
+    const double ratio = upRatio(components, j, &factor, settings);
+    ++j;
+    term *= ratio;
+    sum += term;
+    result.last = j;
+    if (sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, sum);
+    if (restNegligible(ratio, term, sum)) break;
+  }
+  return ended(result, MixtureEnd::Normal, sum);
+}
+
+}  // namespace elv
+}  // namespace qel
