@@ -92,6 +92,11 @@ QEL_API double inv_normal_df0(double p);
 QEL_API void normal_upper_quant(double p, double* z);
 QEL_API void normal_lower_quant(double p, double* z);
 
+/* Standard normal: lower = P(Z <= x), upper = P(Z > x); inverse on
+ * [1e-100, 1]. */
+QEL_API void normal_df(double x, double* lower, double* upper);
+QEL_API void inv_normal_df(double p, double* z);
+
 #ifdef __cplusplus
 }
 #endif
