@@ -97,6 +97,23 @@ QEL_API void normal_lower_quant(double p, double* z);
 QEL_API void normal_df(double x, double* lower, double* upper);
 QEL_API void inv_normal_df(double p, double* z);
 
+/* Hypergeometric: population N, M marked, sample n; X marked in the sample.
+ * lower = P(X <= k), upper = P(X > k). Quantiles return k and the fraction f
+ * with P(X < k) + f P(X = k) = p (lower form) or P(X > k) + f P(X = k) = p
+ * (upper form). */
+QEL_API void hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                         double* lower, double* upper, double* mass);
+QEL_API void hyper_intern(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                          double* lower, double* upper, double* mass);
+QEL_API int hyper_Ik(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                     double* out);
+QEL_API int hyper_Jk(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                     double* out);
+QEL_API void hypergeo_lower_quant(unsigned long N, unsigned long M, unsigned long n,
+                                  unsigned long* k, double* f, double p);
+QEL_API void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned long n,
+                                  unsigned long* k, double* f, double p);
+
 #ifdef __cplusplus
 }
 #endif

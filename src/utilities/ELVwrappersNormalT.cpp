@@ -24,4 +24,22 @@ ElvStatus elv_inv_normal_df(double p, double* quantile) {
   return currentStatus();
 }
 
+ElvStatus elv_hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                          double* lower, double* upper, double* mass) {
+  hypergeo_df(k, N, M, n, lower, upper, mass);
+  return currentStatus();
+}
+
+ElvStatus elv_hypergeo_lower_quant(double p, unsigned long N, unsigned long M, unsigned long n,
+                                   unsigned long* k, double* fraction) {
+  hypergeo_lower_quant(N, M, n, k, fraction, p);
+  return currentStatus();
+}
+
+ElvStatus elv_hypergeo_upper_quant(double p, unsigned long N, unsigned long M, unsigned long n,
+                                   unsigned long* k, double* fraction) {
+  hypergeo_upper_quant(N, M, n, k, fraction, p);
+  return currentStatus();
+}
+
 }  // namespace qel

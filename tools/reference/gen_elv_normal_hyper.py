@@ -56,11 +56,37 @@ def gen_normal():
     write_rows(os.path.join(OUT, "elv_normal_quantiles.csv"), "p,z (P(Z > z) = p)", rows)
 
 
+def t_two_sided_by_quadrature(t, df):
+    """P(|T| > |t|) by integrating the density over log |x|."""
+    logc = (mpmath.loggamma((df + 1) / 2) - mpmath.loggamma(df / 2)
+            - mpmath.log(df * mpmath.pi) / 2)
+
+    def f(u):
+        x = mpmath.exp(u)
+        return mpmath.exp(logc - (df + 1) / 2 * mpmath.log1p(x * x / df) + u)
+
+    a = abs(t)
+    if a < 1:
+        inner = mpmath.quad(lambda x: mpmath.exp(logc - (df + 1) / 2 * mpmath.log1p(x * x / df)),
+                            [0, a])
+        return 1 - 2 * inner
+    u0 = mpmath.log(a)
+    pts = [u0 + s for s in (0, mpf(1) / 8, mpf(1) / 2, 1, 2, 4, 8, 16, 32, 64, 128, 256)]
+    return 2 * mpmath.quad(f, pts + [mpmath.inf])
+
+
+def t_two_sided(t, df):
+    x = df / (df + t * t)
+    try:
+        return mpmath.betainc(df / 2, mpf(1) / 2, 0, x, regularized=True)
+    except (mpmath.libmp.NoConvergence, ValueError):
+        return t_two_sided_by_quadrature(t, df)
+
+
 def t_lower_upper(t, df):
     t, df = d(t), d(df)
-    x = df / (df + t * t)
-    # P(|T| > |t|) = I_x(df/2, 1/2)
-    both = mpmath.betainc(df / 2, mpf(1) / 2, 0, x, regularized=True)
+    # P(|T| > |t|) = I_x(df/2, 1/2), x = df/(df + t^2)
+    both = t_two_sided(t, df)
     h = both / 2  # 60 digits: the complement keeps full double accuracy
     if t < 0:
         return h, 1 - h
@@ -87,14 +113,14 @@ def gen_t_central():
                 rows.append([repr(p), repr(df), mpf(0)])
                 continue
             # bisection on log t for P(T > t) = p
-            lo, hi = mpf(-60), mpf(2000)
-            if df < 0.01:
-                hi = mpf(30000)
+            # quantiles beyond 1e300 are not representable: skipped
+            lo, hi = mpf(-60), mpf(690)
+            if t_two_sided(mpmath.exp(hi), d(df)) / 2 > pp:
+                continue
             for _ in range(400):
                 mid = (lo + hi) / 2
                 tv = mpmath.exp(mid)
-                x = d(df) / (d(df) + tv * tv)
-                tail = mpmath.betainc(d(df) / 2, mpf(1) / 2, 0, x, regularized=True) / 2
+                tail = t_two_sided(tv, d(df)) / 2
                 if tail > pp:
                     lo = mid
                 else:
@@ -187,8 +213,8 @@ def gen_hyper():
             # upper: largest k with P(X >= k) > p; f = (p - P(X > k))/P(X = k)
             mean = mpf(n) * M / N
             sd = mpmath.sqrt(mean * (N - M) / N * (N - n) / (N - 1))
-            a = max(lo_k, int(mean - 12 * sd) - 2)
-            b = min(hi_k, int(mean + 12 * sd) + 2)
+            a = max(lo_k, int(mean - 12 * sd) - 12)
+            b = min(hi_k, int(mean + 12 * sd) + 12)
             if b - a > 400000:
                 continue
             masses = {}
