@@ -114,6 +114,13 @@ QEL_API void hypergeo_lower_quant(unsigned long N, unsigned long M, unsigned lon
 QEL_API void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned long n,
                                   unsigned long* k, double* f, double p);
 
+/* Complementary Owen's T: the integral from h to infinity of phi(x) Q(a x),
+ * a > 0; returns 0 or 4. */
+QEL_API int Tha_c(double* out, double h, double a);
+/* Far lower tail of the noncentral t at t < 0 < delta, integrated around
+ * its saddle point. */
+QEL_API double t_saddle_approx(double t, double df, double delta);
+
 #ifdef __cplusplus
 }
 #endif
