@@ -30,10 +30,10 @@ QEL_API void BetaInvCdf(double* out, const double* p, unsigned long count, doubl
 // The upper tail includes the point: P(X >= x).
 QEL_API double BinomialPdf(double x, int n, double p);
 QEL_API double BinomialCdf(double x, double n, double p, bool upperTail);
-QEL_API double BinomialInvCdf(double p, int n, double p);
+QEL_API double BinomialInvCdf(double probability, int n, double p);
 QEL_API void BinomialPdf(double* out, const double* x, unsigned long count, int n, double p);
 QEL_API void BinomialCdf(double* out, const double* x, unsigned long count, double n, double p, bool upperTail);
-QEL_API void BinomialInvCdf(double* out, const double* p, unsigned long count, int n, double p);
+QEL_API void BinomialInvCdf(double* out, const double* probability, unsigned long count, int n, double p);
 
 // Cauchy(location, scale).
 QEL_API double CauchyPdf(double x, double location, double scale);
@@ -80,10 +80,10 @@ QEL_API void GammaInvCdf(double* out, const double* p, unsigned long count, doub
 // binomial with r = 1).
 QEL_API double GeometricPdf(double x, double p);
 QEL_API double GeometricCdf(double x, double p, bool upperTail);
-QEL_API double GeometricInvCdf(double p, double p);
+QEL_API double GeometricInvCdf(double probability, double p);
 QEL_API void GeometricPdf(double* out, const double* x, unsigned long count, double p);
 QEL_API void GeometricCdf(double* out, const double* x, unsigned long count, double p, bool upperTail);
-QEL_API void GeometricInvCdf(double* out, const double* p, unsigned long count, double p);
+QEL_API void GeometricInvCdf(double* out, const double* probability, unsigned long count, double p);
 
 // Half-normal(scale) above location.
 QEL_API double HalfNormalPdf(double x, double scale, double location);
@@ -162,10 +162,10 @@ QEL_API void LogNormalInvCdf(double* out, const double* p, unsigned long count, 
 // (support starts at r).
 QEL_API double NegBinomialPdf(double x, double p, double r);
 QEL_API double NegBinomialCdf(double x, double p, double r, bool upperTail);
-QEL_API double NegBinomialInvCdf(double p, double p, double r);
+QEL_API double NegBinomialInvCdf(double probability, double p, double r);
 QEL_API void NegBinomialPdf(double* out, const double* x, unsigned long count, double p, double r);
 QEL_API void NegBinomialCdf(double* out, const double* x, unsigned long count, double p, double r, bool upperTail);
-QEL_API void NegBinomialInvCdf(double* out, const double* p, unsigned long count, double p, double r);
+QEL_API void NegBinomialInvCdf(double* out, const double* probability, unsigned long count, double p, double r);
 
 // Normal(mean, sigma).
 QEL_API double NormalPdf(double x, double mean, double sigma);

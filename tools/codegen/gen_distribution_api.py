@@ -104,10 +104,13 @@ def alist(params):
 
 def function_sets(f):
     base = f["params"]
+    inv = f.get("inv", base)
+    # The probability argument is p, unless a parameter already has that name.
+    pname = "probability" if any(n == "p" for _, n in inv) else "p"
     return [
         ("Pdf", f.get("pdf", base), "x", False),
         ("Cdf", f.get("cdf", base), "x", True),
-        ("InvCdf", f.get("inv", base), "p", False),
+        ("InvCdf", inv, pname, False),
     ]
 
 
