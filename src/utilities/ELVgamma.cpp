@@ -256,6 +256,10 @@ int gamma_newton(double* x, char mode, double target, double a) {
   double step = 0.0, scale = -1.0;
   for (long counter = 1; counter <= 35; ++counter) {
     if (std::fabs(step) < kSeriesCutoff * scale) {
+      // The last correction is below the step limit; applying it costs
+      // nothing and, Newton's convergence being quadratic, leaves an error
+      // far below it.
+      *x += step;
       ELVsteps1 = counter;
       ELVexit(name, 0, 'N');
       return 0;
@@ -278,6 +282,7 @@ int gamma_newton(double* x, char mode, double target, double a) {
     scale = *x > r ? *x : r;
   }
   if (std::fabs(step) < kSeriesCutoff * scale) {
+    *x += step;
     ELVsteps1 = 36;
     ELVexit(name, 0, 'N');
     return 0;
