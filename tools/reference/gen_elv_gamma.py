@@ -114,9 +114,17 @@ GAMMA_ABS = [1e-300, 1e-100, 1e-20, 1e-8, 1e-3, 0.05, 0.5, 1.0, 2.0, 5.0, 20.0, 
 GAMMA_REL = [1e-3, 0.1, 0.5, 0.9, 1.1, 2.0, 5.0]
 
 
+# Points where a tail is just above the underflow limit while the density is
+# below it (the fallback branches of both tails).
+GAMMA_EXTRA = {9e7: [90343423.353894278, 90343897.695543304, 89657050.987754732,
+                     89656576.646105722]}
+POISSON_EXTRA = {9e7: [90342982, 89657417]}
+
+
 def gamma_points(a):
     s = math.sqrt(max(a, 1.0))
     xs = {a + z * s for z in GAMMA_Z} | set(GAMMA_ABS) | {a * f for f in GAMMA_REL}
+    xs |= set(GAMMA_EXTRA.get(a, []))
     return sorted(x for x in xs if 0 < x <= MAX_DF)
 
 
@@ -141,7 +149,7 @@ POISSON_Z = [-40, -30, -20, -10, -5, -2, -1, 0, 1, 2, 5, 10, 20, 30, 40, 60]
 def poisson_points(m):
     s = math.sqrt(m)
     ks = {int(math.floor(m + z * s)) for z in POISSON_Z} | {0, 1, 2, 5, 10, 100, 1000}
-    ks |= {int(m + 80 * s + 400), int(3 * m + 600)}
+    ks |= {int(m + 80 * s + 400), int(3 * m + 600)} | set(POISSON_EXTRA.get(m, []))
     return sorted(k for k in ks if 0 <= k < 94906266)
 
 
