@@ -118,7 +118,8 @@ QEL_API void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned lon
  * a > 0; returns 0 or 4. */
 QEL_API int Tha_c(double* out, double h, double a);
 /* Far lower tail of the noncentral t at t < 0 < delta, integrated around
- * its saddle point. */
+ * its saddle point; -1 for arguments outside df in (0, 189812530],
+ * finite t and |delta| below 1e6. */
 QEL_API double t_saddle_approx(double t, double df, double delta);
 
 #ifdef __cplusplus

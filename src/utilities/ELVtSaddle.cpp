@@ -75,6 +75,13 @@ extern "C" {
 
 double t_saddle_approx(double t, double df, double delta) {
   ELVsteps1 = ELVsteps2 = ELVsteps3 = 0;
+  if (anyNan(t, df, delta) || !(df > 0.0 && df <= kMaxDf) || !(std::fabs(t) < kHuge) ||
+      !(std::fabs(delta) < 1e6)) {
+    return -1.0;
+  }
+  // Beyond this |t| (where the noncentral routine answers 0 or 1 outright)
+  // the squares below would overflow.
+  if (std::fabs(t) > 1e140) return t < 0.0 ? 0.0 : 1.0;
   const double sqrtDf = std::sqrt(df);
   const double x = t / sqrtDf, d = delta / sqrtDf;
   const double onePlus = 1.0 + x * x;
@@ -103,8 +110,9 @@ double t_saddle_approx(double t, double df, double delta) {
   // exp(df/2) that the scaled integrand above leaves out.
   const double halfDf = 0.5 * df;
   const double logConstant = std::log(2.0) + std::log(halfDf) - ln_scaled_gamma(halfDf);
+  if (!(sum > 0.0)) return 0.0;
   const double logResult = logConstant + f.logScale + std::log(sum);
-  if (!(sum > 0.0) || logResult < kUnderflowLog) return 0.0;
+  if (logResult < kUnderflowLog) return 0.0;
   const double result = std::exp(logResult);
   return result > 1.0 ? 1.0 : result;
 }
