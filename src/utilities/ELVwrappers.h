@@ -51,6 +51,24 @@ ElvStatus elv_hypergeo_lower_quant(double p, unsigned long N, unsigned long M, u
 ElvStatus elv_hypergeo_upper_quant(double p, unsigned long N, unsigned long M, unsigned long n,
                                    unsigned long* k, double* fraction);
 
+// Beta (shapes a, b), F (df1, df2) and binomial (n trials); outputs by
+// pointer. Binomial: lower = P(X <= k), upper = P(X > k); the quantiles
+// come with the fraction f of their defining equation.
+ElvStatus elv_beta_df(double x, double a, double b, double* lower, double* upper, double* density);
+ElvStatus elv_beta_upper_quant(double p, double a, double b, double* quantile);
+ElvStatus elv_beta_lower_quant(double p, double a, double b, double* quantile);
+ElvStatus elv_beta_ncdf(double x, double a, double b, double L, double* lower, double* upper);
+ElvStatus elv_F_df(double x, double df1, double df2, double* lower, double* upper);
+ElvStatus elv_F_ncdf(double x, double df1, double df2, double L, double* lower, double* upper);
+ElvStatus elv_F_upper_quant(double p, double df1, double df2, double* quantile);
+ElvStatus elv_F_lower_quant(double p, double df1, double df2, double* quantile);
+ElvStatus elv_binomial_df(unsigned long k, unsigned long n, double prob, double* lower,
+                          double* upper, double* mass);
+ElvStatus elv_binomial_lower_quant(double p, unsigned long n, double prob, unsigned long* k,
+                                   double* fraction);
+ElvStatus elv_binomial_upper_quant(double p, unsigned long n, double prob, unsigned long* k,
+                                   double* fraction);
+
 }  // namespace qel
 
 #endif
