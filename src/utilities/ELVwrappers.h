@@ -43,6 +43,10 @@ ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long& k, doubl
 // Normal, t, noncentral t and hypergeometric: outputs through pointers.
 ElvStatus elv_normal_df(double x, double* lower, double* upper);
 ElvStatus elv_inv_normal_df(double p, double* quantile);
+ElvStatus elv_t_df(double t, double df, double* lower, double* upper);
+ElvStatus elv_t_ncdf(double t, double df, double delta, double* lower, double* upper);
+ElvStatus elv_t_upper_quant(double p, double df, double* quantile);
+ElvStatus elv_t_lower_quant(double p, double df, double* quantile);
 // Hypergeometric: lower = P(X <= k), upper = P(X > k).
 ElvStatus elv_hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
                           double* lower, double* upper, double* mass);

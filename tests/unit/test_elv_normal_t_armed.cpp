@@ -29,6 +29,12 @@ TEST(ElvNormalTFamily, BadArgumentsDoNotTrapWhenArmed) {
         a = t_saddle_approx(u, v, 2.0);
         a = t_saddle_approx(-1.0, u, v);
         hypergeo_df(3, 10, 4, 5, &a, &b, &c);
+        t_df(u, v, &a, &b);
+        t_ncdf(u, v, 2.0, &a, &b);
+        t_ncdf(u, 3.0, v, &a, &b);
+        t_ncdf(-1.0, u, v, &a, &b);
+        t_upper_quant(u, v, &a);
+        t_lower_quant(u, v, &a);
         hypergeo_lower_quant(1000, 300, 200, &k, &a, u);
         hypergeo_upper_quant(1000, 700, 200, &k, &a, u);
         ++runs;
