@@ -44,7 +44,9 @@ class GammaUpperTails : public MixtureComponents {
   GammaUpperTails(double a, double x) : a_(a), x_(x) {}
   int series(long j, double* factor) const override { return gamma_Jax(factor, a_ + j, x_); }
   double step(long j, double* factor) const override {
-    const double ratio = x_ / ((a_ + j) * *factor) + 1.0;
+    // For a tiny shape Q(a+1,x)/Q(a,x) is about 1/a: held finite.
+    const double scaled = (a_ + j) * *factor;
+    const double ratio = scaled > x_ * 1e-300 ? x_ / scaled + 1.0 : kHuge;
     *factor = 1.0 + (a_ + j) / x_ * *factor;
     return ratio;
   }
