@@ -92,6 +92,43 @@ QEL_API double inv_normal_df0(double p);
 QEL_API void normal_upper_quant(double p, double* z);
 QEL_API void normal_lower_quant(double p, double* z);
 
+/* Standard normal: lower = P(Z <= x), upper = P(Z > x); inverse on
+ * [1e-100, 1]. */
+QEL_API void normal_df(double x, double* lower, double* upper);
+QEL_API void inv_normal_df(double p, double* z);
+
+/* Hypergeometric: population N, M marked, sample n; X marked in the sample.
+ * lower = P(X <= k), upper = P(X > k). Quantiles return k and the fraction f
+ * with P(X < k) + f P(X = k) = p (lower form) or P(X > k) + f P(X = k) = p
+ * (upper form). */
+QEL_API void hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                         double* lower, double* upper, double* mass);
+QEL_API void hyper_intern(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                          double* lower, double* upper, double* mass);
+QEL_API int hyper_Ik(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                     double* out);
+QEL_API int hyper_Jk(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                     double* out);
+QEL_API void hypergeo_lower_quant(unsigned long N, unsigned long M, unsigned long n,
+                                  unsigned long* k, double* f, double p);
+QEL_API void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned long n,
+                                  unsigned long* k, double* f, double p);
+
+/* Student t with df degrees of freedom and noncentrality delta:
+ * lower = P(T <= t), upper = P(T > t). Quantiles for p in [1e-12, 0.5] and
+ * df in [0.002, 189812530]. */
+QEL_API void t_df(double t, double df, double* lower, double* upper);
+QEL_API void t_upper_quant(double p, double df, double* q);
+QEL_API void t_lower_quant(double p, double df, double* q);
+QEL_API void t_ncdf(double t, double df, double delta, double* lower, double* upper);
+/* Complementary Owen's T: the integral from h to infinity of phi(x) Q(a x),
+ * a > 0; returns 0 or 4. */
+QEL_API int Tha_c(double* out, double h, double a);
+/* Far lower tail of the noncentral t at t < 0 < delta, integrated around
+ * its saddle point; -1 for arguments outside df in (0, 189812530],
+ * finite t and |delta| below 1e6. */
+QEL_API double t_saddle_approx(double t, double df, double delta);
+
 /* Beta family: shapes a, b; lower = I_x(a,b), upper = 1 - I_x(a,b). The
  * scaled series return 0 or 4: I_x(a,b) = density * beta_Iabx,
  * 1 - I_x(a,b) = density (1-x)/b * beta_Jabx. */

@@ -40,6 +40,21 @@ ElvStatus elv_poisson_df(unsigned long k, double mean, double& lower, double& up
 ElvStatus elv_poisson_lower_quant(double p, double mean, unsigned long& k, double& fraction);
 ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long& k, double& fraction);
 
+// Normal, t, noncentral t and hypergeometric: outputs through pointers.
+ElvStatus elv_normal_df(double x, double* lower, double* upper);
+ElvStatus elv_inv_normal_df(double p, double* quantile);
+ElvStatus elv_t_df(double t, double df, double* lower, double* upper);
+ElvStatus elv_t_ncdf(double t, double df, double delta, double* lower, double* upper);
+ElvStatus elv_t_upper_quant(double p, double df, double* quantile);
+ElvStatus elv_t_lower_quant(double p, double df, double* quantile);
+// Hypergeometric: lower = P(X <= k), upper = P(X > k).
+ElvStatus elv_hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                          double* lower, double* upper, double* mass);
+ElvStatus elv_hypergeo_lower_quant(double p, unsigned long N, unsigned long M, unsigned long n,
+                                   unsigned long* k, double* fraction);
+ElvStatus elv_hypergeo_upper_quant(double p, unsigned long N, unsigned long M, unsigned long n,
+                                   unsigned long* k, double* fraction);
+
 // Beta (shapes a, b), F (df1, df2) and binomial (n trials); outputs by
 // pointer. Binomial: lower = P(X <= k), upper = P(X > k); the quantiles
 // come with the fraction f of their defining equation.
