@@ -19,7 +19,7 @@ namespace {
 
 // The binomial tails come from the incomplete beta ratio until the ELV
 // binomial routine is in place; the hypergeometric ones from the ELV route.
-constexpr double kBinomialTolerance = 5e-8;
+constexpr double kBinomialTolerance = 1e-9;
 constexpr double kHypergeometricTolerance = 1e-9;
 
 TEST(KernelPValues, TwoSidedMatchExactEnumeration) {
