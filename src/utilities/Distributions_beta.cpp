@@ -6,6 +6,7 @@
 #include <stdexcept>
 
 #include "utilities/Distributions.h"
+#include "utilities/Distributions_pvalue.h"
 #include "utilities/ELVwrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/SpecialFunctions.h"
@@ -22,19 +23,6 @@ constexpr double kSmallestNoncentrality = 2.2250738585072014e-307;
 // its upper end.
 constexpr double kSearchLimit = 1e30;
 constexpr double kLargestFArgument = 189812530.0;
-
-double pValueFromTails(double lower, double upper, EAlternative alternative) {
-  switch (alternative) {
-    case kAlternativeLess:
-      return lower;
-    case kAlternativeGreater:
-      return upper;
-    case kAlternativeNotEqual:
-      return 2.0 * std::fmin(lower, upper);
-    default:
-      return 0.0;
-  }
-}
 
 }  // namespace
 
@@ -151,7 +139,7 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
 double mFPValue(double x, double df1, double df2, EAlternative alternative) {
   double lower = 0.0, upper = 0.0;
   if (!mFCdf(x, df1, df2, 0.0, &lower, &upper)) return mGetMissingValueCode();
-  return pValueFromTails(lower, upper, alternative);
+  return mPValueFromTails(lower, upper, alternative);
 }
 
 // Only the one-sided critical values exist: the two-sided case is 0.0.

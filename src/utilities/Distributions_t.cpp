@@ -9,6 +9,7 @@
 #include <stdexcept>
 
 #include "utilities/Distributions.h"
+#include "utilities/Distributions_pvalue.h"
 #include "utilities/ELVwrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/SpecialFunctions.h"
@@ -23,19 +24,6 @@ constexpr double kSearchLimit = 1e30;
 constexpr double kElvMaxShape = 94906265.0;
 constexpr double kElvWidthFactor = 6.1738;
 constexpr int kElvDomainStatus = 3;
-
-double pValueFromTails(double lower, double upper, EAlternative alternative) {
-  switch (alternative) {
-    case kAlternativeLess:
-      return lower;
-    case kAlternativeGreater:
-      return upper;
-    case kAlternativeNotEqual:
-      return 2.0 * std::fmin(lower, upper);
-    default:
-      return 0.0;
-  }
-}
 
 // The central t quantile by the ELV routine for the nearer tail.
 double centralTQuantile(double p, double df) {
@@ -155,7 +143,7 @@ double mTPValue(double t, double df, EAlternative alternative) {
   if (mIsNumericMissing(t)) return t;
   double lower = 0.0, upper = 0.0;
   if (ElvFailed(elv_t_ncdf(t, df, 0.0, &lower, &upper))) return mGetMissingValueCode();
-  return pValueFromTails(lower, upper, alternative);
+  return mPValueFromTails(lower, upper, alternative);
 }
 
 namespace {
