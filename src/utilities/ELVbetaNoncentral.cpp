@@ -10,6 +10,7 @@
 #include <qel/elv.h>
 
 #include <cmath>
+#include <stdexcept>
 #include <utility>
 
 #include "utilities/ELVlimits.h"
@@ -18,6 +19,12 @@
 namespace {
 
 using namespace qel::elv;
+
+// Logarithm of a factor that an extreme argument may have left at 0: the
+// term then counts as underflowed.
+double logOrLow(double v) {
+  return v > 0.0 ? std::log(v) : -kHuge;
+}
 
 // beta_ncdf, lower tails F(j) = I_x(A, b), A = a+j, with factor K(j) =
 // beta_Iabx(A, b, x), F = density(A, b, x) K. Downwards:
@@ -37,7 +44,7 @@ class FirstShapeLower : public MixtureComponents {
     if (a_ + j == 0.0) return 0.0;
     double lp;
     lnpbeta(&lp, a_ + j, b_, x_);
-    return lp + std::log(factor);
+    return lp + logOrLow(factor);
   }
 
  private:
@@ -60,7 +67,7 @@ class FirstShapeUpper : public MixtureComponents {
   double logComponent(long j, double factor) const override {
     double lp;
     lnpbeta(&lp, a_ + j, b_, x_);
-    return lp + std::log1p(-x_) - std::log(b_) + std::log(factor);
+    return lp + std::log1p(-x_) - std::log(b_) + logOrLow(factor);
   }
 
  private:
@@ -86,7 +93,7 @@ class SecondShapeUpper : public MixtureComponents {
     if (B == 0.0) return 0.0;
     double lp;
     lnpbeta(&lp, a_, B, x_);
-    return lp + std::log1p(-x_) - std::log(B) + std::log(factor);
+    return lp + std::log1p(-x_) - std::log(B) + logOrLow(factor);
   }
 
  private:
@@ -109,7 +116,7 @@ class SecondShapeLower : public MixtureComponents {
   double logComponent(long j, double factor) const override {
     double lp;
     lnpbeta(&lp, a_, b_ + j, x_);
-    return lp + std::log(factor);
+    return lp + logOrLow(factor);
   }
 
  private:
@@ -176,9 +183,17 @@ void mixtureTails(const char* name, const Mixture& m, double L, double* lower, d
   const int64_t base = m.secondShape ? 1000 : 0;
   ELVstartup(name);
   ELVmethod = base;
-  if (m.x == 0.0 || m.x == 1.0) {
-    *lower = m.x;
-    *upper = 1.0 - m.x;
+  if (m.x < kTinyArgument || m.x == 1.0) {
+    *lower = m.x == 1.0 ? 1.0 : 0.0;
+    *upper = 1.0 - *lower;
+    ELVexit(name, 0, 'F');
+    return;
+  }
+  // A fixed shape of 0 puts all mass at one end: I_x(a+j, 0) = 0 and
+  // I_x(0, b+j) = 1 for every x below 1.
+  if ((m.secondShape ? m.a : m.b) == 0.0) {
+    *lower = m.secondShape ? 1.0 : 0.0;
+    *upper = 1.0 - *lower;
     ELVexit(name, 0, 'F');
     return;
   }
@@ -189,15 +204,25 @@ void mixtureTails(const char* name, const Mixture& m, double L, double* lower, d
   const bool lowerFirst = descending != m.secondShape;
   MixtureSettings settings;
   settings.L = L;
-  MixtureResult result = runSum(m, descending, settings);
-  int64_t method = methodOf(result, descending);
+  MixtureResult result;
+  int64_t method;
   double* directOut = lowerFirst ? lower : upper;
   double* otherOut = lowerFirst ? upper : lower;
-  if (result.end == MixtureEnd::AboveLimit) {
-    settings.switchAbove = kHuge;
-    result = runSum(m, !descending, settings);
-    method = 100 + methodOf(result, !descending);
-    std::swap(directOut, otherOut);
+  try {
+    result = runSum(m, descending, settings);
+    method = methodOf(result, descending);
+    if (result.end == MixtureEnd::AboveLimit) {
+      settings.switchAbove = kHuge;
+      result = runSum(m, !descending, settings);
+      method = 100 + methodOf(result, !descending);
+      std::swap(directOut, otherOut);
+    }
+  } catch (const std::runtime_error&) {
+    // Shapes at the edge of the double range (1e-300 beside 1e8) can make a
+    // recurrence overflow in the armed state: the sum has failed.
+    ELVmethod = base;
+    ELVexit(name, 4, 'F');
+    return;
   }
   *directOut = result.sum;
   *otherOut = 1.0 - result.sum;

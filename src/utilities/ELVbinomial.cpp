@@ -253,12 +253,15 @@ void binomial_df(long k, long n, double prob, double* lower, double* upper, doub
     }
     up = 1.0 - lo;
   } else {
-    const double r = (n - k) / (k + 1.0) * (prob / q);
+    // ln r by sums of logarithms: r itself may lie below the normal doubles,
+    // which the armed state reads as 0.
+    const double logR = std::log((n - k) / (k + 1.0)) + std::log(prob) - std::log(q);
+    const double r = std::exp(logR < kUnderflowLog ? kUnderflowLog : logR);
     if (lm >= kUnderflowLog) {
       if (binomial_Ik(k, n, &S, prob) != 0) goto seriesFailure;
       up = cellMass * S;
       ELVmethod += 20;
-    } else if (lm + std::log(r / (1.0 - r)) < kUnderflowLog) {
+    } else if (lm + logR - std::log1p(-r) < kUnderflowLog) {
       code = 1;
       ELVmethod += 21;
     } else {

@@ -2,11 +2,13 @@
 // failure outputs, special cases, method numbers and step counters on
 // representative branches, the reflections that must stop, and the wrappers.
 #include <gtest/gtest.h>
+#include <qel/distributions.h>
 #include <qel/elv.h>
 
 #include <array>
 #include <cmath>
 #include <limits>
+#include <stdexcept>
 #include <string>
 
 #include "utilities/ELVwrappers.h"
@@ -317,6 +319,71 @@ TEST(ElvBetaFrame, WrappersForwardOutputsAndStatus) {
   EXPECT_EQ(qel::elv_binomial_lower_quant(0.2, 10ul, 0.3, &k, &f), qel::ElvNoError);
   EXPECT_EQ(qel::elv_binomial_upper_quant(0.2, 10ul, 0.3, &k, &f), qel::ElvNoError);
   EXPECT_EQ(qel::elv_binomial_upper_quant(0.2, 0ul, 0.3, &k, &f), qel::ElvArgumentOutOfRange);
+}
+
+}  // namespace
+
+namespace {
+
+// Every routine over a grid that includes the edges of the admissible
+// ranges, in the armed state: no trap may escape (a trap inside a library
+// function would end the process), and the status is always one of 0 to 4.
+TEST(ElvBetaFrame, ArmedSweepOverExtremeArguments) {
+  const double shapes[] = {0.0, 1e-300, 1e-13, 1e-3, 0.3, 1.0, 2.5, 50.0, 3e4, 9e7, 94906265.0};
+  const double xs[] = {0.0, 1e-300, 1e-200, 1e-20, 1e-5, 0.1, 0.5, 0.9, 1.0 - 1e-12, 1.0};
+  const double Ls[] = {0.0, 1e-300, 0.01, 3.0, 500.0, 1e4};
+  const double ps[] = {1e-12, 1e-6, 0.1, 0.5};
+  int runs = 0;
+  qel::SetLynFpuStates();
+  try {
+    for (double a : shapes) {
+      for (double b : shapes) {
+        for (double x : xs) {
+          double lower, upper, density;
+          beta_df(x, a, b, &lower, &upper, &density);
+          ASSERT_LE(ELVerrno, 4);
+          F_df(x * 1e3, 2 * a, 2 * b, &lower, &upper);
+          ++runs;
+          if (a > 1e4 && b > 1e4) continue;  // keep the mixtures short
+          for (double L : Ls) {
+            beta_ncdf(x, a, b, L, &lower, &upper);
+            ASSERT_LE(ELVerrno, 4);
+            beta_ncdf2(x, a, b, L, &lower, &upper);
+            ASSERT_LE(ELVerrno, 4);
+          }
+        }
+        for (double p : ps) {
+          double q;
+          beta_lower_quant(p, a, b, &q);
+          ASSERT_LE(ELVerrno, 4);
+          beta_upper_quant(p, a, b, &q);
+          F_upper_quant(p, 2 * a, 2 * b, &q);
+          F_lower_quant(p, 2 * a, 2 * b, &q);
+          ASSERT_LE(ELVerrno, 4);
+        }
+      }
+    }
+    for (long n : {1L, 2L, 40L, 100000L, 94906265L}) {
+      for (double prob : {0.0, 1e-300, 1e-9, 0.3, 0.5, 0.7, 1.0 - 1e-12, 1.0}) {
+        for (long k : {0L, 1L, n / 3, n / 2, n - 1, n}) {
+          double lower, upper, mass;
+          binomial_df(k, n, prob, &lower, &upper, &mass);
+          ASSERT_LE(ELVerrno, 4);
+        }
+        for (double p : ps) {
+          long k;
+          double f;
+          binomial_lower_quant(n, p, prob, &k, &f);
+          ASSERT_LE(ELVerrno, 4);
+          binomial_upper_quant(n, p, prob, &k, &f);
+          ASSERT_LE(ELVerrno, 4);
+        }
+      }
+    }
+  } catch (const std::exception& e) {
+    ADD_FAILURE() << "trap: " << e.what() << " after " << runs << " runs";
+  }
+  qel::ResetFpuStates();
 }
 
 }  // namespace

@@ -105,6 +105,11 @@ TEST(ElvBetaReference, NoncentralBetaTails) {
     const double x = r.numbers[0], a = r.numbers[1], b = r.numbers[2], L = r.numbers[3];
     double lower = -1, upper = -1;
     armed([&] { beta_ncdf(x, a, b, L, &lower, &upper); }, r.line);
+    if (x < kTiny) {  // counts as 0
+      EXPECT_EQ(ELVerrno, 0);
+      EXPECT_EQ(lower, 0.0);
+      continue;
+    }
     const double e = checkTails(r.line, ELVerrno, lower, upper, r.numbers[4], r.numbers[5]);
     methods.insert(ELVmethod);
     if (ELVerrno == 0) {
