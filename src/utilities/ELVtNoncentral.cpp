@@ -303,8 +303,12 @@ Tails oppositeSigns(double t, double df, double delta) {
   }
   const bool expansion = (m >= 2 && m <= 6 && t <= -10.0) || (m >= 7 && m <= 12 && t < -25.0);
   if (expansion) {
-    // Far tail of a small integer df: the saddle-centred integral, which is
-    // the integral itself and not a truncated expansion, stands in.
+    // Far tail of a small integer df, where the recursion's terms of both
+    // signs would swamp the tail. An expansion in 1/t^2 with coefficients
+    // p(delta) phi(delta) + q(delta) Q(delta) cancels as badly once delta
+    // is large (the tail is far below either part); the integral around
+    // the saddle has no such loss and stands in, still flagged with
+    // status 1 as a last-resort path.
     out.lower = saddle;
     out.upper = 1.0 - saddle;
     out.code = 1;
