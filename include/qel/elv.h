@@ -114,12 +114,21 @@ QEL_API void hypergeo_lower_quant(unsigned long N, unsigned long M, unsigned lon
 QEL_API void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned long n,
                                   unsigned long* k, double* f, double p);
 
+/* Student t with df degrees of freedom and noncentrality delta:
+ * lower = P(T <= t), upper = P(T > t). Quantiles for p in [1e-12, 0.5] and
+ * df in [0.002, 189812530]. */
+QEL_API void t_df(double t, double df, double* lower, double* upper);
+QEL_API void t_upper_quant(double p, double df, double* q);
+QEL_API void t_lower_quant(double p, double df, double* q);
+QEL_API void t_ncdf(double t, double df, double delta, double* lower, double* upper);
 /* Complementary Owen's T: the integral from h to infinity of phi(x) Q(a x),
  * a > 0; returns 0 or 4. */
 QEL_API int Tha_c(double* out, double h, double a);
 /* Far lower tail of the noncentral t at t < 0 < delta, integrated around
- * its saddle point. */
+ * its saddle point; -1 for arguments outside df in (0, 189812530],
+ * finite t and |delta| below 1e6. */
 QEL_API double t_saddle_approx(double t, double df, double delta);
+
 /* Beta family: shapes a, b; lower = I_x(a,b), upper = 1 - I_x(a,b). The
  * scaled series return 0 or 4: I_x(a,b) = density * beta_Iabx,
  * 1 - I_x(a,b) = density (1-x)/b * beta_Jabx. */

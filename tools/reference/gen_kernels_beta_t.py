@@ -64,7 +64,10 @@ def student(df, delta):
     mpmath.mp.dps = 30
 
     def inv(p):
-        return solve_increasing(lambda y: tails(y)[0] - p, -1e6, 1e6)
+        # The median of the central t is 0; tails near 0 are flat to 30 digits.
+        if delta == 0 and p == mpf(1) / 2:
+            return mpf(0)
+        return solve_increasing(lambda y: tails(y)[0] - p, -1e12, 1e12)
     rows = rows_for("t", [df, delta], xs, ps, pdf, lambda x: tails(x)[0],
                     lambda x: tails(x)[1], inv)
     mpmath.mp.dps = 60
@@ -98,7 +101,7 @@ def fdist(d1, d2, lam):
     return rows_for("f", [d1, d2, lam], xs, ps, pdf, lambda x: tails(x)[0],
                     lambda x: tails(x)[1],
                     lambda p: solve_increasing(lambda y: tails(y)[0] - p, mpf(10) ** -30,
-                                               mpf(10) ** 8, logscale=True))
+                                               mpf(10) ** 15, logscale=True))
 
 
 def beta(a, b):
@@ -120,7 +123,7 @@ def binomial_quantiles(n, p):
             return mpf(0)
         if k >= n:
             return mpf(1)
-        return mpmath.betainc(k + 1, n - k, P, 1, regularized=True)
+        return mpmath.betainc(n - k, k + 1, 0, 1 - P, regularized=True)
     return quantile_rows("binomial", [n, p], PS[1:-1], low, 0, n)
 
 
