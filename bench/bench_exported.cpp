@@ -42,28 +42,28 @@ void perElement(benchmark::State& state, double from, double to, F f) {
 
 // One family: libqel scalar Cdf, scalar InvCdf, array Cdf; Boost cdf and
 // quantile on the same points.
-#define QEL_BENCH_FAMILY(Name, from, to, QelCdf, QelInv, QelArray, boostDist)                     \
-  void Qel##Name##Cdf(benchmark::State& s) {                                                      \
-    perCall(s, grid(from, to, kPoints), [](double x) { return QelCdf; });                         \
-  }                                                                                               \
-  void Qel##Name##InvCdf(benchmark::State& s) {                                                   \
-    perCall(s, grid(1e-6, 1 - 1e-6, kPoints), [](double p) { return QelInv; });                  \
-  }                                                                                               \
-  void Qel##Name##CdfArray(benchmark::State& s) {                                                 \
-    perElement(s, from, to, [](double* o, const double* x, unsigned long n) { QelArray; });       \
-  }                                                                                               \
-  void Boost##Name##Cdf(benchmark::State& s) {                                                    \
-    const auto d = boostDist;                                                                     \
-    perCall(s, grid(from, to, kPoints), [&](double x) { return cdf(complement(d, x)); });         \
-  }                                                                                               \
-  void Boost##Name##Quantile(benchmark::State& s) {                                               \
-    const auto d = boostDist;                                                                     \
-    perCall(s, grid(1e-6, 1 - 1e-6, kPoints), [&](double p) { return quantile(d, p); });          \
-  }                                                                                               \
-  BENCHMARK(Qel##Name##Cdf);                                                                      \
-  BENCHMARK(Boost##Name##Cdf);                                                                    \
-  BENCHMARK(Qel##Name##InvCdf);                                                                   \
-  BENCHMARK(Boost##Name##Quantile);                                                               \
+#define QEL_BENCH_FAMILY(Name, from, to, QelCdf, QelInv, QelArray, boostDist)               \
+  void Qel##Name##Cdf(benchmark::State& s) {                                                \
+    perCall(s, grid(from, to, kPoints), [](double x) { return QelCdf; });                   \
+  }                                                                                         \
+  void Qel##Name##InvCdf(benchmark::State& s) {                                             \
+    perCall(s, grid(1e-6, 1 - 1e-6, kPoints), [](double p) { return QelInv; });             \
+  }                                                                                         \
+  void Qel##Name##CdfArray(benchmark::State& s) {                                           \
+    perElement(s, from, to, [](double* o, const double* x, unsigned long n) { QelArray; }); \
+  }                                                                                         \
+  void Boost##Name##Cdf(benchmark::State& s) {                                              \
+    const auto d = boostDist;                                                               \
+    perCall(s, grid(from, to, kPoints), [&](double x) { return cdf(complement(d, x)); });   \
+  }                                                                                         \
+  void Boost##Name##Quantile(benchmark::State& s) {                                         \
+    const auto d = boostDist;                                                               \
+    perCall(s, grid(1e-6, 1 - 1e-6, kPoints), [&](double p) { return quantile(d, p); });    \
+  }                                                                                         \
+  BENCHMARK(Qel##Name##Cdf);                                                                \
+  BENCHMARK(Boost##Name##Cdf);                                                              \
+  BENCHMARK(Qel##Name##InvCdf);                                                             \
+  BENCHMARK(Boost##Name##Quantile);                                                         \
   BENCHMARK(Qel##Name##CdfArray)->Iterations(3);
 
 QEL_BENCH_FAMILY(Normal, -8, 8, qel::NormalCdf(x, 0, 1, true), qel::NormalInvCdf(p, 0, 1),

@@ -48,23 +48,31 @@ struct Entry {
 
 const std::map<std::string, Entry>& pvalues() {
   static const std::map<std::string, Entry> table = {
-      {"normal", {{}, [](double z, const Options&, qel::EAlternative a) {
-                    return qel::NormalPValue(z, a);
-                  }}},
-      {"t", {{"df"}, [](double t, const Options& o, qel::EAlternative a) {
-               return qel::TPValue(t, number(o, "df"), a);
-             }}},
-      {"chisq", {{"df"}, [](double x, const Options& o, qel::EAlternative a) {
-                   return qel::ChiSqPValue(x, number(o, "df"), a);
-                 }}},
-      {"f", {{"df1", "df2"}, [](double x, const Options& o, qel::EAlternative a) {
-               return qel::FPValue(x, number(o, "df1"), number(o, "df2"), a);
-             }}},
-      {"binomial", {{"n", "p"}, [](double x, const Options& o, qel::EAlternative a) {
-                      return qel::BinomialPValue(x, whole(o, "n"), number(o, "p"), a);
-                    }}},
+      {"normal",
+       {{}, [](double z, const Options&, qel::EAlternative a) { return qel::NormalPValue(z, a); }}},
+      {"t",
+       {{"df"},
+        [](double t, const Options& o, qel::EAlternative a) {
+          return qel::TPValue(t, number(o, "df"), a);
+        }}},
+      {"chisq",
+       {{"df"},
+        [](double x, const Options& o, qel::EAlternative a) {
+          return qel::ChiSqPValue(x, number(o, "df"), a);
+        }}},
+      {"f",
+       {{"df1", "df2"},
+        [](double x, const Options& o, qel::EAlternative a) {
+          return qel::FPValue(x, number(o, "df1"), number(o, "df2"), a);
+        }}},
+      {"binomial",
+       {{"n", "p"},
+        [](double x, const Options& o, qel::EAlternative a) {
+          return qel::BinomialPValue(x, whole(o, "n"), number(o, "p"), a);
+        }}},
       {"hypergeometric",
-       {{"N", "M", "n"}, [](double x, const Options& o, qel::EAlternative a) {
+       {{"N", "M", "n"},
+        [](double x, const Options& o, qel::EAlternative a) {
           if (x != std::floor(x)) throw UsageError("X must be a whole number");
           return qel::HypergeometricPValue(static_cast<int>(x), whole(o, "N"), whole(o, "M"),
                                            whole(o, "n"), a);
@@ -75,20 +83,28 @@ const std::map<std::string, Entry>& pvalues() {
 
 const std::map<std::string, Entry>& criticalValues() {
   static const std::map<std::string, Entry> table = {
-      {"normal", {{}, [](double alpha, const Options&, qel::EAlternative a) {
-                    return qel::NormalCritValue(alpha, a);
-                  }}},
-      {"t", {{"df", "k"}, [](double alpha, const Options& o, qel::EAlternative a) {
-               const int k = o.count("k") ? whole(o, "k") : 1;
-               return o.count("sidak") ? qel::TSidakCritValue(alpha, number(o, "df"), a, k)
-                                       : qel::TCritValue(alpha, number(o, "df"), a, k);
-             }}},
-      {"chisq", {{"df"}, [](double alpha, const Options& o, qel::EAlternative a) {
-                   return qel::ChiSqCritValue(alpha, number(o, "df"), a);
-                 }}},
-      {"f", {{"df1", "df2"}, [](double alpha, const Options& o, qel::EAlternative a) {
-               return qel::FCritValue(alpha, number(o, "df1"), number(o, "df2"), a);
-             }}},
+      {"normal",
+       {{},
+        [](double alpha, const Options&, qel::EAlternative a) {
+          return qel::NormalCritValue(alpha, a);
+        }}},
+      {"t",
+       {{"df", "k"},
+        [](double alpha, const Options& o, qel::EAlternative a) {
+          const int k = o.count("k") ? whole(o, "k") : 1;
+          return o.count("sidak") ? qel::TSidakCritValue(alpha, number(o, "df"), a, k)
+                                  : qel::TCritValue(alpha, number(o, "df"), a, k);
+        }}},
+      {"chisq",
+       {{"df"},
+        [](double alpha, const Options& o, qel::EAlternative a) {
+          return qel::ChiSqCritValue(alpha, number(o, "df"), a);
+        }}},
+      {"f",
+       {{"df1", "df2"},
+        [](double alpha, const Options& o, qel::EAlternative a) {
+          return qel::FCritValue(alpha, number(o, "df1"), number(o, "df2"), a);
+        }}},
   };
   return table;
 }

@@ -70,6 +70,7 @@ FAMILIES = [
     dict(name="Triangular", params=[(D, "lower"), (D, "mode"), (D, "upper")],
          doc="Triangular on [lower, upper] with its peak at mode."),
     dict(name="Uniform", params=[(D, "lower"), (D, "upper")], frame="bare",
+         cli_defaults={"lower": "0.0", "upper": "1.0"},
          doc="Uniform on [lower, upper]. Bare frame: no floating-point state change and\n"
              "no parameter check (lower == upper divides by zero and gives infinity)."),
     dict(name="Weibull", params=[(D, "shape"), (D, "scale"), (D, "threshold")],
@@ -259,7 +260,8 @@ def cli_table():
                 parts.append(f'toInt({v}, "{n}")' if ty == "int" else v)
             return ", ".join(parts)
 
-        plist_cli = ", ".join("{\"%s\", %s}" % (n, CLI_DEFAULTS.get(n, "NAN")) for n in names)
+        defaults = dict(CLI_DEFAULTS, **f.get("cli_defaults", {}))
+        plist_cli = ", ".join("{\"%s\", %s}" % (n, defaults.get(n, "NAN")) for n in names)
         (_, pdf, _, _), (_, cdf, _, _), (_, inv, _, _) = function_sets(f)
         nm = f["name"]
         out.append("{\"%s\", {%s}," % (nm.lower(), plist_cli))

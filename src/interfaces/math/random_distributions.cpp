@@ -18,11 +18,15 @@ double bare(Kernel kernel, double x, Params... params) {
 }
 
 // The geometric law is the negative binomial with r = 1.
-double geometricPdf(double x, double p) { return mNegBinomialPdf(x, p, 1.0); }
+double geometricPdf(double x, double p) {
+  return mNegBinomialPdf(x, p, 1.0);
+}
 double geometricCdf(double x, double p, bool upperTail) {
   return mNegBinomialCdf(x, p, 1.0, upperTail);
 }
-double geometricInvCdf(double p, double prob) { return mNegBinomialInvCdf(p, prob, 1.0); }
+double geometricInvCdf(double p, double prob) {
+  return mNegBinomialInvCdf(p, prob, 1.0);
+}
 
 // The smallest extreme value density is the largest one mirrored.
 double smallestExtremeValuePdf(double x, double location, double scale) {

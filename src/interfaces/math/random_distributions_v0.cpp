@@ -11,7 +11,9 @@ namespace v0 {
 
 namespace {
 
-bool notFinite(double x) { return !std::isfinite(x); }
+bool notFinite(double x) {
+  return !std::isfinite(x);
+}
 
 // p of the critical value: 1 - alpha one-sided, 1 - alpha/2 two-sided, and 0
 // for a value that names no alternative.
@@ -62,9 +64,13 @@ double BinomialPValue(double x, unsigned n, double p, AlternativeHypothesis alte
   return frame::armed(mBinomialPValue, x, static_cast<int>(n), p, alternative);
 }
 
-double NormalInvCdfFunc::operator()(double p) const { return NormalInvCdf(p, 0.0, 1.0); }
+double NormalInvCdfFunc::operator()(double p) const {
+  return NormalInvCdf(p, 0.0, 1.0);
+}
 
-double TInvCdfFunc::operator()(double p) const { return TInvCdf(p, mDf, 0.0); }
+double TInvCdfFunc::operator()(double p) const {
+  return TInvCdf(p, mDf, 0.0);
+}
 
 }  // namespace v0
 }  // namespace qel

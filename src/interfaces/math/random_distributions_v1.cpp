@@ -22,11 +22,15 @@ const double kNaN = std::numeric_limits<double>::quiet_NaN();
 constexpr double kLowerFractionLimit = 1e-9;
 constexpr double kUpperFractionLimit = 0.999999999;
 
-bool isAlmostInteger(double x) { return TheseAreAlmostEqual(x, NearestInteger(x)); }
+bool isAlmostInteger(double x) {
+  return TheseAreAlmostEqual(x, NearestInteger(x));
+}
 
 // The integer a cumulative function works at: an almost integer x rounded,
 // any other x taken to its floor.
-double cumulativeIndex(double x) { return isAlmostInteger(x) ? NearestInteger(x) : std::floor(x); }
+double cumulativeIndex(double x) {
+  return isAlmostInteger(x) ? NearestInteger(x) : std::floor(x);
+}
 
 // The P-value for an alternative from a pair of tails.
 double pValueFromTails(double lower, double upper, AlternativeHypothesis alternative) {
@@ -44,8 +48,8 @@ double pValueFromTails(double lower, double upper, AlternativeHypothesis alterna
 
 // k corrected by the fraction of the lower (p <= 0.5) or upper quantile routine.
 double correctedQuantile(unsigned long k, double fraction, bool fromLowerRoutine) {
-  const bool lower = fromLowerRoutine ? fraction <= kLowerFractionLimit
-                                      : fraction >= kUpperFractionLimit;
+  const bool lower =
+      fromLowerRoutine ? fraction <= kLowerFractionLimit : fraction >= kUpperFractionLimit;
   return (lower && k > 0) ? static_cast<double>(k - 1) : static_cast<double>(k);
 }
 
@@ -88,8 +92,8 @@ double BetaPdf(double x, double a, double b) {
   if (x < 0.0 || x > 1.0) return 0.0;
   if (x == 0.0) return a < 1.0 ? kNaN : (a == 1.0 ? b : 0.0);
   if (x == 1.0) return b < 1.0 ? kNaN : (b == 1.0 ? a : 0.0);
-  return std::exp((a - 1.0) * std::log(x) + (b - 1.0) * std::log1p(-x) - LogGamma(a) -
-                  LogGamma(b) + LogGamma(a + b));
+  return std::exp((a - 1.0) * std::log(x) + (b - 1.0) * std::log1p(-x) - LogGamma(a) - LogGamma(b) +
+                  LogGamma(a + b));
 }
 
 double BetaCdf(double x, double a, double b, bool upperTail) {
@@ -142,9 +146,8 @@ double BinomialInvCdf(double p, unsigned n, double prob) {
   unsigned long k;
   double fraction;
   const bool lowerRoutine = p <= 0.5;
-  const ElvStatus status = lowerRoutine
-                               ? elv_binomial_lower_quant(p, n, prob, &k, &fraction)
-                               : elv_binomial_upper_quant(1.0 - p, n, prob, &k, &fraction);
+  const ElvStatus status = lowerRoutine ? elv_binomial_lower_quant(p, n, prob, &k, &fraction)
+                                        : elv_binomial_upper_quant(1.0 - p, n, prob, &k, &fraction);
   if (ElvFailed(status)) return kNaN;
   return correctedQuantile(k, fraction, lowerRoutine);
 }
@@ -192,9 +195,8 @@ double HypergeometricInvCdfHelpLoop(double p, unsigned N, unsigned M, unsigned n
   unsigned long k;
   double fraction;
   const bool lowerRoutine = p <= 0.5;
-  const ElvStatus status = lowerRoutine
-                               ? elv_hypergeo_lower_quant(p, N, M, n, &k, &fraction)
-                               : elv_hypergeo_upper_quant(1.0 - p, N, M, n, &k, &fraction);
+  const ElvStatus status = lowerRoutine ? elv_hypergeo_lower_quant(p, N, M, n, &k, &fraction)
+                                        : elv_hypergeo_upper_quant(1.0 - p, N, M, n, &k, &fraction);
   if (ElvFailed(status)) return kNaN;
   return correctedQuantile(k, fraction, lowerRoutine);
 }
@@ -217,8 +219,7 @@ double HypergeometricPValue(unsigned x, unsigned N, unsigned M, unsigned n,
   unsigned mode = static_cast<unsigned>(std::floor((M + 1.0) * (n + 1.0) / (N + 2.0)));
   if (mode > lo && HypergeometricPdf(mode - 1, N, M, n) > HypergeometricPdf(mode, N, M, n)) {
     --mode;
-  } else if (mode < hi &&
-             HypergeometricPdf(mode + 1, N, M, n) > HypergeometricPdf(mode, N, M, n)) {
+  } else if (mode < hi && HypergeometricPdf(mode + 1, N, M, n) > HypergeometricPdf(mode, N, M, n)) {
     ++mode;
   }
   if (x == mode) return 1.0;
@@ -248,8 +249,8 @@ double WeibullInvCdf(double p, double shape, double scale, double threshold) {
 
 void NormalCdf(double* out, const double* x, unsigned count, double mean, double sigma,
                bool upperTail) {
-  elementwise(static_cast<double (*)(double, double, double, bool)>(NormalCdf), out, x, count,
-              mean, sigma, upperTail);
+  elementwise(static_cast<double (*)(double, double, double, bool)>(NormalCdf), out, x, count, mean,
+              sigma, upperTail);
 }
 void NormalInvCdf(double* out, const double* p, unsigned count, double mean, double sigma) {
   elementwise(static_cast<double (*)(double, double, double)>(NormalInvCdf), out, p, count, mean,
@@ -266,8 +267,7 @@ void BetaInvCdf(double* out, const double* p, unsigned count, double a, double b
   elementwise(static_cast<double (*)(double, double, double)>(BetaInvCdf), out, p, count, a, b);
 }
 void BinomialPdf(double* out, const double* x, unsigned count, unsigned n, double p) {
-  elementwise(static_cast<double (*)(double, unsigned, double)>(BinomialPdf), out, x, count, n,
-              p);
+  elementwise(static_cast<double (*)(double, unsigned, double)>(BinomialPdf), out, x, count, n, p);
 }
 void BinomialCdf(double* out, const double* x, unsigned count, unsigned n, double p,
                  bool upperTail) {
@@ -280,8 +280,8 @@ void BinomialInvCdf(double* out, const double* p, unsigned count, unsigned n, do
 }
 void HypergeometricPdf(double* out, const double* x, unsigned count, unsigned N, unsigned M,
                        unsigned n) {
-  elementwise(static_cast<double (*)(double, unsigned, unsigned, unsigned)>(HypergeometricPdf),
-              out, x, count, N, M, n);
+  elementwise(static_cast<double (*)(double, unsigned, unsigned, unsigned)>(HypergeometricPdf), out,
+              x, count, N, M, n);
 }
 void HypergeometricCdf(double* out, const double* x, unsigned count, unsigned N, unsigned M,
                        unsigned n, bool upperTail) {
@@ -296,8 +296,8 @@ void HypergeometricInvCdf(double* out, const double* p, unsigned count, unsigned
 }
 void WeibullInvCdf(double* out, const double* p, unsigned count, double shape, double scale,
                    double threshold) {
-  elementwise(static_cast<double (*)(double, double, double, double)>(WeibullInvCdf), out, p,
-              count, shape, scale, threshold);
+  elementwise(static_cast<double (*)(double, double, double, double)>(WeibullInvCdf), out, p, count,
+              shape, scale, threshold);
 }
 
 }  // namespace v1

@@ -15,7 +15,9 @@ double LogGamma(double x) {
   return XGAMMLN(x);
 }
 
-double NearestInteger(double x) { return x > 0.0 ? std::floor(x + 0.5) : std::ceil(x - 0.5); }
+double NearestInteger(double x) {
+  return x > 0.0 ? std::floor(x + 0.5) : std::ceil(x - 0.5);
+}
 
 double CopySign(double signSource, double magnitudeSource) {
   return std::copysign(magnitudeSource, signSource);
