@@ -23,7 +23,8 @@ QEL_API double BetaPdf(double x, double a, double b);
 QEL_API double BetaCdf(double x, double a, double b, bool upperTail);
 QEL_API double BetaInvCdf(double p, double a, double b);
 QEL_API void BetaPdf(double* out, const double* x, unsigned long count, double a, double b);
-QEL_API void BetaCdf(double* out, const double* x, unsigned long count, double a, double b, bool upperTail);
+QEL_API void BetaCdf(double* out, const double* x, unsigned long count, double a, double b,
+                     bool upperTail);
 QEL_API void BetaInvCdf(double* out, const double* p, unsigned long count, double a, double b);
 
 // Binomial(n, p). Pdf and InvCdf take an int n, Cdf a double n.
@@ -32,16 +33,21 @@ QEL_API double BinomialPdf(double x, int n, double p);
 QEL_API double BinomialCdf(double x, double n, double p, bool upperTail);
 QEL_API double BinomialInvCdf(double probability, int n, double p);
 QEL_API void BinomialPdf(double* out, const double* x, unsigned long count, int n, double p);
-QEL_API void BinomialCdf(double* out, const double* x, unsigned long count, double n, double p, bool upperTail);
-QEL_API void BinomialInvCdf(double* out, const double* probability, unsigned long count, int n, double p);
+QEL_API void BinomialCdf(double* out, const double* x, unsigned long count, double n, double p,
+                         bool upperTail);
+QEL_API void BinomialInvCdf(double* out, const double* probability, unsigned long count, int n,
+                            double p);
 
 // Cauchy(location, scale).
 QEL_API double CauchyPdf(double x, double location, double scale);
 QEL_API double CauchyCdf(double x, double location, double scale, bool upperTail);
 QEL_API double CauchyInvCdf(double p, double location, double scale);
-QEL_API void CauchyPdf(double* out, const double* x, unsigned long count, double location, double scale);
-QEL_API void CauchyCdf(double* out, const double* x, unsigned long count, double location, double scale, bool upperTail);
-QEL_API void CauchyInvCdf(double* out, const double* p, unsigned long count, double location, double scale);
+QEL_API void CauchyPdf(double* out, const double* x, unsigned long count, double location,
+                       double scale);
+QEL_API void CauchyCdf(double* out, const double* x, unsigned long count, double location,
+                       double scale, bool upperTail);
+QEL_API void CauchyInvCdf(double* out, const double* p, unsigned long count, double location,
+                          double scale);
 
 // Chi-square with df degrees of freedom and a noncentrality (0: central).
 // The density is that of the central law.
@@ -49,32 +55,42 @@ QEL_API double ChiSqPdf(double x, double df);
 QEL_API double ChiSqCdf(double x, double df, double noncentrality, bool upperTail);
 QEL_API double ChiSqInvCdf(double p, double df, double noncentrality);
 QEL_API void ChiSqPdf(double* out, const double* x, unsigned long count, double df);
-QEL_API void ChiSqCdf(double* out, const double* x, unsigned long count, double df, double noncentrality, bool upperTail);
-QEL_API void ChiSqInvCdf(double* out, const double* p, unsigned long count, double df, double noncentrality);
+QEL_API void ChiSqCdf(double* out, const double* x, unsigned long count, double df,
+                      double noncentrality, bool upperTail);
+QEL_API void ChiSqInvCdf(double* out, const double* p, unsigned long count, double df,
+                         double noncentrality);
 
 // Exponential(scale) shifted by threshold.
 QEL_API double ExponentialPdf(double x, double scale, double threshold);
 QEL_API double ExponentialCdf(double x, double scale, double threshold, bool upperTail);
 QEL_API double ExponentialInvCdf(double p, double scale, double threshold);
-QEL_API void ExponentialPdf(double* out, const double* x, unsigned long count, double scale, double threshold);
-QEL_API void ExponentialCdf(double* out, const double* x, unsigned long count, double scale, double threshold, bool upperTail);
-QEL_API void ExponentialInvCdf(double* out, const double* p, unsigned long count, double scale, double threshold);
+QEL_API void ExponentialPdf(double* out, const double* x, unsigned long count, double scale,
+                            double threshold);
+QEL_API void ExponentialCdf(double* out, const double* x, unsigned long count, double scale,
+                            double threshold, bool upperTail);
+QEL_API void ExponentialInvCdf(double* out, const double* p, unsigned long count, double scale,
+                               double threshold);
 
 // F(df1, df2) with a noncentrality (0: central). The density is central.
 QEL_API double FPdf(double x, double df1, double df2);
 QEL_API double FCdf(double x, double df1, double df2, double noncentrality, bool upperTail);
 QEL_API double FInvCdf(double p, double df1, double df2, double noncentrality);
 QEL_API void FPdf(double* out, const double* x, unsigned long count, double df1, double df2);
-QEL_API void FCdf(double* out, const double* x, unsigned long count, double df1, double df2, double noncentrality, bool upperTail);
-QEL_API void FInvCdf(double* out, const double* p, unsigned long count, double df1, double df2, double noncentrality);
+QEL_API void FCdf(double* out, const double* x, unsigned long count, double df1, double df2,
+                  double noncentrality, bool upperTail);
+QEL_API void FInvCdf(double* out, const double* p, unsigned long count, double df1, double df2,
+                     double noncentrality);
 
 // Gamma(shape, scale) shifted by threshold.
 QEL_API double GammaPdf(double x, double shape, double scale, double threshold);
 QEL_API double GammaCdf(double x, double shape, double scale, double threshold, bool upperTail);
 QEL_API double GammaInvCdf(double p, double shape, double scale, double threshold);
-QEL_API void GammaPdf(double* out, const double* x, unsigned long count, double shape, double scale, double threshold);
-QEL_API void GammaCdf(double* out, const double* x, unsigned long count, double shape, double scale, double threshold, bool upperTail);
-QEL_API void GammaInvCdf(double* out, const double* p, unsigned long count, double shape, double scale, double threshold);
+QEL_API void GammaPdf(double* out, const double* x, unsigned long count, double shape, double scale,
+                      double threshold);
+QEL_API void GammaCdf(double* out, const double* x, unsigned long count, double shape, double scale,
+                      double threshold, bool upperTail);
+QEL_API void GammaInvCdf(double* out, const double* p, unsigned long count, double shape,
+                         double scale, double threshold);
 
 // Geometric: the number of trials up to the first success (negative
 // binomial with r = 1).
@@ -82,81 +98,111 @@ QEL_API double GeometricPdf(double x, double p);
 QEL_API double GeometricCdf(double x, double p, bool upperTail);
 QEL_API double GeometricInvCdf(double probability, double p);
 QEL_API void GeometricPdf(double* out, const double* x, unsigned long count, double p);
-QEL_API void GeometricCdf(double* out, const double* x, unsigned long count, double p, bool upperTail);
+QEL_API void GeometricCdf(double* out, const double* x, unsigned long count, double p,
+                          bool upperTail);
 QEL_API void GeometricInvCdf(double* out, const double* probability, unsigned long count, double p);
 
 // Half-normal(scale) above location.
 QEL_API double HalfNormalPdf(double x, double scale, double location);
 QEL_API double HalfNormalCdf(double x, double scale, double location, bool upperTail);
 QEL_API double HalfNormalInvCdf(double p, double scale, double location);
-QEL_API void HalfNormalPdf(double* out, const double* x, unsigned long count, double scale, double location);
-QEL_API void HalfNormalCdf(double* out, const double* x, unsigned long count, double scale, double location, bool upperTail);
-QEL_API void HalfNormalInvCdf(double* out, const double* p, unsigned long count, double scale, double location);
+QEL_API void HalfNormalPdf(double* out, const double* x, unsigned long count, double scale,
+                           double location);
+QEL_API void HalfNormalCdf(double* out, const double* x, unsigned long count, double scale,
+                           double location, bool upperTail);
+QEL_API void HalfNormalInvCdf(double* out, const double* p, unsigned long count, double scale,
+                              double location);
 
 // Hypergeometric: population N, M of them marked, sample n. The upper
 // tail includes the point.
 QEL_API double HypergeometricPdf(double x, int N, int M, int n);
 QEL_API double HypergeometricCdf(double x, int N, int M, int n, bool upperTail);
 QEL_API double HypergeometricInvCdf(double p, int N, int M, int n);
-QEL_API void HypergeometricPdf(double* out, const double* x, unsigned long count, int N, int M, int n);
-QEL_API void HypergeometricCdf(double* out, const double* x, unsigned long count, int N, int M, int n, bool upperTail);
-QEL_API void HypergeometricInvCdf(double* out, const double* p, unsigned long count, int N, int M, int n);
+QEL_API void HypergeometricPdf(double* out, const double* x, unsigned long count, int N, int M,
+                               int n);
+QEL_API void HypergeometricCdf(double* out, const double* x, unsigned long count, int N, int M,
+                               int n, bool upperTail);
+QEL_API void HypergeometricInvCdf(double* out, const double* p, unsigned long count, int N, int M,
+                                  int n);
 
 // Discrete uniform on the integers lower..upper.
 QEL_API double IntegerUniformPdf(double x, int lower, int upper);
 QEL_API double IntegerUniformCdf(double x, int lower, int upper, bool upperTail);
 QEL_API double IntegerUniformInvCdf(double p, int lower, int upper);
-QEL_API void IntegerUniformPdf(double* out, const double* x, unsigned long count, int lower, int upper);
-QEL_API void IntegerUniformCdf(double* out, const double* x, unsigned long count, int lower, int upper, bool upperTail);
-QEL_API void IntegerUniformInvCdf(double* out, const double* p, unsigned long count, int lower, int upper);
+QEL_API void IntegerUniformPdf(double* out, const double* x, unsigned long count, int lower,
+                               int upper);
+QEL_API void IntegerUniformCdf(double* out, const double* x, unsigned long count, int lower,
+                               int upper, bool upperTail);
+QEL_API void IntegerUniformInvCdf(double* out, const double* p, unsigned long count, int lower,
+                                  int upper);
 
 // Largest extreme value (Gumbel) distribution.
 QEL_API double LargestExtremeValuePdf(double x, double location, double scale);
 QEL_API double LargestExtremeValueCdf(double x, double location, double scale, bool upperTail);
 QEL_API double LargestExtremeValueInvCdf(double p, double location, double scale);
-QEL_API void LargestExtremeValuePdf(double* out, const double* x, unsigned long count, double location, double scale);
-QEL_API void LargestExtremeValueCdf(double* out, const double* x, unsigned long count, double location, double scale, bool upperTail);
-QEL_API void LargestExtremeValueInvCdf(double* out, const double* p, unsigned long count, double location, double scale);
+QEL_API void LargestExtremeValuePdf(double* out, const double* x, unsigned long count,
+                                    double location, double scale);
+QEL_API void LargestExtremeValueCdf(double* out, const double* x, unsigned long count,
+                                    double location, double scale, bool upperTail);
+QEL_API void LargestExtremeValueInvCdf(double* out, const double* p, unsigned long count,
+                                       double location, double scale);
 
 // Tukey's lambda distribution.
 QEL_API double LambdaPdf(double x, double lambda, double location, double scale);
 QEL_API double LambdaCdf(double x, double lambda, double location, double scale, bool upperTail);
 QEL_API double LambdaInvCdf(double p, double lambda, double location, double scale);
-QEL_API void LambdaPdf(double* out, const double* x, unsigned long count, double lambda, double location, double scale);
-QEL_API void LambdaCdf(double* out, const double* x, unsigned long count, double lambda, double location, double scale, bool upperTail);
-QEL_API void LambdaInvCdf(double* out, const double* p, unsigned long count, double lambda, double location, double scale);
+QEL_API void LambdaPdf(double* out, const double* x, unsigned long count, double lambda,
+                       double location, double scale);
+QEL_API void LambdaCdf(double* out, const double* x, unsigned long count, double lambda,
+                       double location, double scale, bool upperTail);
+QEL_API void LambdaInvCdf(double* out, const double* p, unsigned long count, double lambda,
+                          double location, double scale);
 
 // Laplace(location, scale).
 QEL_API double LaplacePdf(double x, double location, double scale);
 QEL_API double LaplaceCdf(double x, double location, double scale, bool upperTail);
 QEL_API double LaplaceInvCdf(double p, double location, double scale);
-QEL_API void LaplacePdf(double* out, const double* x, unsigned long count, double location, double scale);
-QEL_API void LaplaceCdf(double* out, const double* x, unsigned long count, double location, double scale, bool upperTail);
-QEL_API void LaplaceInvCdf(double* out, const double* p, unsigned long count, double location, double scale);
+QEL_API void LaplacePdf(double* out, const double* x, unsigned long count, double location,
+                        double scale);
+QEL_API void LaplaceCdf(double* out, const double* x, unsigned long count, double location,
+                        double scale, bool upperTail);
+QEL_API void LaplaceInvCdf(double* out, const double* p, unsigned long count, double location,
+                           double scale);
 
 // Logistic(location, scale).
 QEL_API double LogisticPdf(double x, double location, double scale);
 QEL_API double LogisticCdf(double x, double location, double scale, bool upperTail);
 QEL_API double LogisticInvCdf(double p, double location, double scale);
-QEL_API void LogisticPdf(double* out, const double* x, unsigned long count, double location, double scale);
-QEL_API void LogisticCdf(double* out, const double* x, unsigned long count, double location, double scale, bool upperTail);
-QEL_API void LogisticInvCdf(double* out, const double* p, unsigned long count, double location, double scale);
+QEL_API void LogisticPdf(double* out, const double* x, unsigned long count, double location,
+                         double scale);
+QEL_API void LogisticCdf(double* out, const double* x, unsigned long count, double location,
+                         double scale, bool upperTail);
+QEL_API void LogisticInvCdf(double* out, const double* p, unsigned long count, double location,
+                            double scale);
 
 // Log-logistic: log(X - threshold) is Logistic(location, scale).
 QEL_API double LogLogisticPdf(double x, double location, double scale, double threshold);
-QEL_API double LogLogisticCdf(double x, double location, double scale, double threshold, bool upperTail);
+QEL_API double LogLogisticCdf(double x, double location, double scale, double threshold,
+                              bool upperTail);
 QEL_API double LogLogisticInvCdf(double p, double location, double scale, double threshold);
-QEL_API void LogLogisticPdf(double* out, const double* x, unsigned long count, double location, double scale, double threshold);
-QEL_API void LogLogisticCdf(double* out, const double* x, unsigned long count, double location, double scale, double threshold, bool upperTail);
-QEL_API void LogLogisticInvCdf(double* out, const double* p, unsigned long count, double location, double scale, double threshold);
+QEL_API void LogLogisticPdf(double* out, const double* x, unsigned long count, double location,
+                            double scale, double threshold);
+QEL_API void LogLogisticCdf(double* out, const double* x, unsigned long count, double location,
+                            double scale, double threshold, bool upperTail);
+QEL_API void LogLogisticInvCdf(double* out, const double* p, unsigned long count, double location,
+                               double scale, double threshold);
 
 // Log-normal: log(X - threshold) is Normal(location, scale).
 QEL_API double LogNormalPdf(double x, double location, double scale, double threshold);
-QEL_API double LogNormalCdf(double x, double location, double scale, double threshold, bool upperTail);
+QEL_API double LogNormalCdf(double x, double location, double scale, double threshold,
+                            bool upperTail);
 QEL_API double LogNormalInvCdf(double p, double location, double scale, double threshold);
-QEL_API void LogNormalPdf(double* out, const double* x, unsigned long count, double location, double scale, double threshold);
-QEL_API void LogNormalCdf(double* out, const double* x, unsigned long count, double location, double scale, double threshold, bool upperTail);
-QEL_API void LogNormalInvCdf(double* out, const double* p, unsigned long count, double location, double scale, double threshold);
+QEL_API void LogNormalPdf(double* out, const double* x, unsigned long count, double location,
+                          double scale, double threshold);
+QEL_API void LogNormalCdf(double* out, const double* x, unsigned long count, double location,
+                          double scale, double threshold, bool upperTail);
+QEL_API void LogNormalInvCdf(double* out, const double* p, unsigned long count, double location,
+                             double scale, double threshold);
 
 // Negative binomial: the number of trials up to the r-th success
 // (support starts at r).
@@ -164,76 +210,100 @@ QEL_API double NegBinomialPdf(double x, double p, double r);
 QEL_API double NegBinomialCdf(double x, double p, double r, bool upperTail);
 QEL_API double NegBinomialInvCdf(double probability, double p, double r);
 QEL_API void NegBinomialPdf(double* out, const double* x, unsigned long count, double p, double r);
-QEL_API void NegBinomialCdf(double* out, const double* x, unsigned long count, double p, double r, bool upperTail);
-QEL_API void NegBinomialInvCdf(double* out, const double* probability, unsigned long count, double p, double r);
+QEL_API void NegBinomialCdf(double* out, const double* x, unsigned long count, double p, double r,
+                            bool upperTail);
+QEL_API void NegBinomialInvCdf(double* out, const double* probability, unsigned long count,
+                               double p, double r);
 
 // Normal(mean, sigma).
 QEL_API double NormalPdf(double x, double mean, double sigma);
 QEL_API double NormalCdf(double x, double mean, double sigma, bool upperTail);
 QEL_API double NormalInvCdf(double p, double mean, double sigma);
-QEL_API void NormalPdf(double* out, const double* x, unsigned long count, double mean, double sigma);
-QEL_API void NormalCdf(double* out, const double* x, unsigned long count, double mean, double sigma, bool upperTail);
-QEL_API void NormalInvCdf(double* out, const double* p, unsigned long count, double mean, double sigma);
+QEL_API void NormalPdf(double* out, const double* x, unsigned long count, double mean,
+                       double sigma);
+QEL_API void NormalCdf(double* out, const double* x, unsigned long count, double mean, double sigma,
+                       bool upperTail);
+QEL_API void NormalInvCdf(double* out, const double* p, unsigned long count, double mean,
+                          double sigma);
 
 // Poisson(mean). The upper tail includes the point.
 QEL_API double PoissonPdf(double x, double mean);
 QEL_API double PoissonCdf(double x, double mean, bool upperTail);
 QEL_API double PoissonInvCdf(double p, double mean);
 QEL_API void PoissonPdf(double* out, const double* x, unsigned long count, double mean);
-QEL_API void PoissonCdf(double* out, const double* x, unsigned long count, double mean, bool upperTail);
+QEL_API void PoissonCdf(double* out, const double* x, unsigned long count, double mean,
+                        bool upperTail);
 QEL_API void PoissonInvCdf(double* out, const double* p, unsigned long count, double mean);
 
 // Smallest extreme value distribution.
 QEL_API double SmallestExtremeValuePdf(double x, double location, double scale);
 QEL_API double SmallestExtremeValueCdf(double x, double location, double scale, bool upperTail);
 QEL_API double SmallestExtremeValueInvCdf(double p, double location, double scale);
-QEL_API void SmallestExtremeValuePdf(double* out, const double* x, unsigned long count, double location, double scale);
-QEL_API void SmallestExtremeValueCdf(double* out, const double* x, unsigned long count, double location, double scale, bool upperTail);
-QEL_API void SmallestExtremeValueInvCdf(double* out, const double* p, unsigned long count, double location, double scale);
+QEL_API void SmallestExtremeValuePdf(double* out, const double* x, unsigned long count,
+                                     double location, double scale);
+QEL_API void SmallestExtremeValueCdf(double* out, const double* x, unsigned long count,
+                                     double location, double scale, bool upperTail);
+QEL_API void SmallestExtremeValueInvCdf(double* out, const double* p, unsigned long count,
+                                        double location, double scale);
 
 // Student's t with df degrees of freedom and a noncentrality (0: central).
 QEL_API double TPdf(double x, double df, double noncentrality);
 QEL_API double TCdf(double x, double df, double noncentrality, bool upperTail);
 QEL_API double TInvCdf(double p, double df, double noncentrality);
-QEL_API void TPdf(double* out, const double* x, unsigned long count, double df, double noncentrality);
-QEL_API void TCdf(double* out, const double* x, unsigned long count, double df, double noncentrality, bool upperTail);
-QEL_API void TInvCdf(double* out, const double* p, unsigned long count, double df, double noncentrality);
+QEL_API void TPdf(double* out, const double* x, unsigned long count, double df,
+                  double noncentrality);
+QEL_API void TCdf(double* out, const double* x, unsigned long count, double df,
+                  double noncentrality, bool upperTail);
+QEL_API void TInvCdf(double* out, const double* p, unsigned long count, double df,
+                     double noncentrality);
 
 // Triangular on [lower, upper] with its peak at mode.
 QEL_API double TriangularPdf(double x, double lower, double mode, double upper);
 QEL_API double TriangularCdf(double x, double lower, double mode, double upper, bool upperTail);
 QEL_API double TriangularInvCdf(double p, double lower, double mode, double upper);
-QEL_API void TriangularPdf(double* out, const double* x, unsigned long count, double lower, double mode, double upper);
-QEL_API void TriangularCdf(double* out, const double* x, unsigned long count, double lower, double mode, double upper, bool upperTail);
-QEL_API void TriangularInvCdf(double* out, const double* p, unsigned long count, double lower, double mode, double upper);
+QEL_API void TriangularPdf(double* out, const double* x, unsigned long count, double lower,
+                           double mode, double upper);
+QEL_API void TriangularCdf(double* out, const double* x, unsigned long count, double lower,
+                           double mode, double upper, bool upperTail);
+QEL_API void TriangularInvCdf(double* out, const double* p, unsigned long count, double lower,
+                              double mode, double upper);
 
 // Uniform on [lower, upper]. Bare frame: no floating-point state change and
 // no parameter check (lower == upper divides by zero and gives infinity).
 QEL_API double UniformPdf(double x, double lower, double upper);
 QEL_API double UniformCdf(double x, double lower, double upper, bool upperTail);
 QEL_API double UniformInvCdf(double p, double lower, double upper);
-QEL_API void UniformPdf(double* out, const double* x, unsigned long count, double lower, double upper);
-QEL_API void UniformCdf(double* out, const double* x, unsigned long count, double lower, double upper, bool upperTail);
-QEL_API void UniformInvCdf(double* out, const double* p, unsigned long count, double lower, double upper);
+QEL_API void UniformPdf(double* out, const double* x, unsigned long count, double lower,
+                        double upper);
+QEL_API void UniformCdf(double* out, const double* x, unsigned long count, double lower,
+                        double upper, bool upperTail);
+QEL_API void UniformInvCdf(double* out, const double* p, unsigned long count, double lower,
+                           double upper);
 
 // Weibull(shape, scale) shifted by threshold.
 QEL_API double WeibullPdf(double x, double shape, double scale, double threshold);
 QEL_API double WeibullCdf(double x, double shape, double scale, double threshold, bool upperTail);
 QEL_API double WeibullInvCdf(double p, double shape, double scale, double threshold);
-QEL_API void WeibullPdf(double* out, const double* x, unsigned long count, double shape, double scale, double threshold);
-QEL_API void WeibullCdf(double* out, const double* x, unsigned long count, double shape, double scale, double threshold, bool upperTail);
-QEL_API void WeibullInvCdf(double* out, const double* p, unsigned long count, double shape, double scale, double threshold);
+QEL_API void WeibullPdf(double* out, const double* x, unsigned long count, double shape,
+                        double scale, double threshold);
+QEL_API void WeibullCdf(double* out, const double* x, unsigned long count, double shape,
+                        double scale, double threshold, bool upperTail);
+QEL_API void WeibullInvCdf(double* out, const double* p, unsigned long count, double shape,
+                           double scale, double threshold);
 
 // Discrete distribution on values with probabilities (size pairs). Bare
 // frame. The first occurrence of a repeated value wins.
 QEL_API double DiscretePdf(double x, const double* values, const double* probabilities, int size);
-QEL_API double DiscreteCdf(double x, const double* values, const double* probabilities, int size, bool upperTail);
-QEL_API double DiscreteInvCdf(double p, const double* values, const double* probabilities, int size);
-QEL_API void DiscretePdf(double* out, const double* x, unsigned long count, const double* values, const double* probabilities, int size);
-QEL_API void DiscreteCdf(double* out, const double* x, unsigned long count, const double* values, const double* probabilities, int size,
-                         bool upperTail);
-QEL_API void DiscreteInvCdf(double* out, const double* p, unsigned long count,
-                            const double* values, const double* probabilities, int size);
+QEL_API double DiscreteCdf(double x, const double* values, const double* probabilities, int size,
+                           bool upperTail);
+QEL_API double DiscreteInvCdf(double p, const double* values, const double* probabilities,
+                              int size);
+QEL_API void DiscretePdf(double* out, const double* x, unsigned long count, const double* values,
+                         const double* probabilities, int size);
+QEL_API void DiscreteCdf(double* out, const double* x, unsigned long count, const double* values,
+                         const double* probabilities, int size, bool upperTail);
+QEL_API void DiscreteInvCdf(double* out, const double* p, unsigned long count, const double* values,
+                            const double* probabilities, int size);
 
 // P-values of test statistics (the tail or tails that the alternative
 // names) and critical values at level alpha. TCritValue divides alpha by k

@@ -202,9 +202,19 @@ def definitions():
     return "\n".join(out) + "\n"
 
 
+def format_in_place(path):
+    """clang-format with the repository's style, where it is installed."""
+    import shutil
+    import subprocess
+    if shutil.which("clang-format"):
+        subprocess.run(["clang-format", "-i", path], check=True)
+
+
 def main():
-    with open(os.path.join(ROOT, "include", "qel", "distributions.h"), "w") as h:
+    header = os.path.join(ROOT, "include", "qel", "distributions.h")
+    with open(header, "w") as h:
         h.write(HEADER % declarations())
+    format_in_place(header)
     with open(os.path.join(ROOT, "src", "interfaces", "math", "random_distributions_table.inc"),
               "w") as inc:
         inc.write(definitions())
