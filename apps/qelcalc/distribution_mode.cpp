@@ -6,7 +6,6 @@
 
 #include <cmath>
 #include <functional>
-#include <utility>
 #include <vector>
 
 #include "cli.h"
@@ -25,66 +24,30 @@ struct Parameter {
 struct Family {
   std::string name;
   std::vector<Parameter> parameters;
-  std::function<double(double, const Values&)> pdf, inv;
+  std::function<double(double, const Values&)> pdf;
   std::function<double(double, const Values&, bool)> cdf;
-  std::function<void(double*, const double*, unsigned long, const Values&)> pdfArray, invArray;
+  std::function<double(double, const Values&)> inv;
+  std::function<void(double*, const double*, unsigned long, const Values&)> pdfArray;
   std::function<void(double*, const double*, unsigned long, const Values&, bool)> cdfArray;
+  std::function<void(double*, const double*, unsigned long, const Values&)> invArray;
 };
 
-template <class... P>
-struct Signatures {
-  using Scalar = double (*)(double, P...);
-  using ScalarCdf = double (*)(double, P..., bool);
-  using Array = void (*)(double*, const double*, unsigned long, P...);
-  using ArrayCdf = void (*)(double*, const double*, unsigned long, P..., bool);
-};
-
-// Binds exported functions whose parameters are all doubles to the generic
-// Family interface: the parameter vector is unpacked in declaration order.
-template <std::size_t... I>
-Family bindFamily(std::string name, std::vector<Parameter> parameters,
-                  typename Signatures<decltype(static_cast<double>(I))...>::Scalar pdf,
-                  typename Signatures<decltype(static_cast<double>(I))...>::ScalarCdf cdf,
-                  typename Signatures<decltype(static_cast<double>(I))...>::Scalar inv,
-                  typename Signatures<decltype(static_cast<double>(I))...>::Array pdfArray,
-                  typename Signatures<decltype(static_cast<double>(I))...>::ArrayCdf cdfArray,
-                  typename Signatures<decltype(static_cast<double>(I))...>::Array invArray,
-                  std::index_sequence<I...>) {
-  Family f;
-  f.name = std::move(name);
-  f.parameters = std::move(parameters);
-  f.pdf = [pdf](double x, const Values& p) { return pdf(x, p[I]...); };
-  f.inv = [inv](double x, const Values& p) { return inv(x, p[I]...); };
-  f.cdf = [cdf](double x, const Values& p, bool upper) { return cdf(x, p[I]..., upper); };
-  f.pdfArray = [pdfArray](double* o, const double* x, unsigned long n, const Values& p) {
-    pdfArray(o, x, n, p[I]...);
-  };
-  f.invArray = [invArray](double* o, const double* x, unsigned long n, const Values& p) {
-    invArray(o, x, n, p[I]...);
-  };
-  f.cdfArray = [cdfArray](double* o, const double* x, unsigned long n, const Values& p,
-                          bool upper) { cdfArray(o, x, n, p[I]..., upper); };
-  return f;
+// An integer parameter must be given as a whole number within int's range.
+int toInt(double value, const char* name) {
+  if (!(std::fabs(value) <= 2147483647.0) || value != std::floor(value)) {
+    throw UsageError(std::string("--") + name + " must be a whole number");
+  }
+  return static_cast<int>(value);
 }
 
-// FAMILY(Name, "name", {params}) binds the six exported functions of Name.
-#define QELCALC_FAMILY(Name, text, N, ...)                                            \
-  bindFamily(text, __VA_ARGS__, &qel::Name##Pdf, &qel::Name##Cdf, &qel::Name##InvCdf, \
-             &qel::Name##Pdf, &qel::Name##Cdf, &qel::Name##InvCdf, std::make_index_sequence<N>())
-
+// One entry per exported family, written by tools/codegen/gen_distribution_api.py
+// from the same table as the library's declarations.
 const std::vector<Family>& families() {
   static const std::vector<Family> table = {
-      QELCALC_FAMILY(Cauchy, "cauchy", 2, {{"location", 0.0}, {"scale", 1.0}}),
-      QELCALC_FAMILY(Logistic, "logistic", 2, {{"location", 0.0}, {"scale", 1.0}}),
-      QELCALC_FAMILY(LogLogistic, "loglogistic", 3,
-                     {{"location", 0.0}, {"scale", 1.0}, {"threshold", 0.0}}),
-      QELCALC_FAMILY(Triangular, "triangular", 3, {{"lower", NAN}, {"mode", NAN}, {"upper", NAN}}),
-      QELCALC_FAMILY(Uniform, "uniform", 2, {{"lower", 0.0}, {"upper", 1.0}}),
+#include "families_table.inc"
   };
   return table;
 }
-
-#undef QELCALC_FAMILY
 
 const Family* findFamily(const std::string& name) {
   for (const auto& f : families())

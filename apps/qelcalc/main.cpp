@@ -9,12 +9,14 @@
 #include "cli.h"
 #include "describe_mode.h"
 #include "distribution_mode.h"
+#include "pvalue_mode.h"
 
 namespace {
 
 void printUsage(std::ostream& out) {
   out << "usage:\n";
   qelcalc::printDistributionUsage(out);
+  qelcalc::printPValueUsage(out);
   qelcalc::printDescribeUsage(out);
   out << "  qelcalc --help\n";
 }
@@ -32,6 +34,7 @@ int main(int argc, char** argv) {
   }
   try {
     const std::string mode = argv[1];
+    if (mode == "pvalue" || mode == "crit") return qelcalc::runPValueMode(argc, argv, std::cout);
     if (qelcalc::isDistributionFamily(mode))
       return qelcalc::runDistributionMode(argc, argv, std::cout);
     if (mode == "describe") return qelcalc::runDescribeMode(argc, argv, std::cout);

@@ -72,6 +72,14 @@ QEL_API void GetOrder(double const* x, unsigned int n, unsigned int* order);
 QEL_API int GetRank(double const* x, unsigned int n, double* rank);
 
 }  // namespace v1
+
+namespace v0 {
+
+// Two-sided P-value of the t test of a correlation r from n pairs; NaN for
+// n <= 2.
+QEL_API double GetLynCorrelationPValue(double r, unsigned int n);
+
+}  // namespace v0
 }  // namespace qel
 
 #endif

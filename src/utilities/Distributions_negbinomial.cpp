@@ -53,9 +53,13 @@ double negBinomialMass(double k, double p, double r) {
     value = 0.0;
   } else {
     const double logComplement = p < 0.5 ? std::log1p(-p) : mLog(1.0 - p, true);
-    value = mExponential(mLogNChooseK(static_cast<int>(m), static_cast<int>(j)) +
-                             j * mLog(p, true) + (m - j) * logComplement,
-                         true);
+    // Beyond the int range (a huge or missing x) the binomial coefficient
+    // is formed on doubles: converting such a count to int would trap.
+    const double logChoose =
+        m <= 2147483647.0
+            ? mLogNChooseK(static_cast<int>(m), static_cast<int>(j))
+            : mLogGamma(m + 1.0) - mLogGamma(j + 1.0) - mLogGamma(m - j + 1.0);
+    value = mExponential(logChoose + j * mLog(p, true) + (m - j) * logComplement, true);
   }
   return value * p;
 }

@@ -20,8 +20,8 @@ inline double missingToNaN(double result) {
   return mIsNumericMissing(result) ? mQuietNaN() : result;
 }
 
-template <class Kernel, class... Params>
-double armed(Kernel kernel, double x, Params... params) {
+template <class Kernel, class X, class... Params>
+double armed(Kernel kernel, X x, Params... params) {
   SetLynFpuStates();
   const double result = kernel(x, params...);
   ResetFpuStates();
@@ -46,9 +46,8 @@ void bareArray(Kernel kernel, double* out, const double* in, unsigned long count
 }  // namespace frame
 }  // namespace qel
 
-// Defines the six exported functions of a family: scalar and array forms of
-// Pdf, Cdf and InvCdf around the kernels m<Family>Pdf, m<Family>Cdf and
-// m<Family>InvCdf. PARAMS is the parenthesised parameter list after the first
+// Defines the scalar and the array form of one exported function around a
+// kernel. PARAMS is the parenthesised parameter list after the first
 // argument, ARGS the matching parenthesised argument names.
 #define QEL_FRAME_UNPACK(...) __VA_ARGS__
 
@@ -59,14 +58,5 @@ void bareArray(Kernel kernel, double* out, const double* in, unsigned long count
   void Name(double* out, const double* in, unsigned long count, QEL_FRAME_UNPACK PARAMS) { \
     ArrayFrame(Kernel, out, in, count, QEL_FRAME_UNPACK ARGS);                             \
   }
-
-#define QEL_DEFINE_ARMED_FAMILY(Family, PARAMS, ARGS)                                             \
-  QEL_DEFINE_FAMILY_FUNCTION(Family##Pdf, m##Family##Pdf, ::qel::frame::armed,                    \
-                             ::qel::frame::armedArray, PARAMS, ARGS)                              \
-  QEL_DEFINE_FAMILY_FUNCTION(Family##Cdf, m##Family##Cdf, ::qel::frame::armed,                    \
-                             ::qel::frame::armedArray, (QEL_FRAME_UNPACK PARAMS, bool upperTail), \
-                             (QEL_FRAME_UNPACK ARGS, upperTail))                                  \
-  QEL_DEFINE_FAMILY_FUNCTION(Family##InvCdf, m##Family##InvCdf, ::qel::frame::armed,              \
-                             ::qel::frame::armedArray, PARAMS, ARGS)
 
 #endif

@@ -1,5 +1,7 @@
-// Exported closed-form families: Cauchy, Logistic, LogLogistic and Triangular
-// in the armed frame, Uniform in the bare frame.
+// The exported distribution families and the exported P-value and
+// critical-value functions: each is a frame around its kernel. The family
+// table lives in tools/codegen/gen_distribution_api.py, which writes the
+// definitions included below and the declarations of <qel/distributions.h>.
 #include <qel/distributions.h>
 
 #include "interfaces/math/frames.h"
@@ -15,19 +17,24 @@ double bare(Kernel kernel, double x, Params... params) {
   return kernel(x, params...);
 }
 
+// The geometric law is the negative binomial with r = 1.
+double geometricPdf(double x, double p) {
+  return mNegBinomialPdf(x, p, 1.0);
+}
+double geometricCdf(double x, double p, bool upperTail) {
+  return mNegBinomialCdf(x, p, 1.0, upperTail);
+}
+double geometricInvCdf(double p, double prob) {
+  return mNegBinomialInvCdf(p, prob, 1.0);
+}
+
+// The smallest extreme value density is the largest one mirrored.
+double smallestExtremeValuePdf(double x, double location, double scale) {
+  return mLargestExtremeValuePdf(-x, -location, scale);
+}
+
 }  // namespace
 
-QEL_DEFINE_ARMED_FAMILY(Cauchy, (double location, double scale), (location, scale))
-QEL_DEFINE_ARMED_FAMILY(Logistic, (double location, double scale), (location, scale))
-QEL_DEFINE_ARMED_FAMILY(LogLogistic, (double location, double scale, double threshold),
-                        (location, scale, threshold))
-QEL_DEFINE_ARMED_FAMILY(Triangular, (double lower, double mode, double upper), (lower, mode, upper))
-
-QEL_DEFINE_FAMILY_FUNCTION(UniformPdf, mUniformPdf, bare, frame::bareArray,
-                           (double lower, double upper), (lower, upper))
-QEL_DEFINE_FAMILY_FUNCTION(UniformCdf, mUniformCdf, bare, frame::bareArray,
-                           (double lower, double upper, bool upperTail), (lower, upper, upperTail))
-QEL_DEFINE_FAMILY_FUNCTION(UniformInvCdf, mUniformInvCdf, bare, frame::bareArray,
-                           (double lower, double upper), (lower, upper))
+#include "interfaces/math/random_distributions_table.inc"
 
 }  // namespace qel

@@ -1,0 +1,289 @@
+#!/usr/bin/env python3
+"""Generates the exported distribution families from one table.
+
+Writes
+  include/qel/distributions.h                        declarations (readable)
+  src/interfaces/math/random_distributions_table.inc definitions (frames)
+
+Each family stands for six exported functions: scalar and array forms of
+Pdf, Cdf (with a final bool upperTail) and InvCdf. The scalar form takes the
+variable first; the array form takes out, in, count, then the same
+parameters. Run after editing the table: python3 tools/codegen/gen_distribution_api.py
+"""
+import os
+
+ROOT = os.path.normpath(os.path.join(os.path.dirname(__file__), "..", ".."))
+
+D = "double"
+I = "int"
+
+# name, parameter list (type, name) shared by the three functions unless
+# overridden, frame ("armed" or "bare"), overrides, comment.
+# Overrides: pdf/cdf/inv -> parameter list; kernel_pdf/kernel_cdf/kernel_inv
+# -> kernel expression name (default m<Name>Pdf etc.).
+FAMILIES = [
+    dict(name="Beta", params=[(D, "a"), (D, "b")], doc="Beta(a, b) on [0, 1]."),
+    dict(name="Binomial", params=[(I, "n"), (D, "p")], cdf=[(D, "n"), (D, "p")],
+         doc="Binomial(n, p). Pdf and InvCdf take an int n, Cdf a double n.\n"
+             "The upper tail includes the point: P(X >= x)."),
+    dict(name="Cauchy", params=[(D, "location"), (D, "scale")], doc="Cauchy(location, scale)."),
+    dict(name="ChiSq", params=[(D, "df"), (D, "noncentrality")], pdf=[(D, "df")],
+         doc="Chi-square with df degrees of freedom and a noncentrality (0: central).\n"
+             "The density is that of the central law."),
+    dict(name="Exponential", params=[(D, "scale"), (D, "threshold")],
+         doc="Exponential(scale) shifted by threshold."),
+    dict(name="F", params=[(D, "df1"), (D, "df2"), (D, "noncentrality")],
+         pdf=[(D, "df1"), (D, "df2")],
+         doc="F(df1, df2) with a noncentrality (0: central). The density is central."),
+    dict(name="Gamma", params=[(D, "shape"), (D, "scale"), (D, "threshold")],
+         doc="Gamma(shape, scale) shifted by threshold."),
+    dict(name="Geometric", params=[(D, "p")],
+         kernel_pdf="geometricPdf", kernel_cdf="geometricCdf", kernel_inv="geometricInvCdf",
+         doc="Geometric: the number of trials up to the first success (negative\n"
+             "binomial with r = 1)."),
+    dict(name="HalfNormal", params=[(D, "scale"), (D, "location")],
+         doc="Half-normal(scale) above location."),
+    dict(name="Hypergeometric", params=[(I, "N"), (I, "M"), (I, "n")],
+         doc="Hypergeometric: population N, M of them marked, sample n. The upper\n"
+             "tail includes the point."),
+    dict(name="IntegerUniform", params=[(I, "lower"), (I, "upper")],
+         doc="Discrete uniform on the integers lower..upper."),
+    dict(name="LargestExtremeValue", params=[(D, "location"), (D, "scale")],
+         doc="Largest extreme value (Gumbel) distribution."),
+    dict(name="Lambda", params=[(D, "lambda"), (D, "location"), (D, "scale")],
+         doc="Tukey's lambda distribution."),
+    dict(name="Laplace", params=[(D, "location"), (D, "scale")], doc="Laplace(location, scale)."),
+    dict(name="Logistic", params=[(D, "location"), (D, "scale")], doc="Logistic(location, scale)."),
+    dict(name="LogLogistic", params=[(D, "location"), (D, "scale"), (D, "threshold")],
+         doc="Log-logistic: log(X - threshold) is Logistic(location, scale)."),
+    dict(name="LogNormal", params=[(D, "location"), (D, "scale"), (D, "threshold")],
+         doc="Log-normal: log(X - threshold) is Normal(location, scale)."),
+    dict(name="NegBinomial", params=[(D, "p"), (D, "r")],
+         doc="Negative binomial: the number of trials up to the r-th success\n"
+             "(support starts at r)."),
+    dict(name="Normal", params=[(D, "mean"), (D, "sigma")], doc="Normal(mean, sigma)."),
+    dict(name="Poisson", params=[(D, "mean")], doc="Poisson(mean). The upper tail includes the point."),
+    dict(name="SmallestExtremeValue", params=[(D, "location"), (D, "scale")],
+         kernel_pdf="smallestExtremeValuePdf", doc="Smallest extreme value distribution."),
+    dict(name="T", params=[(D, "df"), (D, "noncentrality")],
+         doc="Student's t with df degrees of freedom and a noncentrality (0: central)."),
+    dict(name="Triangular", params=[(D, "lower"), (D, "mode"), (D, "upper")],
+         doc="Triangular on [lower, upper] with its peak at mode."),
+    dict(name="Uniform", params=[(D, "lower"), (D, "upper")], frame="bare",
+         cli_defaults={"lower": "0.0", "upper": "1.0"},
+         doc="Uniform on [lower, upper]. Bare frame: no floating-point state change and\n"
+             "no parameter check (lower == upper divides by zero and gives infinity)."),
+    dict(name="Weibull", params=[(D, "shape"), (D, "scale"), (D, "threshold")],
+         doc="Weibull(shape, scale) shifted by threshold."),
+]
+
+# P-value and critical-value functions: name, parameters after the first
+# argument (all armed, kernel m<name>).
+PVALUES = [
+    ("BinomialPValue", (D, "x"), [(I, "n"), (D, "p"), ("EAlternative", "alternative")]),
+    ("ChiSqPValue", (D, "x"), [(D, "df"), ("EAlternative", "alternative")]),
+    ("ChiSqCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative")]),
+    ("FPValue", (D, "x"), [(D, "df1"), (D, "df2"), ("EAlternative", "alternative")]),
+    ("FCritValue", (D, "alpha"), [(D, "df1"), (D, "df2"), ("EAlternative", "alternative")]),
+    ("HypergeometricPValue", (I, "x"), [(I, "N"), (I, "M"), (I, "n"),
+                                        ("EAlternative", "alternative")]),
+    ("NormalPValue", (D, "z"), [("EAlternative", "alternative")]),
+    ("NormalCritValue", (D, "alpha"), [("EAlternative", "alternative")]),
+    ("TPValue", (D, "t"), [(D, "df"), ("EAlternative", "alternative")]),
+    ("TCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative"), (I, "k")]),
+    ("TSidakCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative"), (I, "k")]),
+]
+
+
+def plist(params):
+    return ", ".join(f"{t} {n}" for t, n in params)
+
+
+def alist(params):
+    return ", ".join(n for _, n in params)
+
+
+def function_sets(f):
+    base = f["params"]
+    inv = f.get("inv", base)
+    # The probability argument is p, unless a parameter already has that name.
+    pname = "probability" if any(n == "p" for _, n in inv) else "p"
+    return [
+        ("Pdf", f.get("pdf", base), "x", False),
+        ("Cdf", f.get("cdf", base), "x", True),
+        ("InvCdf", inv, pname, False),
+    ]
+
+
+def declarations():
+    out = []
+    for f in FAMILIES:
+        out.append("")
+        for line in f["doc"].split("\n"):
+            out.append("// " + line)
+        for suffix, params, var, tail in function_sets(f):
+            ps = params + ([("bool", "upperTail")] if tail else [])
+            out.append(f"QEL_API double {f['name']}{suffix}(double {var}, {plist(ps)});")
+        for suffix, params, var, tail in function_sets(f):
+            ps = params + ([("bool", "upperTail")] if tail else [])
+            out.append(f"QEL_API void {f['name']}{suffix}(double* out, const double* {var}, "
+                       f"unsigned long count, {plist(ps)});")
+    out.append("")
+    out.append("// Discrete distribution on values with probabilities (size pairs). Bare")
+    out.append("// frame. The first occurrence of a repeated value wins.")
+    dparams = "const double* values, const double* probabilities, int size"
+    out.append(f"QEL_API double DiscretePdf(double x, {dparams});")
+    out.append(f"QEL_API double DiscreteCdf(double x, {dparams}, bool upperTail);")
+    out.append(f"QEL_API double DiscreteInvCdf(double p, {dparams});")
+    out.append(f"QEL_API void DiscretePdf(double* out, const double* x, unsigned long count, {dparams});")
+    out.append(f"QEL_API void DiscreteCdf(double* out, const double* x, unsigned long count, {dparams},\n"
+               f"                         bool upperTail);")
+    out.append(f"QEL_API void DiscreteInvCdf(double* out, const double* p, unsigned long count,\n"
+               f"                            {dparams});")
+    out.append("")
+    out.append("// P-values of test statistics (the tail or tails that the alternative")
+    out.append("// names) and critical values at level alpha. TCritValue divides alpha by k")
+    out.append("// (Bonferroni), TSidakCritValue uses 1 - (1 - alpha)^(1/k).")
+    for name, first, rest in PVALUES:
+        out.append(f"QEL_API double {name}({first[0]} {first[1]}, {plist(rest)});")
+    return "\n".join(out)
+
+
+HEADER = """// Exported distribution functions. GENERATED by tools/codegen/gen_distribution_api.py
+// from its family table; edit the table, not this file.
+//
+// Each family has a density (or mass), a cumulative probability and an
+// inverse, on one number and on an array. Scalar forms answer NaN when no
+// value exists. Every ...Cdf takes a final upperTail flag: false gives
+// P(X <= x), true gives the upper tail computed as a tail of its own (P(X > x)
+// for continuous laws, P(X >= x) for discrete ones), so that a tiny upper
+// tail keeps its relative accuracy.
+//
+// Array forms: output first, input second, count third, then the parameters
+// of the scalar form; one floating-point state switch serves the whole
+// column. out may equal the input array.
+#ifndef QEL_DISTRIBUTIONS_H
+#define QEL_DISTRIBUTIONS_H
+
+#include <qel/basic_types.h>
+
+namespace qel {
+%s
+
+}  // namespace qel
+
+#endif
+"""
+
+
+def definitions():
+    out = ["// GENERATED by tools/codegen/gen_distribution_api.py; edit its table instead.",
+           "// Included by random_distributions.cpp inside namespace qel."]
+    for f in FAMILIES:
+        bare = f.get("frame") == "bare"
+        frame = "bare" if bare else "frame::armed"
+        array = "frame::bareArray" if bare else "frame::armedArray"
+        for suffix, params, var, tail in function_sets(f):
+            kernel = f.get("kernel_" + {"Pdf": "pdf", "Cdf": "cdf", "InvCdf": "inv"}[suffix],
+                           f"m{f['name']}{suffix}")
+            ps = params + ([("bool", "upperTail")] if tail else [])
+            # The cast picks the overload with this parameter list (several
+            # Cdf kernels also have a both-tails form).
+            types = ", ".join(["double"] + [t for t, _ in ps])
+            kernel = f"static_cast<double (*)({types})>({kernel})"
+            out.append(f"QEL_DEFINE_FAMILY_FUNCTION({f['name']}{suffix},")
+            out.append(f"                           {kernel},")
+            out.append(f"                           {frame}, {array},")
+            out.append(f"                           ({plist(ps)}), ({alist(ps)}))")
+    for name, first, rest in PVALUES:
+        out.append(f"double {name}({first[0]} {first[1]}, {plist(rest)}) {{")
+        out.append(f"  return frame::armed(m{name}, {first[1]}, {alist(rest)});")
+        out.append("}")
+    return "\n".join(out) + "\n"
+
+
+def format_in_place(path):
+    """clang-format with the repository's style, where it is installed."""
+    import shutil
+    import subprocess
+    if shutil.which("clang-format"):
+        subprocess.run(["clang-format", "-i", path], check=True)
+
+
+def main():
+    header = os.path.join(ROOT, "include", "qel", "distributions.h")
+    with open(header, "w") as h:
+        h.write(HEADER % declarations())
+    format_in_place(header)
+    with open(os.path.join(ROOT, "src", "interfaces", "math", "random_distributions_table.inc"),
+              "w") as inc:
+        inc.write(definitions())
+    print("wrote include/qel/distributions.h and src/interfaces/math/random_distributions_table.inc")
+
+
+if __name__ == "__main__":
+    main()
+
+
+def demangled_names():
+    """The demangled names of the generated functions, as nm -C prints them."""
+    def t(ty):
+        return {"EAlternative": "qel::EAlternative"}.get(ty, ty)
+
+    names = []
+    for f in FAMILIES:
+        for suffix, params, var, tail in function_sets(f):
+            types = [t(ty) for ty, _ in params] + (["bool"] if tail else [])
+            names.append(f"qel::{f['name']}{suffix}({', '.join(['double'] + types)})")
+            names.append(f"qel::{f['name']}{suffix}(double*, double const*, unsigned long, "
+                         f"{', '.join(types)})")
+    d = "double const*, double const*, int"
+    for suffix, tail in (("Pdf", False), ("Cdf", True), ("InvCdf", False)):
+        extra = ", bool" if tail else ""
+        names.append(f"qel::Discrete{suffix}(double, {d}{extra})")
+        names.append(f"qel::Discrete{suffix}(double*, double const*, unsigned long, {d}{extra})")
+    for name, first, rest in PVALUES:
+        names.append(f"qel::{name}({', '.join([t(first[0])] + [t(ty) for ty, _ in rest])})")
+    return names
+
+
+# Defaults of qelcalc's options; parameters not listed must be given.
+CLI_DEFAULTS = {"location": "0.0", "scale": "1.0", "threshold": "0.0", "mean": "0.0",
+                "sigma": "1.0", "noncentrality": "0.0"}
+
+
+def cli_table():
+    """Entries of qelcalc's family table: one lambda per function."""
+    out = ["// GENERATED by tools/codegen/gen_distribution_api.py; edit its table instead.",
+           "// Included by apps/qelcalc/distribution_mode.cpp."]
+    for f in FAMILIES:
+        names = []
+        for _, params, _, _ in function_sets(f):
+            for _, n in params:
+                if n not in names:
+                    names.append(n)
+
+        def args(params):
+            parts = []
+            for ty, n in params:
+                v = f"v[{names.index(n)}]"
+                parts.append(f'toInt({v}, "{n}")' if ty == "int" else v)
+            return ", ".join(parts)
+
+        defaults = dict(CLI_DEFAULTS, **f.get("cli_defaults", {}))
+        plist_cli = ", ".join("{\"%s\", %s}" % (n, defaults.get(n, "NAN")) for n in names)
+        (_, pdf, _, _), (_, cdf, _, _), (_, inv, _, _) = function_sets(f)
+        nm = f["name"]
+        out.append("{\"%s\", {%s}," % (nm.lower(), plist_cli))
+        out.append(f" [](double x, const Values& v) {{ return qel::{nm}Pdf(x, {args(pdf)}); }},")
+        out.append(f" [](double x, const Values& v, bool u) {{ return qel::{nm}Cdf(x, {args(cdf)}, u); }},")
+        out.append(f" [](double x, const Values& v) {{ return qel::{nm}InvCdf(x, {args(inv)}); }},")
+        out.append(f" [](double* o, const double* x, unsigned long c, const Values& v) {{ qel::{nm}Pdf(o, x, c, {args(pdf)}); }},")
+        out.append(f" [](double* o, const double* x, unsigned long c, const Values& v, bool u) {{ qel::{nm}Cdf(o, x, c, {args(cdf)}, u); }},")
+        out.append(f" [](double* o, const double* x, unsigned long c, const Values& v) {{ qel::{nm}InvCdf(o, x, c, {args(inv)}); }}}},")
+    return "\n".join(out) + "\n"
+
+
+if __name__ == "__main__":
+    with open(os.path.join(ROOT, "apps", "qelcalc", "families_table.inc"), "w") as inc:
+        inc.write(cli_table())
