@@ -92,6 +92,35 @@ QEL_API double inv_normal_df0(double p);
 QEL_API void normal_upper_quant(double p, double* z);
 QEL_API void normal_lower_quant(double p, double* z);
 
+/* Standard normal: lower = P(Z <= x), upper = P(Z > x); inverse on
+ * [1e-100, 1]. */
+QEL_API void normal_df(double x, double* lower, double* upper);
+QEL_API void inv_normal_df(double p, double* z);
+
+/* Hypergeometric: population N, M marked, sample n; X marked in the sample.
+ * lower = P(X <= k), upper = P(X > k). Quantiles return k and the fraction f
+ * with P(X < k) + f P(X = k) = p (lower form) or P(X > k) + f P(X = k) = p
+ * (upper form). */
+QEL_API void hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                         double* lower, double* upper, double* mass);
+QEL_API void hyper_intern(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                          double* lower, double* upper, double* mass);
+QEL_API int hyper_Ik(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                     double* out);
+QEL_API int hyper_Jk(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                     double* out);
+QEL_API void hypergeo_lower_quant(unsigned long N, unsigned long M, unsigned long n,
+                                  unsigned long* k, double* f, double p);
+QEL_API void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned long n,
+                                  unsigned long* k, double* f, double p);
+
+/* Complementary Owen's T: the integral from h to infinity of phi(x) Q(a x),
+ * a > 0; returns 0 or 4. */
+QEL_API int Tha_c(double* out, double h, double a);
+/* Far lower tail of the noncentral t at t < 0 < delta, integrated around
+ * its saddle point. */
+QEL_API double t_saddle_approx(double t, double df, double delta);
+
 #ifdef __cplusplus
 }
 #endif

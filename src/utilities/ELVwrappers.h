@@ -40,6 +40,17 @@ ElvStatus elv_poisson_df(unsigned long k, double mean, double& lower, double& up
 ElvStatus elv_poisson_lower_quant(double p, double mean, unsigned long& k, double& fraction);
 ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long& k, double& fraction);
 
+// Normal, t, noncentral t and hypergeometric: outputs through pointers.
+ElvStatus elv_normal_df(double x, double* lower, double* upper);
+ElvStatus elv_inv_normal_df(double p, double* quantile);
+// Hypergeometric: lower = P(X <= k), upper = P(X > k).
+ElvStatus elv_hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
+                          double* lower, double* upper, double* mass);
+ElvStatus elv_hypergeo_lower_quant(double p, unsigned long N, unsigned long M, unsigned long n,
+                                   unsigned long* k, double* fraction);
+ElvStatus elv_hypergeo_upper_quant(double p, unsigned long N, unsigned long M, unsigned long n,
+                                   unsigned long* k, double* fraction);
+
 }  // namespace qel
 
 #endif
