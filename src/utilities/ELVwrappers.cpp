@@ -102,4 +102,37 @@ ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long& k, doubl
   return discreteQuantile(poisson_upper_quant, p, mean, k, fraction);
 }
 
+// Pointer forms of the gamma, chi-square and Poisson wrappers.
+ElvStatus elv_gamma_df(double x, double a, double* lower, double* upper, double* density) {
+  return elv_gamma_df(x, a, *lower, *upper, *density);
+}
+
+ElvStatus elv_gamma_lower_quant(double p, double a, double* quantile) {
+  return elv_gamma_lower_quant(p, a, *quantile);
+}
+
+ElvStatus elv_gamma_upper_quant(double p, double a, double* quantile) {
+  return elv_gamma_upper_quant(p, a, *quantile);
+}
+
+ElvStatus elv_chi2_ncdf(double x, double df, double L, double* lower, double* upper) {
+  return elv_chi2_ncdf(x, df, L, *lower, *upper);
+}
+
+ElvStatus elv_chi2_lower_quant(double p, double df, double* quantile) {
+  return elv_chi2_lower_quant(p, df, *quantile);
+}
+
+ElvStatus elv_chi2_upper_quant(double p, double df, double* quantile) {
+  return elv_chi2_upper_quant(p, df, *quantile);
+}
+
+ElvStatus elv_poisson_lower_quant(double p, double mean, unsigned long* k, double* fraction) {
+  return elv_poisson_lower_quant(p, mean, *k, *fraction);
+}
+
+ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long* k, double* fraction) {
+  return elv_poisson_upper_quant(p, mean, *k, *fraction);
+}
+
 }  // namespace qel

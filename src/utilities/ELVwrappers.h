@@ -51,6 +51,18 @@ ElvStatus elv_hypergeo_lower_quant(double p, unsigned long N, unsigned long M, u
 ElvStatus elv_hypergeo_upper_quant(double p, unsigned long N, unsigned long M, unsigned long n,
                                    unsigned long* k, double* fraction);
 
+// Pointer forms of the gamma, chi-square and Poisson wrappers, the form in
+// which the distribution kernels call every wrapper. They forward to the
+// reference forms above.
+ElvStatus elv_gamma_df(double x, double a, double* lower, double* upper, double* density);
+ElvStatus elv_gamma_lower_quant(double p, double a, double* quantile);
+ElvStatus elv_gamma_upper_quant(double p, double a, double* quantile);
+ElvStatus elv_chi2_ncdf(double x, double df, double L, double* lower, double* upper);
+ElvStatus elv_chi2_lower_quant(double p, double df, double* quantile);
+ElvStatus elv_chi2_upper_quant(double p, double df, double* quantile);
+ElvStatus elv_poisson_lower_quant(double p, double mean, unsigned long* k, double* fraction);
+ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long* k, double* fraction);
+
 }  // namespace qel
 
 #endif

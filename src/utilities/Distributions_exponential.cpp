@@ -1,0 +1,197 @@
+// Exponential, extreme-value (Gumbel), Weibull and Laplace distributions.
+//
+// All four rest on the exponential tails: with e = exp(-z) the upper tail is
+// e itself, and the lower tail 1 - e is exact enough while e <= 0.999. Above
+// that the subtraction would cancel, so the lower tail comes from the
+// chi-square routine on 2 degrees of freedom at 2z, which is the same
+// distribution computed as a small tail in its own right.
+#include <cmath>
+#include <stdexcept>
+
+#include "utilities/Distributions.h"
+#include "utilities/ELVwrappers.h"
+#include "utilities/LYNBasicTypes.h"
+#include "utilities/MathUtilities.h"
+#include "utilities/SpecialFunctions.h"
+
+namespace qel {
+
+namespace {
+
+// -ln(1 - p): by log1p below 1/2, where 1 - p would round away the digits
+// of a small p; by the checked logarithm above (it refuses p = 1).
+double minusLogComplement(double p) {
+  if (p < 0.5) return -std::log1p(-p);
+  return -mLog(1.0 - p, true);
+}
+
+// -ln(p): for p above 1/2 by log1p of the exact p - 1.
+double minusLog(double p) {
+  if (p > 0.5) return -std::log1p(p - 1.0);
+  return -mLog(p, true);
+}
+
+// The largest extreme-value quantile location - scale ln(-ln p), with
+// -ln p formed by minusLog (p) or minusLogComplement (of q = 1 - p) when the
+// caller holds the exact complement.
+double largestExtremeValueQuantile(double minusLogP, double location, double scale) {
+  return location - scale * mLog(minusLogP, true);
+}
+
+}  // namespace
+
+// --- Exponential -----------------------------------------------------------
+
+double mExponentialPdf(double x, double scale, double threshold) {
+  try {
+    if (x < threshold) return 0.0;
+    return mExponential(-(x - threshold) / scale, true) / scale;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+double mExponentialCdf(double x, double scale, double threshold, bool upperTail) {
+  if (x <= threshold) return upperTail ? 1.0 : 0.0;
+  try {
+    const double z = (x - threshold) / scale;
+    const double e = mExponential(-z, true);
+    if (upperTail) return e;
+    if (e <= 0.999) return 1.0 - e;
+    double lower = 0.0, upper = 0.0;
+    if (ElvFailed(elv_chi2_ncdf(z + z, 2.0, 0.0, &lower, &upper))) return mGetMissingValueCode();
+    return lower;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+double mExponentialInvCdf(double p, double scale, double threshold) {
+  try {
+    return threshold + scale * minusLogComplement(p);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+// --- Extreme value ---------------------------------------------------------
+
+double mLargestExtremeValuePdf(double x, double location, double scale) {
+  try {
+    const double e = mExponential(-(x - location) / scale, true);
+    return e * mExponential(-e, true) / scale;
+  } catch (const std::runtime_error&) {
+    return 0.0;
+  }
+}
+
+// The lower tail exp(-e) is the upper tail of a unit exponential at e.
+double mLargestExtremeValueCdf(double x, double location, double scale, bool upperTail) {
+  try {
+    const double e = mExponential(-(x - location) / scale, true);
+    return mExponentialCdf(e, 1.0, 0.0, !upperTail);
+  } catch (const std::runtime_error&) {
+    // exp(-z) overflowed: x lies far below the location.
+    return upperTail ? 1.0 : 0.0;
+  }
+}
+
+double mLargestExtremeValueInvCdf(double p, double location, double scale) {
+  try {
+    return largestExtremeValueQuantile(minusLog(p), location, scale);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+double mSmallestExtremeValuePdf(double x, double location, double scale) {
+  return mLargestExtremeValuePdf(-x, -location, scale);
+}
+
+double mSmallestExtremeValueCdf(double x, double location, double scale, bool upperTail) {
+  return mLargestExtremeValueCdf(-x, -location, scale, !upperTail);
+}
+
+// The mirror of the largest extreme-value quantile at 1 - p. Its -ln(1 - p)
+// is taken from p itself, which the caller holds exactly.
+double mSmallestExtremeValueInvCdf(double p, double location, double scale) {
+  double q;
+  try {
+    q = largestExtremeValueQuantile(minusLogComplement(p), -location, scale);
+  } catch (const std::runtime_error&) {
+    q = mGetMissingValueCode();
+  }
+  if (q >= mGetMissingValueCode()) return q;
+  return -q;
+}
+
+// --- Weibull ---------------------------------------------------------------
+
+double mWeibullPdf(double x, double shape, double scale, double threshold) {
+  if (x <= threshold) return 0.0;
+  try {
+    const double z = (x - threshold) / scale;
+    const double zShape = mRaiseToPower(z, shape, true);
+    return shape * mExponential(-zShape, true) * mRaiseToPower(z, shape - 1.0, true) / scale;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+double mWeibullCdf(double x, double shape, double scale, double threshold, bool upperTail) {
+  if (x <= threshold) return upperTail ? 1.0 : 0.0;
+  try {
+    const double z = (x - threshold) / scale;
+    return mExponentialCdf(mRaiseToPower(z, shape, true), 1.0, 0.0, upperTail);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+double mWeibullInvCdf(double p, double shape, double scale, double threshold) {
+  if (p == 0.0) return threshold;
+  if (p == 1.0) return mGetMissingValueCode();
+  try {
+    return threshold + scale * mRaiseToPower(minusLogComplement(p), 1.0 / shape, true);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+// --- Laplace ---------------------------------------------------------------
+
+double mLaplacePdf(double x, double location, double scale) {
+  try {
+    return mExponential(-std::fabs(x - location) / scale, true) / (2.0 * scale);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+// The tail beyond the location is half an exponential tail; the side that
+// holds the location adds one half to half the exponential lower tail.
+double mLaplaceCdf(double x, double location, double scale, bool upperTail) {
+  try {
+    double s = (x - location) / scale;
+    if (upperTail) s = -s;
+    if (s < 0.0) return 0.5 * mExponential(s, true);
+    const double e = mExponentialCdf(s, 1.0, 0.0, false);
+    if (mIsNumericMissing(e)) return e;
+    return 0.5 + 0.5 * e;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+double mLaplaceInvCdf(double p, double location, double scale) {
+  if (p == 0.0 || p == 1.0) return mGetMissingValueCode();
+  if (mEqualWithinFuzz(p, 0.5, 0.0)) return location;
+  try {
+    if (p <= 0.5) return location + scale * mLog(2.0 * p, true);
+    return location - scale * mLog(2.0 - 2.0 * p, true);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+}  // namespace qel

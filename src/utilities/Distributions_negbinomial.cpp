@@ -1,0 +1,153 @@
+// Negative binomial distribution in the trials form: X counts the trials up
+// to and including the r-th success, so the support starts at r. The
+// geometric distribution is the case r = 1.
+//
+// The tails use the binomial relation P(X <= x) = P(B >= r), with B the
+// number of successes in x trials; for r = 1 they are the closed forms of the
+// geometric distribution. The quantile starts from the Cornish-Fisher
+// expansion (skewness term) of the negative binomial and finishes with an
+// integer search on the distribution function.
+#include <cmath>
+#include <stdexcept>
+
+#include "utilities/Distributions.h"
+#include "utilities/Distributions_discrete_rules.h"
+#include "utilities/LYNBasicTypes.h"
+#include "utilities/MathUtilities.h"
+#include "utilities/SpecialFunctions.h"
+
+namespace qel {
+
+namespace {
+
+bool isGeometric(double r) {
+  return mEqualWithinFuzz(r, 1.0, 0.0);
+}
+
+// (1 - p)^m for a count m >= 0, through log1p where 1 - p would round away
+// the digits of a small p.
+double complementPower(double p, double m) {
+  if (p > 0.0 && p < 0.5) return mExponential(m * std::log1p(-p), true);
+  return mRaiseToPower(1.0 - p, m, true);
+}
+
+// 1 - (1 - p)^m, without cancellation for small p m.
+double oneMinusComplementPower(double p, double m) {
+  if (p > 0.0 && p < 0.5) return -std::expm1(m * std::log1p(-p));
+  return 1.0 - mRaiseToPower(1.0 - p, m, true);
+}
+
+double negBinomialMass(double k, double p, double r) {
+  if (k < r) return 0.0;
+  if (isGeometric(r)) return p * complementPower(p, k - 1.0);
+  const double jr = mNearestInteger(r - 1.0);
+  if (!mEqualWithinFuzz(r - 1.0, jr, 0.0)) return 0.0;
+  const double m = k - 1.0;
+  const double j = jr;
+  double value;
+  if (p == 0.0) {
+    value = j == 0.0 ? 1.0 : 0.0;
+  } else if (p == 1.0) {
+    value = m == j ? 1.0 : 0.0;
+  } else if (j < 0.0 || j > m) {
+    value = 0.0;
+  } else {
+    const double logComplement = p < 0.5 ? std::log1p(-p) : mLog(1.0 - p, true);
+    value = mExponential(mLogNChooseK(static_cast<int>(m), static_cast<int>(j)) +
+                             j * mLog(p, true) + (m - j) * logComplement,
+                         true);
+  }
+  return value * p;
+}
+
+}  // namespace
+
+CmNegBinomialCdf::CmNegBinomialCdf(double p, double r, double target, bool tail)
+    : mP(p), mR(r), mTail(tail) {
+  mTarget = target;
+}
+
+double CmNegBinomialCdf::operator()(double x) {
+  return mNegBinomialCdf(x, mP, mR, mTail) - mTarget;
+}
+
+double mNegBinomialPdf(double x, double p, double r) {
+  double k;
+  if (!discrete::massPoint(x, &k)) return 0.0;
+  return negBinomialMass(k, p, r);
+}
+
+double mNegBinomialCdf(double x, double p, double r, bool upperTail) {
+  const double k = discrete::cdfPoint(x);
+  if (!upperTail) {
+    if (k < r) return 0.0;
+    if (isGeometric(r)) return oneMinusComplementPower(p, k);
+    // At least r successes in k trials.
+    return mBinomialCdf(r, k, p, true);
+  }
+  if (k <= r) return 1.0;
+  if (isGeometric(r)) return complementPower(p, k - 1.0);
+  // Fewer than r successes in the first k - 1 trials.
+  return mBinomialCdf(r - 1.0, k - 1.0, p, false);
+}
+
+double mNegBinomialInvCdf(double p, double prob, double r) {
+  try {
+    if (p <= mRaiseToPower(prob, r, true)) return r;
+    if (mEqualWithinFuzz(p, 1.0, 0.0) || mEqualWithinFuzz(prob, 0.0, 0.0)) {
+      return mGetMissingValueCode();
+    }
+    if (isGeometric(r)) {
+      double k = std::ceil(std::fabs(mLog(1.0 - p, true) / mLog(1.0 - prob, true)));
+      while (k > 1.0 && mNegBinomialCdf(k - 1.0, prob, r, false) >= p) k -= 1.0;
+      return k;
+    }
+    // Cornish-Fisher start: mean r/prob, standard deviation sqrt(r(1-prob))/prob,
+    // skewness correction (z^2 - 1)(2 - prob)/6 on the scale of prob.
+    const double z = mNormalInvCdf(p, 0.0, 1.0);
+    if (mIsNumericMissing(z)) return z;
+    double start = std::ceil(
+        (r + z * mSqrt(r * (1.0 - prob), true) + (z * z - 1.0) * (2.0 - prob) / 6.0) / prob + 0.5);
+    if (start < r) start = r;
+    CmNegBinomialCdf f(prob, r, p, false);
+    f.mIntegerValued = true;
+    // The lower end r has F(r) = prob^r < p; widen the upper end by a quarter
+    // of its distance from r until F reaches p there.
+    double x1 = start, x2 = start;
+    double f2 = f(x2);
+    while (f2 < 0.0) {
+      x1 = x2;
+      x2 += std::ceil((x2 - r) / 4.0) + 1.0;
+      f2 = f(x2);
+      if (mIsNumericMissing(f2)) return f2;
+    }
+    if (x1 == x2) {
+      // The start already lies at or above the quantile: widen downwards.
+      double f1 = f(x1);
+      while (f1 >= 0.0 && x1 > r) {
+        x1 -= std::ceil((x1 - r) / 4.0);
+        if (x1 < r) x1 = r;
+        f1 = f(x1);
+        if (mIsNumericMissing(f1)) return f1;
+      }
+    }
+    int status = 0;
+    return mRootFinder(x1, x2, f, &status);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
+}
+
+double mGeometricPdf(double x, double p) {
+  return mNegBinomialPdf(x, p, 1.0);
+}
+
+double mGeometricCdf(double x, double p, bool upperTail) {
+  return mNegBinomialCdf(x, p, 1.0, upperTail);
+}
+
+double mGeometricInvCdf(double p, double prob) {
+  return mNegBinomialInvCdf(p, prob, 1.0);
+}
+
+}  // namespace qel
