@@ -286,9 +286,14 @@ double CmDistBeta::mDrawBB() const {
   return mFirstIsSmaller ? x : 1.0 - x;
 }
 
+// BC with w = large e^v kept as its logarithm: for small shapes v reaches
+// hundreds, where w itself overflows although w/(small + w) and its
+// complement are plain numbers; both are formed directly, so that a draw near
+// 0 keeps its relative accuracy.
 double CmDistBeta::mDrawBC() const {
   const double ln4 = 1.3862944;
-  double w = 0.0;
+  const double lnSmall = std::log(mSmall), lnLarge = std::log(mLarge);
+  double lnW = lnLarge, lnSum = std::log(mSmall + mLarge);
   try {
     for (;;) {
       const double u1 = mUniform();
@@ -300,23 +305,21 @@ double CmDistBeta::mDrawBC() const {
         if (0.25 * u2 + z - y >= mK1) continue;
       } else {
         z = u1 * u1 * u2;
-        if (z <= 0.25) {
-          const double v = mBeta * mLog(u1 / (1.0 - u1), true);
-          w = mLarge * mExponential(v, true);
-          break;
-        }
-        if (z >= mK2) continue;
+        if (z >= mK2 && z > 0.25) continue;
       }
       const double v = mBeta * mLog(u1 / (1.0 - u1), true);
-      w = mLarge * mExponential(v, true);
-      if (mAlpha * (mLog(mAlpha / (mSmall + w), true) + v) - ln4 >= mLog(z, true)) break;
+      lnW = lnLarge + v;
+      // ln(small + w) without forming w.
+      lnSum = lnW > lnSmall ? lnW + std::log1p(std::exp(lnSmall - lnW))
+                            : lnSmall + std::log1p(std::exp(lnW - lnSmall));
+      if (u1 >= 0.5 && z <= 0.25) break;
+      if (mAlpha * (std::log(mAlpha) - lnSum + v) - ln4 >= mLog(z, true)) break;
     }
   } catch (const std::runtime_error&) {
     mMsgCode = qelFailRandomVariate;
   }
-  // x has the larger shape first; w may be infinite only after a failure.
-  const double x = w / (mSmall + w);
-  return mFirstIsSmaller ? 1.0 - x : x;
+  // w/(small + w) has the larger shape first, small/(small + w) the smaller.
+  return std::exp(mFirstIsSmaller ? lnSmall - lnSum : lnW - lnSum);
 }
 
 }  // namespace qel
