@@ -132,11 +132,14 @@ int Sampler::F(double* out, unsigned n, double df1, double df2, double) {
   CmDistBeta beta(df1 * 0.5, df2 * 0.5);
   beta.SetBrng(mGenerator);
   const double top = 1.0 - mGetEps(false);
+  // Bad degrees of freedom leave the beta's missing values as they are; the
+  // ratio is formed only when it exists, since the frame traps 1/0.
+  const bool valid = df1 > 0.0 && df2 > 0.0;
+  const double ratio = valid ? df2 / df1 : 0.0;
   for (unsigned i = 0; i < n; ++i) {
     double x = beta.mGetRandom();
     if (x > top) x = top;
-    // Bad degrees of freedom leave the missing value as it is.
-    out[i] = mIsNumericMissing(x) ? x : (df2 / df1) * (x / (1.0 - x));
+    out[i] = valid ? ratio * (x / (1.0 - x)) : x;
   }
   ResetFpuStates();
   return beta.GetMsgCode();
