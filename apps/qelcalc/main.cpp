@@ -9,6 +9,7 @@
 #include "cli.h"
 #include "describe_mode.h"
 #include "distribution_mode.h"
+#include "sample_mode.h"
 
 namespace {
 
@@ -16,6 +17,7 @@ void printUsage(std::ostream& out) {
   out << "usage:\n";
   qelcalc::printDistributionUsage(out);
   qelcalc::printDescribeUsage(out);
+  qelcalc::printSampleUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -35,6 +37,7 @@ int main(int argc, char** argv) {
     if (qelcalc::isDistributionFamily(mode))
       return qelcalc::runDistributionMode(argc, argv, std::cout);
     if (mode == "describe") return qelcalc::runDescribeMode(argc, argv, std::cout);
+    if (mode == "sample") return qelcalc::runSampleMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";
