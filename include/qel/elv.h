@@ -114,12 +114,57 @@ QEL_API void hypergeo_lower_quant(unsigned long N, unsigned long M, unsigned lon
 QEL_API void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned long n,
                                   unsigned long* k, double* f, double p);
 
+/* Student t with df degrees of freedom and noncentrality delta:
+ * lower = P(T <= t), upper = P(T > t). Quantiles for p in [1e-12, 0.5] and
+ * df in [0.002, 189812530]. */
+QEL_API void t_df(double t, double df, double* lower, double* upper);
+QEL_API void t_upper_quant(double p, double df, double* q);
+QEL_API void t_lower_quant(double p, double df, double* q);
+QEL_API void t_ncdf(double t, double df, double delta, double* lower, double* upper);
 /* Complementary Owen's T: the integral from h to infinity of phi(x) Q(a x),
  * a > 0; returns 0 or 4. */
 QEL_API int Tha_c(double* out, double h, double a);
 /* Far lower tail of the noncentral t at t < 0 < delta, integrated around
- * its saddle point. */
+ * its saddle point; -1 for arguments outside df in (0, 189812530],
+ * finite t and |delta| below 1e6. */
 QEL_API double t_saddle_approx(double t, double df, double delta);
+
+/* Beta family: shapes a, b; lower = I_x(a,b), upper = 1 - I_x(a,b). The
+ * scaled series return 0 or 4: I_x(a,b) = density * beta_Iabx,
+ * 1 - I_x(a,b) = density (1-x)/b * beta_Jabx. */
+QEL_API int beta_Iabx(double* out, double a, double b, double x);
+QEL_API int beta_Jabx(double* out, double a, double b, double x);
+QEL_API int beta_J_complete(double* out, double a, double b, double x);
+QEL_API double beta_ps(double x, double a, double b);
+QEL_API double beta_lntab(double a, double b); /* ln(b^a Gamma(b)/Gamma(a+b)) */
+QEL_API void beta_df(double x, double a, double b, double* lower, double* upper, double* density);
+/* Noncentral beta: Poisson(L) mixture of I_x(a+j, b) (beta_ncdf) or of
+ * I_x(a, b+j) (beta_ncdf2). */
+QEL_API void beta_ncdf(double x, double a, double b, double L, double* lower, double* upper);
+QEL_API void beta_ncdf2(double x, double a, double b, double L, double* lower, double* upper);
+/* Newton iteration on beta_df: mode 'L' solves lower = target, 'U' upper. */
+QEL_API int beta_newton(double* x, char mode, double target, double a, double b);
+/* Starting values of the quantile: modes -1, 1 (small x), -2, 2 (Cornish-Fisher). */
+QEL_API void beta_quant0(int mode, double* q1, double* q2, double p, double a, double b);
+/* x with I_x(a,b) = p in lower, 1 - x in upper; returns the code left in ELVerrno. */
+QEL_API int beta_quant(double* lower, double* upper, double p, double a, double b);
+QEL_API void beta_upper_quant(double p, double a, double b, double* q);
+QEL_API void beta_lower_quant(double p, double a, double b, double* q);
+
+/* Binomial with n trials: lower = P(X <= k), upper = P(X > k). */
+QEL_API void binomial_df(long k, long n, double prob, double* lower, double* upper, double* mass);
+QEL_API int binomial_Ik(long k, long n, double* out, double prob);
+QEL_API int binomial_Jk(long k, long n, double* out, double prob);
+/* Quantiles with the fraction f: lower form P(X < k) + f P(X = k) = p,
+ * upper form P(X > k) + f P(X = k) = p. */
+QEL_API void binomial_upper_quant(long n, double p, double prob, long* k, double* f);
+QEL_API void binomial_lower_quant(long n, double p, double prob, long* k, double* f);
+
+/* F with df1, df2 degrees of freedom and noncentrality L. */
+QEL_API void F_df(double x, double df1, double df2, double* lower, double* upper);
+QEL_API void F_ncdf(double x, double df1, double df2, double L, double* lower, double* upper);
+QEL_API void F_upper_quant(double p, double df1, double df2, double* q);
+QEL_API void F_lower_quant(double p, double df1, double df2, double* q);
 
 #ifdef __cplusplus
 }

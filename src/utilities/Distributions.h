@@ -138,6 +138,49 @@ double mChiSqInvCdfByRootFinder(double p, double df, double noncentrality, doubl
 double mChiSqPValue(double x, double df, EAlternative alternative);
 double mChiSqCritValue(double alpha, double df, EAlternative alternative);
 
+// Student's t lower tail (noncentral) minus the target p.
+class CmTCdf : public CmRealFunction {
+ public:
+  CmTCdf(double df, double noncentrality, double p);
+  double operator()(double x) override;
+  double mDf;
+  double mNoncentrality;
+  double mP;
+};
+
+double mTPdf(double x, double df, double noncentrality);
+double mTCdf(double x, double df, double noncentrality, bool upperTail);
+// Both tails; false (and missing tails) when there is no answer.
+bool mTCdf(double x, double df, double noncentrality, double* lower, double* upper);
+double mTInvCdf(double p, double df, double noncentrality);
+double mTPValue(double t, double df, EAlternative alternative);
+// Critical values for k comparisons: Bonferroni (alpha/k) and Sidak
+// (1 - (1 - alpha)^(1/k)) per comparison.
+double mTCritValue(double alpha, double df, EAlternative alternative, int k);
+double mTSidakCritValue(double alpha, double df, EAlternative alternative, int k);
+
+double mBetaPdf(double x, double a, double b);
+double mBetaCdf(double x, double a, double b, bool upperTail);
+double mBetaInvCdf(double p, double a, double b);
+
+// Lower tail of the (noncentral) F distribution minus the target p.
+class CmFCdf : public CmRealFunction {
+ public:
+  CmFCdf(double df1, double df2, double noncentrality, double p);
+  double operator()(double x) override;
+  double mDf1;
+  double mDf2;
+  double mNoncentrality;
+  double mP;
+};
+
+double mFPdf(double x, double df1, double df2);
+double mFCdf(double x, double df1, double df2, double noncentrality, bool upperTail);
+bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower, double* upper);
+double mFInvCdf(double p, double df1, double df2, double noncentrality);
+double mFPValue(double x, double df1, double df2, EAlternative alternative);
+double mFCritValue(double alpha, double df1, double df2, EAlternative alternative);
+
 // ---------------------------------------------------------------------------
 // Discrete kernels. x should be a whole number: a Pdf answers 0 unless x is
 // an integer within fuzz 0; a Cdf takes that integer, or else floor(x). The
@@ -157,6 +200,7 @@ class CmLRatio : public CmRealFunction {
 
 double mBinomialPdf(double x, int n, double p);
 double mBinomialCdf(double x, double n, double p, bool upperTail);
+double mBinomialInvCdf(double p, int n, double prob);
 double mBinomialPValue(double x, int n, double p, EAlternative alternative);
 
 double mPoissonPdf(double x, double mean);

@@ -14,6 +14,7 @@
 
 #include "utilities/Distributions.h"
 #include "utilities/Distributions_discrete_rules.h"
+#include "utilities/ELVwrappers.h"
 #include "utilities/IncompleteBeta.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
@@ -53,7 +54,28 @@ double mBinomialCdf(double x, double n, double p, bool upperTail) {
   const double k = discrete::cdfPoint(x);
   if (k < 0.0) return 0.0;
   if (k >= n) return 1.0;
+  if (n <= mGetMaxInteger()) {
+    double lower = 0.0, upper = 0.0, mass = 0.0;
+    if (!ElvFailed(elv_binomial_df(static_cast<unsigned long>(k), static_cast<unsigned long>(n), p,
+                                   &lower, &upper, &mass))) {
+      return lower;
+    }
+  }
   return binomialLowerTailByBeta(k, n, p);
+}
+
+double mBinomialInvCdf(double p, int n, double prob) {
+  if (p == 0.0) return 0.0;
+  if (p == 1.0) return n;
+  unsigned long k = 0;
+  double fraction = 0.0;
+  const bool lowerRoutine = p <= 0.5;
+  const unsigned long trials = static_cast<unsigned long>(n);
+  const ElvStatus status = lowerRoutine
+                               ? elv_binomial_lower_quant(p, trials, prob, &k, &fraction)
+                               : elv_binomial_upper_quant(1.0 - p, trials, prob, &k, &fraction);
+  if (ElvFailed(status)) return mGetMissingValueCode();
+  return discrete::correctedQuantile(static_cast<double>(k), fraction, lowerRoutine);
 }
 
 double mLRatio(int n, int k, double p) {

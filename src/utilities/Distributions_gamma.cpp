@@ -9,6 +9,7 @@
 #include <stdexcept>
 
 #include "utilities/Distributions.h"
+#include "utilities/Distributions_pvalue.h"
 #include "utilities/ELVwrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/SpecialFunctions.h"
@@ -190,16 +191,7 @@ double mChiSqInvCdfByRootFinder(double p, double df, double noncentrality, doubl
 double mChiSqPValue(double x, double df, EAlternative alternative) {
   double lower = 0.0, upper = 0.0;
   if (!mChiSqCdf(x, df, 0.0, &lower, &upper)) return mGetMissingValueCode();
-  switch (alternative) {
-    case kAlternativeLess:
-      return lower;
-    case kAlternativeGreater:
-      return upper;
-    case kAlternativeNotEqual:
-      return 2.0 * std::fmin(lower, upper);
-    default:
-      return 0.0;
-  }
+  return mPValueFromTails(lower, upper, alternative);
 }
 
 // Only the one-sided critical values exist: the two-sided case is 0.0.

@@ -6,6 +6,7 @@
 #include <stdexcept>
 
 #include "utilities/Distributions.h"
+#include "utilities/Distributions_pvalue.h"
 #include "utilities/ELVwrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/SpecialFunctions.h"
@@ -26,20 +27,6 @@ double standardNormalQuantile(double p) {
   CmStandardNormalCdf f(p);
   int status = 0;
   return mRootFinder(kSearchLowerEnd, 0.0, f, &status);
-}
-
-// The P-value from both tails for an alternative.
-double pValueFromTails(double lower, double upper, EAlternative alternative) {
-  switch (alternative) {
-    case kAlternativeLess:
-      return lower;
-    case kAlternativeGreater:
-      return upper;
-    case kAlternativeNotEqual:
-      return 2.0 * std::fmin(lower, upper);
-    default:
-      return 0.0;
-  }
 }
 
 }  // namespace
@@ -102,7 +89,7 @@ double mNormalPValue(double z, EAlternative alternative) {
   if (mIsNumericMissing(z)) return z;
   double lower = 0.5, upper = 0.5;
   if (z != 0.0 && ElvFailed(elv_normal_df(z, &lower, &upper))) return mGetMissingValueCode();
-  return pValueFromTails(lower, upper, alternative);
+  return mPValueFromTails(lower, upper, alternative);
 }
 
 // Both one-sided alternatives give the same (upper) critical value.

@@ -58,6 +58,9 @@ double shiftToTen(double x, double* shiftProduct) {
 // in (-1, 0], which keeps the term accurate when c and e are close.
 double crossTerm(double c, double e, double d) {
   if (c == 0.0) return 0.0;
+  // Far from the expectation the ratio e/c is itself accurate, while 1 + d/c
+  // and 1 + d/e would cancel.
+  if (e > 0.0 && (e < 0.5 * c || e > 2.0 * c)) return c * std::log(e / c);
   if (d >= 0.0) return c * logs(-d / c);
   return -c * logs(d / e);
 }

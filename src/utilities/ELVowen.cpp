@@ -21,6 +21,7 @@
 // is, where the reflected integral is the small part of the product.
 #include <qel/elv.h>
 
+#include <algorithm>
 #include <array>
 #include <cmath>
 
@@ -131,9 +132,18 @@ int nonNegativeH(double h, double a, double* out, long* panels) {
 extern "C" {
 
 int Tha_c(double* out, double h, double a) {
-  if (isNan(h) || isNan(a) || !(a > 0.0)) {
+  if (isNan(h) || isNan(a) || !(a > 0.0 && a < kHuge)) {
     *out = -1.0;
     return 4;
+  }
+  // Below -38 the part of the integral left out is under phi(38), 1e-314.
+  if (h < -38.0) h = -38.0;
+  if (a > 1e100) {
+    // Q(a x) is a step at 0: the integral of phi over [h, 0), plus the
+    // value atan(1/a)/(2 pi) = 1/(2 pi a) of the range beyond 0.
+    *out = (h < 0.0 ? 0.5 - upperNormal(-h) : 0.0) + (h <= 0.0 ? kInvTwoPi / a : 0.0);
+    ELVsteps1 = 0;
+    return 0;
   }
   long panels = 0;
   int code;
@@ -143,7 +153,7 @@ int Tha_c(double* out, double h, double a) {
     // Over [h, 0) the integrand is bounded away from 0: one finite integral
     // plus the value at 0, atan(1/a)/(2 pi).
     const GaussLegendre& gl = rule();
-    const int pieces = 1 + static_cast<int>(std::fabs(h) * (1.0 + a));
+    const int pieces = static_cast<int>(std::min(1.0 + std::fabs(h) * (1.0 + a), 400.0));
     const double width = -h / pieces;
     double sum = 0.0;
     for (int p = 0; p < pieces; ++p) {

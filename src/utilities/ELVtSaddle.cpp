@@ -45,17 +45,17 @@ double logLowerNormal(double y) {
   return -0.5 * z * z - kLnSqrt2Pi - std::log(fraction);
 }
 
+// The integrand in s = ln w (dw = w ds), which removes the power
+// singularity of the chi density at w = 0 for small df.
 struct Integrand {
   double df, x, d, logScale;
-  // ln of the chi density of W (without its constant) plus ln Phi.
-  double logValue(double w) const {
-    const double lnW = std::log(w);
-    return (df - 1.0) * lnW - 0.5 * df * (w - 1.0) * (w + 1.0) +
-           logLowerNormal(std::sqrt(df) * (x * w - d));
+  // ln of the chi density of W (without its constant) times w, plus ln Phi.
+  double logValue(double s) const {
+    const double w = std::exp(s);
+    return df * s - 0.5 * df * (w - 1.0) * (w + 1.0) + logLowerNormal(std::sqrt(df) * (x * w - d));
   }
-  double scaled(double w) const {
-    if (!(w > 0.0)) return 0.0;
-    const double v = logValue(w) - logScale;
+  double scaled(double s) const {
+    const double v = logValue(s) - logScale;
     return v < kUnderflowLog ? 0.0 : std::exp(v);
   }
 };
@@ -75,40 +75,44 @@ extern "C" {
 
 double t_saddle_approx(double t, double df, double delta) {
   ELVsteps1 = ELVsteps2 = ELVsteps3 = 0;
+  if (anyNan(t, df, delta) || !(df > 0.0 && df <= kMaxDf) || !(std::fabs(t) < kHuge) ||
+      !(std::fabs(delta) < 1e6)) {
+    return -1.0;
+  }
+  // Beyond this |t| (where the noncentral routine answers 0 or 1 outright)
+  // the squares below would overflow.
+  if (std::fabs(t) > 1e140) return t < 0.0 ? 0.0 : 1.0;
   const double sqrtDf = std::sqrt(df);
   const double x = t / sqrtDf, d = delta / sqrtDf;
   const double onePlus = 1.0 + x * x;
   const double r = (x * d + std::sqrt(x * x * d * d + 4.0 * onePlus)) / (2.0 * onePlus);
   Integrand f{df, x, d, 0.0};
-  f.logScale = f.logValue(r);
-  const double width = 1.0 / std::sqrt(df * (1.0 / (r * r) + onePlus));
+  const double centre = std::log(r);
+  f.logScale = f.logValue(centre);
+  // Width of the saddle in s = ln w: that in w over r.
+  const double width = 1.0 / (r * std::sqrt(df * (1.0 / (r * r) + onePlus)));
 
-  // Right of the saddle.
-  double sum = 0.0, from = r, step = 0.5 * width;
-  for (int i = 0; i < kPanelsPerSide; ++i) {
-    const double part = panel(f, from, from + step);
-    sum += part;
-    from += step;
-    step *= 1.5;
-    if (part <= 1e-17 * sum) break;
-  }
-  // Left of it, down to w = 0.
-  double to = r;
-  step = 0.5 * width;
-  for (int i = 0; i < kPanelsPerSide && to > 0.0; ++i) {
-    const double lower = to - step > 0.0 ? to - step : 0.0;
-    const double part = panel(f, lower, to);
-    sum += part;
-    to = lower;
-    step *= 1.5;
-    if (part <= 1e-17 * sum) break;
+  // Both sides of the saddle, in panels that widen until the rest is
+  // negligible.
+  double sum = 0.0;
+  for (int side = -1; side <= 1; side += 2) {
+    double from = centre, step = 0.5 * width;
+    for (int i = 0; i < kPanelsPerSide; ++i) {
+      const double to = from + side * step;
+      const double part = side > 0 ? panel(f, from, to) : panel(f, to, from);
+      sum += part;
+      from = to;
+      step *= 1.5;
+      if (part <= 1e-17 * sum) break;
+    }
   }
   // Constant of the density of W: 2 (df/2)^(df/2) / Gamma(df/2), with the
   // exp(df/2) that the scaled integrand above leaves out.
   const double halfDf = 0.5 * df;
   const double logConstant = std::log(2.0) + std::log(halfDf) - ln_scaled_gamma(halfDf);
+  if (!(sum > 0.0)) return 0.0;
   const double logResult = logConstant + f.logScale + std::log(sum);
-  if (!(sum > 0.0) || logResult < kUnderflowLog) return 0.0;
+  if (logResult < kUnderflowLog) return 0.0;
   const double result = std::exp(logResult);
   return result > 1.0 ? 1.0 : result;
 }

@@ -43,6 +43,10 @@ ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long& k, doubl
 // Normal, t, noncentral t and hypergeometric: outputs through pointers.
 ElvStatus elv_normal_df(double x, double* lower, double* upper);
 ElvStatus elv_inv_normal_df(double p, double* quantile);
+ElvStatus elv_t_df(double t, double df, double* lower, double* upper);
+ElvStatus elv_t_ncdf(double t, double df, double delta, double* lower, double* upper);
+ElvStatus elv_t_upper_quant(double p, double df, double* quantile);
+ElvStatus elv_t_lower_quant(double p, double df, double* quantile);
 // Hypergeometric: lower = P(X <= k), upper = P(X > k).
 ElvStatus elv_hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
                           double* lower, double* upper, double* mass);
@@ -50,6 +54,24 @@ ElvStatus elv_hypergeo_lower_quant(double p, unsigned long N, unsigned long M, u
                                    unsigned long* k, double* fraction);
 ElvStatus elv_hypergeo_upper_quant(double p, unsigned long N, unsigned long M, unsigned long n,
                                    unsigned long* k, double* fraction);
+
+// Beta (shapes a, b), F (df1, df2) and binomial (n trials); outputs by
+// pointer. Binomial: lower = P(X <= k), upper = P(X > k); the quantiles
+// come with the fraction f of their defining equation.
+ElvStatus elv_beta_df(double x, double a, double b, double* lower, double* upper, double* density);
+ElvStatus elv_beta_upper_quant(double p, double a, double b, double* quantile);
+ElvStatus elv_beta_lower_quant(double p, double a, double b, double* quantile);
+ElvStatus elv_beta_ncdf(double x, double a, double b, double L, double* lower, double* upper);
+ElvStatus elv_F_df(double x, double df1, double df2, double* lower, double* upper);
+ElvStatus elv_F_ncdf(double x, double df1, double df2, double L, double* lower, double* upper);
+ElvStatus elv_F_upper_quant(double p, double df1, double df2, double* quantile);
+ElvStatus elv_F_lower_quant(double p, double df1, double df2, double* quantile);
+ElvStatus elv_binomial_df(unsigned long k, unsigned long n, double prob, double* lower,
+                          double* upper, double* mass);
+ElvStatus elv_binomial_lower_quant(double p, unsigned long n, double prob, unsigned long* k,
+                                   double* fraction);
+ElvStatus elv_binomial_upper_quant(double p, unsigned long n, double prob, unsigned long* k,
+                                   double* fraction);
 
 // Pointer forms of the gamma, chi-square and Poisson wrappers, the form in
 // which the distribution kernels call every wrapper. They forward to the

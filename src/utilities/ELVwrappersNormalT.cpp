@@ -24,6 +24,26 @@ ElvStatus elv_inv_normal_df(double p, double* quantile) {
   return currentStatus();
 }
 
+ElvStatus elv_t_df(double t, double df, double* lower, double* upper) {
+  t_df(t, df, lower, upper);
+  return currentStatus();
+}
+
+ElvStatus elv_t_ncdf(double t, double df, double delta, double* lower, double* upper) {
+  t_ncdf(t, df, delta, lower, upper);
+  return currentStatus();
+}
+
+ElvStatus elv_t_upper_quant(double p, double df, double* quantile) {
+  t_upper_quant(p, df, quantile);
+  return currentStatus();
+}
+
+ElvStatus elv_t_lower_quant(double p, double df, double* quantile) {
+  t_lower_quant(p, df, quantile);
+  return currentStatus();
+}
+
 ElvStatus elv_hypergeo_df(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
                           double* lower, double* upper, double* mass) {
   hypergeo_df(k, N, M, n, lower, upper, mass);

@@ -29,9 +29,6 @@ struct Kernels {
 
 constexpr double kElv = 1e-8;
 constexpr double kClosed = 1e-13;
-// The binomial tails through the incomplete beta ratio (n beyond the ELV
-// range, or its fallback).
-constexpr double kBinomialByBeta = 5e-8;
 
 const std::map<std::string, Kernels>& kernels() {
   using namespace qel;
@@ -86,8 +83,21 @@ const std::map<std::string, Kernels>& kernels() {
         [](double x, P p) { return mHalfNormalInvCdf(x, p[0], p[1]); }, 1e-12, kElv, kElv}},
       {"binomial",
        {[](double x, P p) { return mBinomialPdf(x, static_cast<int>(p[0]), p[1]); },
-        [](double x, P p, bool u) { return mBinomialCdf(x, p[0], p[1], u); }, nullptr, 1e-11,
-        kBinomialByBeta, 0.0}},
+        [](double x, P p, bool u) { return mBinomialCdf(x, p[0], p[1], u); },
+        [](double x, P p) { return mBinomialInvCdf(x, static_cast<int>(p[0]), p[1]); }, 1e-11, kElv,
+        0.0}},
+      {"t",
+       {[](double x, P p) { return mTPdf(x, p[0], p[1]); },
+        [](double x, P p, bool u) { return mTCdf(x, p[0], p[1], u); },
+        [](double x, P p) { return mTInvCdf(x, p[0], p[1]); }, 1e-12, kElv, kElv}},
+      {"f",
+       {[](double x, P p) { return mFPdf(x, p[0], p[1]); },
+        [](double x, P p, bool u) { return mFCdf(x, p[0], p[1], p[2], u); },
+        [](double x, P p) { return mFInvCdf(x, p[0], p[1], p[2]); }, 1e-12, kElv, kElv}},
+      {"beta",
+       {[](double x, P p) { return mBetaPdf(x, p[0], p[1]); },
+        [](double x, P p, bool u) { return mBetaCdf(x, p[0], p[1], u); },
+        [](double x, P p) { return mBetaInvCdf(x, p[0], p[1]); }, 1e-12, kElv, kElv}},
       {"poisson",
        {[](double x, P p) { return mPoissonPdf(x, p[0]); },
         [](double x, P p, bool u) { return mPoissonCdf(x, p[0], u); },
@@ -118,8 +128,8 @@ const std::map<std::string, Kernels>& kernels() {
   return table;
 }
 
-TEST(KernelAccuracy, MatchHighPrecisionReferenceValues) {
-  const auto rows = qeltest::loadReferenceData("kernels.csv", 2);
+void checkAgainst(const char* file) {
+  const auto rows = qeltest::loadReferenceData(file, 2);
   ASSERT_FALSE(rows.empty());
   std::map<std::string, double> worst;
   std::map<std::string, int> checked;
@@ -158,6 +168,14 @@ TEST(KernelAccuracy, MatchHighPrecisionReferenceValues) {
     std::printf("  %-22s %4d points, largest relative error %.3g\n", entry.first.c_str(),
                 checked[entry.first], entry.second);
   }
+}
+
+TEST(KernelAccuracy, MatchHighPrecisionReferenceValues) {
+  checkAgainst("kernels.csv");
+}
+
+TEST(KernelAccuracy, BetaFamilyAndTMatchHighPrecisionReferenceValues) {
+  checkAgainst("kernels_beta_t.csv");
 }
 
 }  // namespace

@@ -282,7 +282,9 @@ def binomial(n, p):
             return mpf(0)
         if k >= n:
             return mpf(1)
-        return mpmath.betainc(k + 1, N - k, P, 1, regularized=True)
+        # The integral from P to 1 is taken as one from 0 to 1 - P: mpmath forms
+        # the former as a difference and loses the small tail.
+        return mpmath.betainc(N - k, k + 1, 0, 1 - P, regularized=True)
 
     def up(k):
         return 1 - low(k - 1) if k <= 0 else mpmath.betainc(k, N - k + 1, 0, P, regularized=True)
@@ -327,7 +329,7 @@ def negbinomial(p, r, family="negbinomial"):
         return mpmath.betainc(R, k - R + 1, 0, P, regularized=True) if k >= r else mpf(0)
 
     def up(k):
-        return 1 - low(k - 1) if k <= r else mpmath.betainc(R, k - R, P, 1, regularized=True)
+        return 1 - low(k - 1) if k <= r else mpmath.betainc(k - R, R, 0, 1 - P, regularized=True)
 
     def pmf(k):
         if k < r:
