@@ -62,22 +62,8 @@ double CmDistBinomial::mCdf(double x, bool upperTail) const {
   return mBinomialCdf(x, mN, mP, upperTail);
 }
 
-// The smallest k with P(X <= k) >= p, by bisection over 0..n on the lower
-// tail (log2 n evaluations).
 double CmDistBinomial::mInvCdf(double p) const {
-  if (p <= 0.0) return 0.0;
-  if (p >= 1.0) return mN;
-  int lo = 0, hi = mN;
-  while (lo < hi) {
-    const int mid = lo + (hi - lo) / 2;
-    const double f = mBinomialCdf(mid, mN, mP, false);
-    if (mIsNumericMissing(f)) return f;
-    if (f >= p)
-      hi = mid;
-    else
-      lo = mid + 1;
-  }
-  return lo;
+  return mBinomialInvCdf(p, mN, mP);
 }
 
 double CmDistBinomial::mGetRandom() const {

@@ -101,10 +101,12 @@ void expectMoments(const std::vector<double>& x, double mean, double variance,
   }
   m2 /= n;
   m4 /= n;
-  if (!std::isnan(mean) && !std::isnan(variance))
+  if (!std::isnan(mean) && !std::isnan(variance)) {
     EXPECT_NEAR(m, mean, 5.0 * std::sqrt(variance / n)) << label;
-  if (!std::isnan(variance))
+  }
+  if (!std::isnan(variance)) {
     EXPECT_NEAR(m2 * n / (n - 1), variance, 5.0 * std::sqrt((m4 - m2 * m2) / n)) << label;
+  }
 }
 
 struct Case {
@@ -220,6 +222,13 @@ TEST(SamplerGoodnessOfFit, BetaFAndT) {
                    [] { return new qel::CmDistF(0.5, 3, 0); }, kNoMoment, kNoMoment});
   cases.push_back({"t(6)", [](ISampler& s, double* o) { return s.T(o, kDraws, 6, 0); },
                    [] { return new qel::CmDistT(6, 0); }, 0, 1.5});
+  // Noncentral t is drawn by inversion through a root search: 5000 draws.
+  const double nu = 8, delta = 1.5;
+  const double tMean =
+      delta * std::sqrt(nu / 2) * std::exp(std::lgamma((nu - 1) / 2) - std::lgamma(nu / 2));
+  cases.push_back({"t(8, 1.5)", [](ISampler& s, double* o) { return s.T(o, 5000, 8, 1.5); },
+                   [] { return new qel::CmDistT(8, 1.5); }, tMean,
+                   nu * (1 + delta * delta) / (nu - 2) - tMean * tMean, 5000});
   cases.push_back({"t(1)", [](ISampler& s, double* o) { return s.T(o, kDraws, 1, 0); },
                    [] { return new qel::CmDistT(1, 0); }, kNoMoment, kNoMoment});
   runCases(cases, true);

@@ -192,7 +192,9 @@ void expectAliasFit(const std::vector<double>& values, const std::vector<double>
     stat += (observed[k] - e) * (observed[k] - e) / e;
     ++bins;
   }
-  if (bins > 1) EXPECT_GT(qel::mChiSqCdf(stat, bins - 1, 0.0, true), 1e-4);
+  if (bins > 1) {
+    EXPECT_GT(qel::mChiSqCdf(stat, bins - 1, 0.0, true), 1e-4);
+  }
 }
 
 TEST(AliasSampler, ChiSquareFitOnAwkwardTables) {
@@ -349,6 +351,15 @@ TEST(DistributionObjects, ParametersSupportAndBounds) {
   EXPECT_TRUE(qel::CmDistExponential(1, 0).mHasLowerBound());
   EXPECT_FALSE(qel::CmDistGamma(400, 1, 0).mHasLowerBound());
   EXPECT_TRUE(qel::CmDistGamma(2, 1, 0).mHasLowerBound());
+  // The objects' quantiles are the kernels': symmetric and tabulated cases.
+  EXPECT_EQ(qel::CmDistBinomial(10, 0.5).mInvCdf(0.5), 5.0);
+  EXPECT_NEAR(qel::CmDistBeta(2, 2).mInvCdf(0.5), 0.5, 1e-14);
+  // t(10) 97.5% point by mpmath (findroot on the incomplete beta); F(1, 10)
+  // 95% point is its square.
+  const double t975 = 2.22813885198627471565;
+  EXPECT_NEAR(qel::CmDistT(10, 0).mInvCdf(0.975), t975, 1e-10 * t975);
+  EXPECT_NEAR(qel::CmDistF(1, 10, 0).mInvCdf(0.95), t975 * t975, 1e-10 * t975 * t975);
+  EXPECT_TRUE(qel::CmDistF(5, 10, 0).mHasLowerBound());
   const double values[] = {3, 1, 2};
   const double probabilities[] = {0.5, 0.2, 0.3};
   qel::CmDistDiscrete table(values, probabilities, 3);
