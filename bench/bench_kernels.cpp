@@ -1,4 +1,5 @@
-// Distribution kernels against Boost.Math on the same arguments: the gamma
+// Distribution kernels against Boost.Math on the same arguments: the t
+// quantile, the two-sided binomial P-value (no peer), the gamma
 // quantile (ELV quantile plus check), the Poisson upper tail (chi-square
 // relation), the standard normal quantile, the negative binomial quantile
 // (Cornish-Fisher start and integer search) and the exponential lower tail
@@ -10,6 +11,7 @@
 #include <boost/math/distributions/negative_binomial.hpp>
 #include <boost/math/distributions/normal.hpp>
 #include <boost/math/distributions/poisson.hpp>
+#include <boost/math/distributions/students_t.hpp>
 #include <boost/math/special_functions/gamma.hpp>
 #include <vector>
 
@@ -133,8 +135,45 @@ void BoostExponentialLowerNearThreshold(benchmark::State& state) {
   state.SetItemsProcessed(state.iterations() * 13);
 }
 
+const double kDegrees[] = {1.5, 4.0, 30.0, 500.0};
+
+void QelTInvCdf(benchmark::State& state) {
+  const auto ps = probabilities();
+  for (auto _ : state) {
+    for (double df : kDegrees) {
+      for (double p : ps) benchmark::DoNotOptimize(qel::mTInvCdf(p, df, 0.0));
+    }
+  }
+  state.SetItemsProcessed(state.iterations() * ps.size() * 4);
+}
+
+void BoostTQuantile(benchmark::State& state) {
+  const auto ps = probabilities();
+  for (auto _ : state) {
+    for (double df : kDegrees) {
+      boost::math::students_t_distribution<double, DoublePolicy> d(df);
+      for (double p : ps) benchmark::DoNotOptimize(quantile(d, p));
+    }
+  }
+  state.SetItemsProcessed(state.iterations() * ps.size() * 4);
+}
+
+// Two-sided likelihood-ratio P-value over all outcomes of n = 60, p = 0.3;
+// no peer routine exists.
+void QelBinomialTwoSidedPValue(benchmark::State& state) {
+  for (auto _ : state) {
+    for (int k = 0; k <= 60; ++k) {
+      benchmark::DoNotOptimize(qel::mBinomialPValue(k, 60, 0.3, qel::kAlternativeNotEqual));
+    }
+  }
+  state.SetItemsProcessed(state.iterations() * 61);
+}
+
 }  // namespace
 
+BENCHMARK(QelTInvCdf);
+BENCHMARK(BoostTQuantile);
+BENCHMARK(QelBinomialTwoSidedPValue);
 BENCHMARK(QelGammaInvCdf);
 BENCHMARK(BoostGammaPInv);
 BENCHMARK(QelPoissonUpper);
