@@ -133,7 +133,19 @@ TEST(SamplerOperations, BadParametersGiveCodesNotCrashes) {
   EXPECT_EQ(s->RandomSample(nullptr, 10, 3, true), qel::qelFailRandomVariate);
   const double values[] = {1.0};
   EXPECT_EQ(s->Discrete(x.data(), 10, values, values, 0), qel::qelFailRandomVariate);
-  EXPECT_TRUE(qeltest::isDefaultState());
+  // Weights without a positive finite sum, or with a negative one, are
+  // refused before any draw.
+  const double table[] = {1, 2, 3}, zeros[] = {0, 0, 0}, negative[] = {-1, 2, 1},
+               huge[] = {1e308, 1e308, 1e308}, nan[] = {1, std::nan(""), 1};
+  for (const double* weights : {zeros, negative, huge, nan}) {
+    x[0] = -9.0;
+    EXPECT_EQ(s->Discrete(x.data(), 100, table, weights, 3), qel::qelFailRandomVariate);
+    EXPECT_EQ(x[0], -9.0);
+  }
+  // Masked overflow of the huge weights leaves a sticky flag; the control
+  // bits must be the default ones.
+  EXPECT_EQ(qeltest::x87ControlWord(), qeltest::kDefaultX87);
+  EXPECT_EQ(qeltest::mxcsr() & ~0x3Fu, qeltest::kDefaultMxcsr);
 }
 
 // ---------------------------------------------------------------------------

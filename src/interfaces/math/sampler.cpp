@@ -194,8 +194,8 @@ int Sampler::Rayleigh(double*, unsigned, double, double) {
   return qelFailNotImplemented;
 }
 
-// The table in canonical form, then Vose's alias method on it. An empty table
-// has nothing to draw from.
+// The table in canonical form, then Vose's alias method on it. An empty table,
+// or one without usable weights, has nothing to draw from.
 int Sampler::Discrete(double* out, unsigned n, double const* values, double const* probabilities,
                       unsigned count) {
   if (cannotFill(out, n) || count == 0 || values == nullptr || probabilities == nullptr)
@@ -205,6 +205,20 @@ int Sampler::Discrete(double* out, unsigned n, double const* values, double cons
   unsigned merged = count;
   if (v1::CreatePseudoPmf(&mergedValues, &mergedProbabilities, &merged) != 0)
     return qelFailOutOfMemory;
+  // Weights must be relative frequencies: none negative or NaN, a positive
+  // finite sum. Otherwise the table's thresholds would be NaN, which the
+  // armed frame traps at the first comparison.
+  double sum = 0.0;
+  bool usable = true;
+  for (unsigned k = 0; k < merged; ++k) {
+    usable = usable && mergedProbabilities[k] >= 0.0;
+    sum += mergedProbabilities[k];
+  }
+  if (!usable || !(sum > 0.0 && sum <= std::numeric_limits<double>::max())) {
+    delete[] mergedValues;
+    delete[] mergedProbabilities;
+    return qelFailRandomVariate;
+  }
   v1::SamplingWithReplace alias(mergedProbabilities, merged);
   SetLynFpuStates();
   if (alias.GetMsgCode() == 0) {
