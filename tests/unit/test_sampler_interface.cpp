@@ -10,6 +10,7 @@
 #include <cmath>
 #include <memory>
 #include <set>
+#include <stdexcept>
 #include <typeinfo>
 #include <vector>
 
@@ -142,6 +143,13 @@ TEST(SamplerOperations, BadParametersGiveCodesNotCrashes) {
     EXPECT_EQ(s->Discrete(x.data(), 100, table, weights, 3), qel::qelFailRandomVariate);
     EXPECT_EQ(x[0], -9.0);
   }
+  // A NaN parameter meets the armed frame's trap at its first comparison: the
+  // invalid-operation exception passes on to the caller (which resets the
+  // state), as from the distribution functions.
+  EXPECT_THROW(s->Gamma(x.data(), 10, std::nan(""), 1, 0), std::invalid_argument);
+  qel::ResetFpuStates();
+  EXPECT_THROW(s->Binomial(x.data(), 10, 5, std::nan("")), std::invalid_argument);
+  qel::ResetFpuStates();
   // Masked overflow of the huge weights leaves a sticky flag; the control
   // bits must be the default ones.
   EXPECT_EQ(qeltest::x87ControlWord(), qeltest::kDefaultX87);
