@@ -10,6 +10,7 @@
 #include "describe_mode.h"
 #include "distribution_mode.h"
 #include "pvalue_mode.h"
+#include "sample_mode.h"
 
 namespace {
 
@@ -18,6 +19,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printDistributionUsage(out);
   qelcalc::printPValueUsage(out);
   qelcalc::printDescribeUsage(out);
+  qelcalc::printSampleUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -38,6 +40,7 @@ int main(int argc, char** argv) {
     if (qelcalc::isDistributionFamily(mode))
       return qelcalc::runDistributionMode(argc, argv, std::cout);
     if (mode == "describe") return qelcalc::runDescribeMode(argc, argv, std::cout);
+    if (mode == "sample") return qelcalc::runSampleMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

@@ -7,5 +7,6 @@
 #include <qel/distributions.h>
 #include <qel/order_statistics.h>
 #include <qel/random.h>
+#include <qel/sampler.h>
 
 #endif
