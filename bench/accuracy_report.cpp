@@ -1,0 +1,262 @@
+// Accuracy report: for each family and function, the largest relative error
+// against the mpmath reference grids of tests/data (kernels.csv and
+// kernels_beta_t.csv), split into the body and the far tails, for libqel's
+// exported functions and for Boost.Math side by side. Run by
+// bench/run_accuracy_report.sh, which writes bench/accuracy.md.
+#include <qel/distributions.h>
+
+#include <boost/math/distributions.hpp>
+#include <cmath>
+#include <cstdio>
+#include <fstream>
+#include <functional>
+#include <map>
+#include <sstream>
+#include <string>
+#include <vector>
+
+namespace {
+
+namespace bm = boost::math;
+using P = const double*;
+using Eval = std::function<double(const std::string& function, double x, P p)>;
+
+// A Boost call; its errors (domain, overflow, evaluation) count as no answer.
+template <class F>
+double guarded(F f) {
+  try {
+    return f();
+  } catch (const std::exception&) {
+    return NAN;
+  }
+}
+
+// Boost's answer for a continuous law d at x - shift.
+template <class D>
+double boostContinuous(const D& d, const std::string& f, double x, double shift = 0.0) {
+  return guarded([&] {
+    if (f == "pdf") return pdf(d, x - shift);
+    if (f == "lower") return cdf(d, x - shift);
+    if (f == "upper") return cdf(complement(d, x - shift));
+    return quantile(d, x) + shift;
+  });
+}
+
+// Boost's answer for a discrete law counted from origin; the upper tail
+// includes the point, as libqel's does.
+template <class D>
+double boostDiscrete(const D& d, const std::string& f, double x, double origin = 0.0) {
+  return guarded([&] {
+    const double k = x - origin;
+    if (f == "pdf") return pdf(d, k);
+    if (f == "lower") return cdf(d, k);
+    if (f == "upper") return k <= 0 ? 1.0 : cdf(complement(d, k - 1));
+    return quantile(d, x) + origin;
+  });
+}
+
+using RoundUp = bm::policies::policy<bm::policies::discrete_quantile<bm::policies::integer_round_up>>;
+
+std::map<std::string, std::pair<Eval, Eval>> families() {
+  std::map<std::string, std::pair<Eval, Eval>> t;
+  auto qel3 = [](auto pdf, auto cdf, auto inv) {
+    return [=](const std::string& f, double x, P p) {
+      if (f == "pdf") return pdf(x, p);
+      if (f == "inv") return inv(x, p);
+      return cdf(x, p, f == "upper");
+    };
+  };
+  t["normal"] = {qel3([](double x, P p) { return qel::NormalPdf(x, p[0], p[1]); },
+                      [](double x, P p, bool u) { return qel::NormalCdf(x, p[0], p[1], u); },
+                      [](double x, P p) { return qel::NormalInvCdf(x, p[0], p[1]); }),
+                 [](const std::string& f, double x, P p) {
+                   return boostContinuous(bm::normal_distribution<>(p[0], p[1]), f, x);
+                 }};
+  t["lognormal"] = {
+      qel3([](double x, P p) { return qel::LogNormalPdf(x, p[0], p[1], p[2]); },
+           [](double x, P p, bool u) { return qel::LogNormalCdf(x, p[0], p[1], p[2], u); },
+           [](double x, P p) { return qel::LogNormalInvCdf(x, p[0], p[1], p[2]); }),
+      [](const std::string& f, double x, P p) {
+        return boostContinuous(bm::lognormal_distribution<>(p[0], p[1]), f, x, p[2]);
+      }};
+  t["exponential"] = {
+      qel3([](double x, P p) { return qel::ExponentialPdf(x, p[0], p[1]); },
+           [](double x, P p, bool u) { return qel::ExponentialCdf(x, p[0], p[1], u); },
+           [](double x, P p) { return qel::ExponentialInvCdf(x, p[0], p[1]); }),
+      [](const std::string& f, double x, P p) {
+        return boostContinuous(bm::exponential_distribution<>(1.0 / p[0]), f, x, p[1]);
+      }};
+  t["weibull"] = {
+      qel3([](double x, P p) { return qel::WeibullPdf(x, p[0], p[1], p[2]); },
+           [](double x, P p, bool u) { return qel::WeibullCdf(x, p[0], p[1], p[2], u); },
+           [](double x, P p) { return qel::WeibullInvCdf(x, p[0], p[1], p[2]); }),
+      [](const std::string& f, double x, P p) {
+        return boostContinuous(bm::weibull_distribution<>(p[0], p[1]), f, x, p[2]);
+      }};
+  t["lev"] = {
+      qel3([](double x, P p) { return qel::LargestExtremeValuePdf(x, p[0], p[1]); },
+           [](double x, P p, bool u) { return qel::LargestExtremeValueCdf(x, p[0], p[1], u); },
+           [](double x, P p) { return qel::LargestExtremeValueInvCdf(x, p[0], p[1]); }),
+      [](const std::string& f, double x, P p) {
+        return boostContinuous(bm::extreme_value_distribution<>(p[0], p[1]), f, x);
+      }};
+  t["laplace"] = {qel3([](double x, P p) { return qel::LaplacePdf(x, p[0], p[1]); },
+                       [](double x, P p, bool u) { return qel::LaplaceCdf(x, p[0], p[1], u); },
+                       [](double x, P p) { return qel::LaplaceInvCdf(x, p[0], p[1]); }),
+                  [](const std::string& f, double x, P p) {
+                    return boostContinuous(bm::laplace_distribution<>(p[0], p[1]), f, x);
+                  }};
+  t["gamma"] = {
+      qel3([](double x, P p) { return qel::GammaPdf(x, p[0], p[1], p[2]); },
+           [](double x, P p, bool u) { return qel::GammaCdf(x, p[0], p[1], p[2], u); },
+           [](double x, P p) { return qel::GammaInvCdf(x, p[0], p[1], p[2]); }),
+      [](const std::string& f, double x, P p) {
+        return boostContinuous(bm::gamma_distribution<>(p[0], p[1]), f, x, p[2]);
+      }};
+  t["chisq"] = {qel3([](double x, P p) { return qel::ChiSqPdf(x, p[0]); },
+                     [](double x, P p, bool u) { return qel::ChiSqCdf(x, p[0], p[1], u); },
+                     [](double x, P p) { return qel::ChiSqInvCdf(x, p[0], p[1]); }),
+                [](const std::string& f, double x, P p) {
+                  if (p[1] == 0.0 || f == "pdf")
+                    return boostContinuous(bm::chi_squared_distribution<>(p[0]), f, x);
+                  return boostContinuous(bm::non_central_chi_squared_distribution<>(p[0], p[1]),
+                                         f, x);
+                }};
+  t["beta"] = {qel3([](double x, P p) { return qel::BetaPdf(x, p[0], p[1]); },
+                    [](double x, P p, bool u) { return qel::BetaCdf(x, p[0], p[1], u); },
+                    [](double x, P p) { return qel::BetaInvCdf(x, p[0], p[1]); }),
+               [](const std::string& f, double x, P p) {
+                 return boostContinuous(bm::beta_distribution<>(p[0], p[1]), f, x);
+               }};
+  t["f"] = {qel3([](double x, P p) { return qel::FPdf(x, p[0], p[1]); },
+                 [](double x, P p, bool u) { return qel::FCdf(x, p[0], p[1], p[2], u); },
+                 [](double x, P p) { return qel::FInvCdf(x, p[0], p[1], p[2]); }),
+            [](const std::string& f, double x, P p) {
+              if (p[2] == 0.0 || f == "pdf")
+                return boostContinuous(bm::fisher_f_distribution<>(p[0], p[1]), f, x);
+              return boostContinuous(bm::non_central_f_distribution<>(p[0], p[1], p[2]), f, x);
+            }};
+  t["t"] = {qel3([](double x, P p) { return qel::TPdf(x, p[0], p[1]); },
+                 [](double x, P p, bool u) { return qel::TCdf(x, p[0], p[1], u); },
+                 [](double x, P p) { return qel::TInvCdf(x, p[0], p[1]); }),
+            [](const std::string& f, double x, P p) {
+              if (p[1] == 0.0) return boostContinuous(bm::students_t_distribution<>(p[0]), f, x);
+              return boostContinuous(bm::non_central_t_distribution<>(p[0], p[1]), f, x);
+            }};
+  t["binomial"] = {
+      qel3([](double x, P p) { return qel::BinomialPdf(x, static_cast<int>(p[0]), p[1]); },
+           [](double x, P p, bool u) { return qel::BinomialCdf(x, p[0], p[1], u); },
+           [](double x, P p) { return qel::BinomialInvCdf(x, static_cast<int>(p[0]), p[1]); }),
+      [](const std::string& f, double x, P p) {
+        return boostDiscrete(bm::binomial_distribution<double, RoundUp>(p[0], p[1]), f, x);
+      }};
+  t["poisson"] = {qel3([](double x, P p) { return qel::PoissonPdf(x, p[0]); },
+                       [](double x, P p, bool u) { return qel::PoissonCdf(x, p[0], u); },
+                       [](double x, P p) { return qel::PoissonInvCdf(x, p[0]); }),
+                  [](const std::string& f, double x, P p) {
+                    return boostDiscrete(bm::poisson_distribution<double, RoundUp>(p[0]), f, x);
+                  }};
+  t["negbinomial"] = {
+      qel3([](double x, P p) { return qel::NegBinomialPdf(x, p[0], p[1]); },
+           [](double x, P p, bool u) { return qel::NegBinomialCdf(x, p[0], p[1], u); },
+           [](double x, P p) { return qel::NegBinomialInvCdf(x, p[0], p[1]); }),
+      // Boost counts the failures before the r-th success.
+      [](const std::string& f, double x, P p) {
+        return boostDiscrete(bm::negative_binomial_distribution<double, RoundUp>(p[1], p[0]), f,
+                             x, p[1]);
+      }};
+  t["hypergeometric"] = {
+      qel3(
+          [](double x, P p) {
+            return qel::HypergeometricPdf(x, static_cast<int>(p[0]), static_cast<int>(p[1]),
+                                          static_cast<int>(p[2]));
+          },
+          [](double x, P p, bool u) {
+            return qel::HypergeometricCdf(x, static_cast<int>(p[0]), static_cast<int>(p[1]),
+                                          static_cast<int>(p[2]), u);
+          },
+          [](double x, P p) {
+            return qel::HypergeometricInvCdf(x, static_cast<int>(p[0]), static_cast<int>(p[1]),
+                                             static_cast<int>(p[2]));
+          }),
+      [](const std::string& f, double x, P p) {
+        return boostDiscrete(bm::hypergeometric_distribution<double, RoundUp>(
+                                 static_cast<unsigned>(p[1]), static_cast<unsigned>(p[2]),
+                                 static_cast<unsigned>(p[0])),
+                             f, x);
+      }};
+  return t;
+}
+
+double relativeError(double actual, double expected) {
+  if (std::isnan(actual)) return INFINITY;
+  if (expected == 0.0) return std::fabs(actual);
+  return std::fabs(actual - expected) / std::fabs(expected);
+}
+
+struct Worst {
+  double body = 0, tail = 0;
+  int points = 0, failed = 0;
+  void add(double e, bool isTail) {
+    ++points;
+    if (std::isinf(e)) ++failed;
+    double& w = isTail ? tail : body;
+    if (!std::isinf(e) && e > w) w = e;
+  }
+};
+
+std::string fmt(double e) {
+  char b[32];
+  std::snprintf(b, sizeof b, "%.1e", e);
+  return b;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  qel::RegisterLynSigfpeHandler();
+  const std::string dir = argc > 1 ? argv[1] : "tests/data";
+  const auto table = families();
+  std::map<std::string, std::pair<Worst, Worst>> results;
+  for (const char* name : {"kernels.csv", "kernels_beta_t.csv"}) {
+    std::ifstream in(dir + "/" + name);
+    std::string line;
+    while (std::getline(in, line)) {
+      if (line.empty() || line[0] == '#') continue;
+      std::stringstream s(line);
+      std::string family, function, field;
+      std::getline(s, family, ',');
+      std::getline(s, function, ',');
+      std::vector<double> v;
+      while (std::getline(s, field, ',')) v.push_back(std::strtod(field.c_str(), nullptr));
+      const auto it = table.find(family);
+      if (it == table.end() || v.size() < 6) continue;
+      const double x = v[0], expected = v[5];
+      const P p = &v[1];
+      // Far tails: a tail probability below 1e-6, or a quantile of such a p.
+      const bool isTail = (function == "lower" || function == "upper")
+                              ? expected < 1e-6
+                              : (function == "inv" && (x < 1e-6 || x > 1 - 1e-6));
+      double mine;
+      try {
+        mine = it->second.first(function, x, p);
+      } catch (const std::exception&) {
+        qel::ResetFpuStates();
+        mine = NAN;
+      }
+      const double theirs = it->second.second(function, x, p);
+      auto& r = results[family + " | " + function];
+      r.first.add(relativeError(mine, expected), isTail);
+      r.second.add(relativeError(theirs, expected), isTail);
+    }
+  }
+  std::printf("| family | function | points | libqel body | libqel far tails | Boost body | "
+              "Boost far tails | no answer (libqel / Boost) |\n|---|---|---|---|---|---|---|---|\n");
+  for (const auto& r : results) {
+    std::printf("| %s | %d | %s | %s | %s | %s | %d / %d |\n", r.first.c_str(),
+                r.second.first.points, fmt(r.second.first.body).c_str(),
+                fmt(r.second.first.tail).c_str(), fmt(r.second.second.body).c_str(),
+                fmt(r.second.second.tail).c_str(), r.second.first.failed, r.second.second.failed);
+  }
+  return 0;
+}
