@@ -20,27 +20,27 @@ bool ElvFailed(ElvStatus status);
 
 // Normal
 double elv_phi(double x);
-ElvStatus elv_normal_upper_quant(double p, double& quantile);
-ElvStatus elv_normal_lower_quant(double p, double& quantile);
+ElvStatus elv_normal_upper_quant(double p, double* quantile);
+ElvStatus elv_normal_lower_quant(double p, double* quantile);
 
 // Gamma (shape a, unit scale)
-ElvStatus elv_gamma_df(double x, double a, double& lower, double& upper, double& density);
-ElvStatus elv_gamma_ncdf(double x, double a, double L, double& lower, double& upper);
-ElvStatus elv_gamma_lower_quant(double p, double a, double& quantile);
-ElvStatus elv_gamma_upper_quant(double p, double a, double& quantile);
+ElvStatus elv_gamma_df(double x, double a, double* lower, double* upper, double* density);
+ElvStatus elv_gamma_ncdf(double x, double a, double L, double* lower, double* upper);
+ElvStatus elv_gamma_lower_quant(double p, double a, double* quantile);
+ElvStatus elv_gamma_upper_quant(double p, double a, double* quantile);
 
 // Chi-square
-ElvStatus elv_chi2_df(double x, double df, double& lower, double& upper, double& density);
-ElvStatus elv_chi2_ncdf(double x, double df, double L, double& lower, double& upper);
-ElvStatus elv_chi2_lower_quant(double p, double df, double& quantile);
-ElvStatus elv_chi2_upper_quant(double p, double df, double& quantile);
+ElvStatus elv_chi2_df(double x, double df, double* lower, double* upper, double* density);
+ElvStatus elv_chi2_ncdf(double x, double df, double L, double* lower, double* upper);
+ElvStatus elv_chi2_lower_quant(double p, double df, double* quantile);
+ElvStatus elv_chi2_upper_quant(double p, double df, double* quantile);
 
 // Poisson: lower = P(X <= k), upper = P(X > k).
-ElvStatus elv_poisson_df(unsigned long k, double mean, double& lower, double& upper, double& mass);
-ElvStatus elv_poisson_lower_quant(double p, double mean, unsigned long& k, double& fraction);
-ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long& k, double& fraction);
+ElvStatus elv_poisson_df(unsigned long k, double mean, double* lower, double* upper, double* mass);
+ElvStatus elv_poisson_lower_quant(double p, double mean, unsigned long* k, double* fraction);
+ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long* k, double* fraction);
 
-// Normal, t, noncentral t and hypergeometric: outputs through pointers.
+// Normal, t, noncentral t and hypergeometric.
 ElvStatus elv_normal_df(double x, double* lower, double* upper);
 ElvStatus elv_inv_normal_df(double p, double* quantile);
 ElvStatus elv_t_df(double t, double df, double* lower, double* upper);
@@ -72,18 +72,6 @@ ElvStatus elv_binomial_lower_quant(double p, unsigned long n, double prob, unsig
                                    double* fraction);
 ElvStatus elv_binomial_upper_quant(double p, unsigned long n, double prob, unsigned long* k,
                                    double* fraction);
-
-// Pointer forms of the gamma, chi-square and Poisson wrappers, the form in
-// which the distribution kernels call every wrapper. They forward to the
-// reference forms above.
-ElvStatus elv_gamma_df(double x, double a, double* lower, double* upper, double* density);
-ElvStatus elv_gamma_lower_quant(double p, double a, double* quantile);
-ElvStatus elv_gamma_upper_quant(double p, double a, double* quantile);
-ElvStatus elv_chi2_ncdf(double x, double df, double L, double* lower, double* upper);
-ElvStatus elv_chi2_lower_quant(double p, double df, double* quantile);
-ElvStatus elv_chi2_upper_quant(double p, double df, double* quantile);
-ElvStatus elv_poisson_lower_quant(double p, double mean, unsigned long* k, double* fraction);
-ElvStatus elv_poisson_upper_quant(double p, double mean, unsigned long* k, double* fraction);
 
 }  // namespace qel
 

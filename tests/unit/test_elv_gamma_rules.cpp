@@ -200,7 +200,7 @@ TEST(ElvPoissonDf, ChecksAndZeroMean) {
   EXPECT_EQ(t.density, 0.0);
   // Counts beyond the signed range reach the routine as refused counts.
   double lower, upper, mass;
-  EXPECT_EQ(qel::elv_poisson_df(ULONG_MAX, 10.0, lower, upper, mass), qel::ElvArgumentOutOfRange);
+  EXPECT_EQ(qel::elv_poisson_df(ULONG_MAX, 10.0, &lower, &upper, &mass), qel::ElvArgumentOutOfRange);
 }
 
 TEST(ElvPoissonDf, MethodNumbersOfTheBranches) {
