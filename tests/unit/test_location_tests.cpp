@@ -257,6 +257,56 @@ TEST(LocationTests, IntervalOnlyFormsLeaveTheTestFieldsAlone) {
   EXPECT_TRUE(std::isnan(w.statistic) && std::isnan(w.pValue));
 }
 
+TEST(LocationTests, SummaryIntervalFormsMatchTheTestForms) {
+  const qel::IntervalType type = qel::kIntervalTwoSided;
+  qel::v0::OneSampleT t, tt;
+  t.n = tt.n = 12;
+  t.mean = tt.mean = 4.5;
+  t.standardDeviation = tt.standardDeviation = 1.25;
+  EXPECT_EQ(qel::v0::RunOneSampleT(&t, 0.9, type), 0);
+  EXPECT_EQ(qel::v0::RunOneSampleT(&tt, 0.9, type, qel::kAlternativeLess, 4.0), 0);
+  EXPECT_EQ(t.lowerLimit, tt.lowerLimit);
+  EXPECT_EQ(t.upperLimit, tt.upperLimit);
+  EXPECT_TRUE(std::isnan(t.statistic) && std::isnan(t.pValue));
+
+  qel::v0::OneSampleZ z, zz;
+  z.n = zz.n = 12;
+  z.mean = zz.mean = 4.5;
+  EXPECT_EQ(qel::v0::RunOneSampleZ(&z, 2.0, 0.9, type), 0);
+  EXPECT_EQ(qel::v0::RunOneSampleZ(&zz, 2.0, 0.9, type, qel::kAlternativeGreater, 4.0), 0);
+  EXPECT_EQ(z.lowerLimit, zz.lowerLimit);
+  EXPECT_EQ(z.standardError, 2.0 / std::sqrt(12.0));
+  EXPECT_TRUE(std::isnan(z.standardDeviation) && std::isnan(z.pValue));
+
+  qel::v0::PairedT p, pp;
+  p.n = pp.n = 12;
+  p.meanDifference = pp.meanDifference = -0.5;
+  p.standardDeviationOfDifferences = pp.standardDeviationOfDifferences = 0.75;
+  EXPECT_EQ(qel::v0::RunPairedT(&p, 0.9, type), 0);
+  EXPECT_EQ(qel::v0::RunPairedT(&pp, 0.9, type, qel::kAlternativeNotEqual, 0.0), 0);
+  EXPECT_EQ(p.upperLimit, pp.upperLimit);
+  EXPECT_TRUE(std::isnan(p.statistic) && std::isnan(p.firstMean) && std::isnan(p.secondMean));
+
+  for (bool pooled : {false, true}) {
+    qel::v0::TwoSampleT w, ww;
+    w.firstN = ww.firstN = 12;
+    w.secondN = ww.secondN = 7;
+    w.firstMean = ww.firstMean = 3.0;
+    w.secondMean = ww.secondMean = 2.0;
+    w.firstStandardDeviation = ww.firstStandardDeviation = 1.0;
+    w.secondStandardDeviation = ww.secondStandardDeviation = 3.0;
+    EXPECT_EQ(qel::v0::RunTwoSampleT(&w, pooled, 0.9, type), 0);
+    EXPECT_EQ(qel::v0::RunTwoSampleT(&ww, pooled, 0.9, type, qel::kAlternativeLess, 0.0), 0);
+    EXPECT_EQ(w.lowerLimit, ww.lowerLimit);
+    EXPECT_EQ(w.degreesOfFreedom, ww.degreesOfFreedom);
+    EXPECT_EQ(w.difference, 1.0);
+    // Pooled: 17 degrees; Welch: floor(1.87429 / 0.276142) = floor(6.787) = 6.
+    EXPECT_EQ(w.degreesOfFreedom, pooled ? 17.0 : 6.0);
+    EXPECT_EQ(std::isnan(w.pooledStandardDeviation), !pooled);
+    EXPECT_TRUE(std::isnan(w.statistic));
+  }
+}
+
 TEST(LocationTests, RecordsStartWithNaNAndZeroCounts) {
   qel::v0::OneSampleT t;
   qel::v0::OneSampleZ z;
