@@ -97,3 +97,26 @@ list(LENGTH lines n)
 if(NOT n EQUAL 1000)
   message(SEND_ERROR "qelcalc sample normal 1000 wrote ${n} lines")
 endif()
+
+# ttest: the location tests on columns; expected values from
+# tools/reference/gen_location_tests.py (tests/data/location_tests.csv).
+file(WRITE ${WORK}/qelcalc_a10.txt "11.524\n12.832\n11.704\n13.698\n10.918\n13.643\n15.182\n14.38\n13.441\n12.368\n")
+file(WRITE ${WORK}/qelcalc_b10.txt "12.2\n11.675\n9.081\n8.825\n11.462\n14.996\n9.67\n15.416\n12.448\n11.31\n")
+file(WRITE ${WORK}/qelcalc_empty.txt "\n")
+run(0 "^n 10\nmean 12\\.969[0-9]*\nstddev 1\\.34872828[0-9]*\nstderr 0\\.42650533[0-9]*\nlower 12\\.1871675[0-9]*\nupper 13\\.7508324[0-9]*\nt 4\\.61658938[0-9]*\np 0\\.00126044216[0-9]*\n$"
+    ttest ${WORK}/qelcalc_a10.txt --mu 11 --confidence 0.9)
+run(0 "\nstderr 0\\.63245553[0-9]*\nlower 11\\.9287032[0-9]*\nupper 14\\.0092967[0-9]*\nz 2\\.32269294[0-9]*\np 0\\.0201956537[0-9]*\n$"
+    ttest ${WORK}/qelcalc_a10.txt --mu 11.5 --sigma 2 --confidence 0.9)
+run(0 "\nmean_difference 1\\.2607[0-9]*\n.*\nlower -0\\.135566290[0-9]*\nupper 2\\.65696629[0-9]*\nt 1\\.65513232[0-9]*\np 0\\.132282309[0-9]*\n$"
+    ttest ${WORK}/qelcalc_a10.txt --paired ${WORK}/qelcalc_b10.txt --confidence 0.9)
+run(0 "\ndf 14\nlower -0\\.192991607[0-9]*\nupper 2\\.71439160[0-9]*\nt 1\\.52747919[0-9]*\np 0\\.148915229[0-9]*\n$"
+    ttest ${WORK}/qelcalc_a10.txt --two-sample ${WORK}/qelcalc_b10.txt --confidence 0.9)
+run(0 "\npooled_stddev 1\\.84553145[0-9]*\ndf 18\nlower -0\\.170503772[0-9]*\nupper 2\\.69190377[0-9]*\n"
+    ttest ${WORK}/qelcalc_a10.txt --two-sample ${WORK}/qelcalc_b10.txt --pooled --confidence 0.9)
+run(0 "\nlower -Inf\nupper " ttest ${WORK}/qelcalc_a10.txt --alternative less)
+run(2 "^$" ttest ${WORK}/qelcalc_empty.txt)
+run(2 "^$" ttest ${WORK}/qelcalc_bad.txt)
+run(2 "^$" ttest ${WORK}/no_such_file.txt)
+run(2 "^$" ttest ${WORK}/qelcalc_a10.txt --paired ${WORK}/qelcalc_input.txt)
+run(2 "^$" ttest ${WORK}/qelcalc_a10.txt --pooled)
+run(2 "^$" ttest ${WORK}/qelcalc_a10.txt --alternative sideways)

@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <qel/basic_types.h>
 #include <qel/descriptive.h>
+#include <qel/location_tests.h>
 #include <qel/order_statistics.h>
 
 #include <cmath>
@@ -98,6 +99,26 @@ TEST(AllocationFailure, OrderStatisticsReportOutOfMemory) {
   EXPECT_EQ(qel::v1::GetMode(x, 4, modes, 2, &count, &frequency), qel::qelOk);
   EXPECT_EQ(modes[0], 4.0);
   EXPECT_EQ(count, 1u);
+}
+
+TEST(AllocationFailure, PairedTStopsAfterTheColumnSummaries) {
+  const double x[] = {3.0, 1.0, 2.0};
+  const double y[] = {1.0, 2.0, 2.0};
+  qel::v0::PairedT record;
+  record.n = 3;
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v0::RunPairedT(&record, x, y, 0.95, qel::kIntervalTwoSided,
+                                qel::kAlternativeNotEqual, 0.0),
+            qel::qelFailOutOfMemory);
+  failNextAllocation = false;
+  EXPECT_EQ(record.firstMean, 2.0);
+  EXPECT_DOUBLE_EQ(record.secondStandardError, std::sqrt(1.0 / 3.0) / std::sqrt(3.0));
+  EXPECT_TRUE(std::isnan(record.meanDifference) && std::isnan(record.standardErrorOfDifferences) &&
+              std::isnan(record.lowerLimit) && std::isnan(record.upperLimit) &&
+              std::isnan(record.statistic) && std::isnan(record.pValue));
+
+  EXPECT_EQ(qel::v0::RunPairedT(&record, x, y, 0.95, qel::kIntervalTwoSided), qel::qelOk);
+  EXPECT_DOUBLE_EQ(record.meanDifference, 1.0 / 3.0);
 }
 
 }  // namespace
