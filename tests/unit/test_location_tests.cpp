@@ -51,9 +51,9 @@ struct Case {
   int line;
 };
 
-std::vector<Case> cases() {
+std::vector<Case> cases(const char* file = "location_tests.csv") {
   std::vector<Case> out;
-  for (const auto& row : qeltest::loadReferenceData("location_tests.csv", 3)) {
+  for (const auto& row : qeltest::loadReferenceData(file, 3)) {
     const auto& v = row.numbers;
     Case c{row.text[0],
            row.text[1],
@@ -183,9 +183,9 @@ void expectClose(double actual, double expected, double tolerance, const char* w
 // digits that the data carry). The limits and
 // P-values carry the error of the t and normal quantile and tail kernels,
 // whose measured accuracy against mpmath is 1e-11 to about 1e-9.
-TEST(LocationTests, AgreeWithReferenceForEveryTypeAndAlternative) {
-  const auto all = cases();
-  ASSERT_GE(all.size(), 150u);
+void checkAgainst(const char* file, std::size_t atLeast) {
+  const auto all = cases(file);
+  ASSERT_GE(all.size(), atLeast);
   std::map<std::string, double> worstArithmetic, worstLimit, worstP;
   for (const Case& c : all) {
     const Outcome o = run(c, false);
@@ -211,6 +211,17 @@ TEST(LocationTests, AgreeWithReferenceForEveryTypeAndAlternative) {
   for (const auto& kv : worstArithmetic)
     std::printf("  %-6s largest relative error: arithmetic %.2g, limits %.2g, P-value %.2g\n",
                 kv.first.c_str(), kv.second, worstLimit[kv.first], worstP[kv.first]);
+}
+
+// mpmath: every test, interval type and alternative.
+TEST(LocationTests, AgreeWithReferenceForEveryTypeAndAlternative) {
+  checkAgainst("location_tests.csv", 150u);
+}
+
+// R's t.test (one-sample, paired and pooled, interval side matching the
+// alternative, as R ties them).
+TEST(LocationTests, AgreeWithRsTTest) {
+  checkAgainst("location_tests_r.csv", 30u);
 }
 
 TEST(LocationTests, SummaryFormsEqualDataForms) {
