@@ -120,3 +120,15 @@ run(2 "^$" ttest ${WORK}/no_such_file.txt)
 run(2 "^$" ttest ${WORK}/qelcalc_a10.txt --paired ${WORK}/qelcalc_input.txt)
 run(2 "^$" ttest ${WORK}/qelcalc_a10.txt --pooled)
 run(2 "^$" ttest ${WORK}/qelcalc_a10.txt --alternative sideways)
+
+# test: location tests on columns of a CSV table with a header (P-values from R's t.test).
+file(WRITE ${WORK}/qelcalc_table.csv "id,x,y\n1,5.1,4.8\n2,4.9,5.2\n3,6.2,5.0\n4,5.8,5.5\n5,6.0,\n")
+run(0 "\np 0\\.039112442[0-9]*\n$" test one-sample-t ${WORK}/qelcalc_table.csv --column 2 --mu 5
+    --alternative greater)
+run(0 "\np 0\\.178222907[0-9]*\n$" test two-sample-t ${WORK}/qelcalc_table.csv --column 2
+    --column2 3 --pooled)
+run(2 "^$" test paired-t ${WORK}/qelcalc_table.csv --column 2 --column2 3)
+run(2 "^$" test one-sample-z ${WORK}/qelcalc_table.csv --column 2)
+run(2 "^$" test one-sample-t ${WORK}/qelcalc_table.csv --column 9)
+run(2 "^$" test sign-test ${WORK}/qelcalc_table.csv)
+run(2 "^$" test one-sample-t ${WORK}/no_such_table.csv)

@@ -22,6 +22,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printDescribeUsage(out);
   qelcalc::printSampleUsage(out);
   qelcalc::printTTestUsage(out);
+  qelcalc::printTestUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -44,6 +45,7 @@ int main(int argc, char** argv) {
     if (mode == "describe") return qelcalc::runDescribeMode(argc, argv, std::cout);
     if (mode == "sample") return qelcalc::runSampleMode(argc, argv, std::cout);
     if (mode == "ttest") return qelcalc::runTTestMode(argc, argv, std::cout);
+    if (mode == "test") return qelcalc::runTestMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";
