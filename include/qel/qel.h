@@ -5,6 +5,7 @@
 #include <qel/basic_types.h>
 #include <qel/descriptive.h>
 #include <qel/distributions.h>
+#include <qel/fits.h>
 #include <qel/order_statistics.h>
 #include <qel/random.h>
 #include <qel/sampler.h>
