@@ -9,6 +9,7 @@
 #include "cli.h"
 #include "describe_mode.h"
 #include "distribution_mode.h"
+#include "fit_mode.h"
 #include "pvalue_mode.h"
 #include "sample_mode.h"
 
@@ -20,6 +21,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printPValueUsage(out);
   qelcalc::printDescribeUsage(out);
   qelcalc::printSampleUsage(out);
+  qelcalc::printFitUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -41,6 +43,8 @@ int main(int argc, char** argv) {
       return qelcalc::runDistributionMode(argc, argv, std::cout);
     if (mode == "describe") return qelcalc::runDescribeMode(argc, argv, std::cout);
     if (mode == "sample") return qelcalc::runSampleMode(argc, argv, std::cout);
+    if (mode == "fit") return qelcalc::runFitMode(argc, argv, std::cout);
+    if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";
