@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <qel/basic_types.h>
 #include <qel/descriptive.h>
+#include <qel/fits.h>
 #include <qel/order_statistics.h>
 
 #include <cmath>
@@ -98,6 +99,31 @@ TEST(AllocationFailure, OrderStatisticsReportOutOfMemory) {
   EXPECT_EQ(qel::v1::GetMode(x, 4, modes, 2, &count, &frequency), qel::qelOk);
   EXPECT_EQ(modes[0], 4.0);
   EXPECT_EQ(count, 1u);
+}
+
+TEST(AllocationFailure, FitsAndPlotsReportOutOfMemory) {
+  const double x[4] = {0.5, 1.0, 2.0, 3.5};
+  double par[2] = {0, 0}, cov[3] = {0, 0, 0}, scores[4], a2 = 0, p = 0;
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v2::FitWeibull(x, par, 4), qel::qelFailOutOfMemory);
+  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(par[1]));
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v2::FitLynLogNormal(x, par, 4), qel::qelFailOutOfMemory);
+  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(par[1]));
+  failNextAllocation = true;
+  EXPECT_EQ(
+      qel::v1::RunLynLogNormalPPlot(x, scores, nullptr, par, cov, &a2, &p, 4, qel::kPlotMedianRank),
+      qel::qelFailOutOfMemory);
+  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(cov[2]) && std::isnan(a2) && std::isnan(p));
+  failNextAllocation = true;
+  EXPECT_EQ(
+      qel::v0::RunLynWeibullPPlot(x, scores, nullptr, par, cov, &a2, &p, 4, qel::kPlotMedianRank),
+      qel::qelFailOutOfMemory);
+  EXPECT_TRUE(std::isnan(par[1]) && std::isnan(cov[0]) && std::isnan(a2) && std::isnan(p));
+
+  // With memory again, the same calls succeed.
+  EXPECT_EQ(qel::v2::FitWeibull(x, par, 4), qel::qelOk);
+  EXPECT_TRUE(std::isfinite(par[0]) && std::isfinite(par[1]));
 }
 
 }  // namespace
