@@ -380,6 +380,21 @@ TEST(ParameterFits, BadInputFlowsThroughWithoutCrashing) {
                                 qel::kPlotMedianRank);
   EXPECT_FALSE(std::isfinite(a2));
 
+  // All values equal: no spread to fit, so the two-parameter tests have no
+  // answer, and the status stays 0 (the approximations have no code for it).
+  // The exponential has no spread parameter; only all zeros defeat it.
+  using Plot = int (*)(double const*, double*, double*, double*, double*, double*, double*,
+                       unsigned, qel::PlottingMethod);
+  const double zeros[4] = {0.0, 0.0, 0.0, 0.0};
+  for (Plot plot : {Plot(qel::v1::RunLynNormalPPlot), Plot(qel::v1::RunLynLogNormalPPlot),
+                    Plot(qel::v0::RunLynExponentialPPlot), Plot(qel::v0::RunLynWeibullPPlot)}) {
+    for (const double* data : {constant, zeros}) {
+      if (plot == Plot(qel::v0::RunLynExponentialPPlot) && data == constant) continue;
+      EXPECT_EQ(plot(data, scores, nullptr, par, cov, &a2, &p, 4, qel::kPlotMedianRank), 0);
+      EXPECT_TRUE(std::isnan(a2) && std::isnan(p)) << (data == zeros ? "zeros" : "constant");
+    }
+  }
+
   // Fewer than two points.
   const double one = 2.5;
   EXPECT_EQ(qel::v2::FitWeibull(&one, par, 1), qel::qelFailNoFit);
