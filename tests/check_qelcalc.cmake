@@ -132,3 +132,22 @@ run(2 "^$" test one-sample-z ${WORK}/qelcalc_table.csv --column 2)
 run(2 "^$" test one-sample-t ${WORK}/qelcalc_table.csv --column 9)
 run(2 "^$" test sign-test ${WORK}/qelcalc_table.csv)
 run(2 "^$" test one-sample-t ${WORK}/no_such_table.csv)
+# fit and pplot: a Weibull sample of ten; parameters, covariances and the
+# Anderson-Darling statistic from an independent maximisation in mpmath
+# (tools/reference/gen_fits.py, sample weib10).
+file(WRITE ${WORK}/qelcalc_weibull.txt "0.22903105840819976\n1.0313886063572855\n1.5271150070647668\n1.998648115685742\n2.2783700132260205\n2.665459312477814\n2.8916823966758307\n3.7179418860990685\n3.7959143492871568\n4.811415538424593\n")
+run(0 "^n 10\nshape 1\\.86549452121850[0-9]*\nscale 2\\.78225423334351[0-9]*\nvar_shape 0\\.2445225479411[0-9]*\ncov 0\\.06872607921078[0-9]*\nvar_scale 0\\.2417526154057[0-9]*\nad_statistic 0\\.243860039638[0-9]*\nad_pvalue 0\\.25\nstatus 10004 [(]the P-value is a lower bound[)]\n$"
+    fit ${WORK}/qelcalc_weibull.txt --dist weibull)
+run(0 "^$" pplot ${WORK}/qelcalc_weibull.txt --dist normal --out ${WORK}/qelcalc_plot.csv)
+file(STRINGS ${WORK}/qelcalc_plot.csv plot_lines)
+list(LENGTH plot_lines n)
+list(GET plot_lines 1 first_point)
+if(NOT n EQUAL 11 OR NOT first_point MATCHES "^0\\.2290310584081997[0-9]*,0\\.0673076923076923[0-9]*,-1\\.4961468[0-9]*,")
+  message(SEND_ERROR "qelcalc pplot: unexpected plot data '${plot_lines}'")
+endif()
+run(0 "^x,probability,score,fitted\n0\\.25,0\\.1666666666666666[0-9]*,-1\\.70198335528[0-9]*,[^\n]*\n0\\.5,0\\.5,[^\n]*\n1,0\\.8333333333333333[0-9]*,[^\n]*\n$"
+    pplot - --dist weibull --method midpoint)
+run(2 "^$" fit ${WORK}/qelcalc_weibull.txt --dist gauss)
+run(2 "^$" fit --dist weibull)
+run(2 "^$" pplot ${WORK}/qelcalc_weibull.txt --dist normal --method best)
+run(2 "^$" fit ${WORK}/qelcalc_weibull.txt --dist weibull --out x.csv)

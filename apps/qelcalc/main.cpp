@@ -9,6 +9,7 @@
 #include "cli.h"
 #include "describe_mode.h"
 #include "distribution_mode.h"
+#include "fit_mode.h"
 #include "pvalue_mode.h"
 #include "sample_mode.h"
 #include "ttest_mode.h"
@@ -23,6 +24,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printSampleUsage(out);
   qelcalc::printTTestUsage(out);
   qelcalc::printTestUsage(out);
+  qelcalc::printFitUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -46,6 +48,8 @@ int main(int argc, char** argv) {
     if (mode == "sample") return qelcalc::runSampleMode(argc, argv, std::cout);
     if (mode == "ttest") return qelcalc::runTTestMode(argc, argv, std::cout);
     if (mode == "test") return qelcalc::runTestMode(argc, argv, std::cout);
+    if (mode == "fit") return qelcalc::runFitMode(argc, argv, std::cout);
+    if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <qel/basic_types.h>
 #include <qel/descriptive.h>
+#include <qel/fits.h>
 #include <qel/location_tests.h>
 #include <qel/order_statistics.h>
 
@@ -119,6 +120,31 @@ TEST(AllocationFailure, PairedTStopsAfterTheColumnSummaries) {
 
   EXPECT_EQ(qel::v0::RunPairedT(&record, x, y, 0.95, qel::kIntervalTwoSided), qel::qelOk);
   EXPECT_DOUBLE_EQ(record.meanDifference, 1.0 / 3.0);
+}
+
+TEST(AllocationFailure, FitsAndPlotsReportOutOfMemory) {
+  const double x[4] = {0.5, 1.0, 2.0, 3.5};
+  double par[2] = {0, 0}, cov[3] = {0, 0, 0}, scores[4], a2 = 0, p = 0;
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v2::FitWeibull(x, par, 4), qel::qelFailOutOfMemory);
+  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(par[1]));
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v2::FitLynLogNormal(x, par, 4), qel::qelFailOutOfMemory);
+  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(par[1]));
+  failNextAllocation = true;
+  EXPECT_EQ(
+      qel::v1::RunLynLogNormalPPlot(x, scores, nullptr, par, cov, &a2, &p, 4, qel::kPlotMedianRank),
+      qel::qelFailOutOfMemory);
+  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(cov[2]) && std::isnan(a2) && std::isnan(p));
+  failNextAllocation = true;
+  EXPECT_EQ(
+      qel::v0::RunLynWeibullPPlot(x, scores, nullptr, par, cov, &a2, &p, 4, qel::kPlotMedianRank),
+      qel::qelFailOutOfMemory);
+  EXPECT_TRUE(std::isnan(par[1]) && std::isnan(cov[0]) && std::isnan(a2) && std::isnan(p));
+
+  // With memory again, the same calls succeed.
+  EXPECT_EQ(qel::v2::FitWeibull(x, par, 4), qel::qelOk);
+  EXPECT_TRUE(std::isfinite(par[0]) && std::isfinite(par[1]));
 }
 
 }  // namespace
