@@ -17,29 +17,6 @@ const double kEuler = .577215664901533e+00;
 // -psi(x): DPSIFN fixed to order 0, kode 1 and one term. ierr as XDPSIFN;
 // on an error the answer is 0.
 double negativeDigamma(double x, int* ierr) {
-  static const double bernoulli[23] = {0.0,
-                                       1.00000000000000000e+00,
-                                       -5.00000000000000000e-01,
-                                       1.66666666666666667e-01,
-                                       -3.33333333333333333e-02,
-                                       2.38095238095238095e-02,
-                                       -3.33333333333333333e-02,
-                                       7.57575757575757576e-02,
-                                       -2.53113553113553114e-01,
-                                       1.16666666666666667e+00,
-                                       -7.09215686274509804e+00,
-                                       5.49711779448621554e+01,
-                                       -5.29124242424242424e+02,
-                                       6.19212318840579710e+03,
-                                       -8.65802531135531136e+04,
-                                       1.42551716666666667e+06,
-                                       -2.72982310678160920e+07,
-                                       6.01580873900642368e+08,
-                                       -1.51163157670921569e+10,
-                                       4.29614643061166667e+11,
-                                       -1.37116552050883328e+13,
-                                       4.88332318973593167e+14,
-                                       -1.92965793419400681e+16};
   *ierr = 0;
   if (!(x > 0.0)) {
     *ierr = 1;
@@ -71,12 +48,12 @@ double negativeDigamma(double x, int* ierr) {
   const double tst = wdtol * tt;
   const double rxsq = 1.0 / (xdmy * xdmy);
   double t = 0.5 * rxsq;
-  double s = t * bernoulli[3];
+  double s = t * kDpsifnBernoulli[3];
   if (std::fabs(s) >= tst) {
     double tk = 2.0;
     for (int k = 4; k <= 22; ++k) {
       t = t * ((tk + 1.0) / (tk + 1.0)) * (tk / (tk + 2.0)) * rxsq;
-      const double term = t * bernoulli[k];
+      const double term = t * kDpsifnBernoulli[k];
       if (std::fabs(term) < tst) break;
       s += term;
       tk += 2.0;

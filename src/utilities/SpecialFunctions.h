@@ -67,6 +67,9 @@ double psi(double x);
 // n == 0 gives -psi(x) + ln x in ans[0]. ierr: 1 bad input, 2 overflow, 3 order
 // beyond the table; nz counts the entries set to 0 by underflow.
 void XDPSIFN(double x, int n, int kode, int m, double* ans, int* nz, int* ierr);
+// The Bernoulli numbers of DPSIFN (1-based: B_0, B_1, B_2, B_4, ..., B_40), shared
+// with the private order-0 copy of the incomplete beta ratio.
+extern const double kDpsifnBernoulli[23];
 
 // d[0..5] = dI/dx, d2I/dx2, dI/dp, d2I/dp2, d2I/dxdp, I for the incomplete
 // gamma integral I(x, p); ifault 1 when a series or fraction does not settle.

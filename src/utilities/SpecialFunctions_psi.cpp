@@ -13,32 +13,33 @@
 
 namespace qel {
 
+// Bernoulli numbers B_0, B_1, B_2, B_4, ..., B_40 (1-based in the loops below).
+const double kDpsifnBernoulli[23] = {0.0,  // unused, keeps the published 1-based indices
+                                     1.00000000000000000e+00,
+                                     -5.00000000000000000e-01,
+                                     1.66666666666666667e-01,
+                                     -3.33333333333333333e-02,
+                                     2.38095238095238095e-02,
+                                     -3.33333333333333333e-02,
+                                     7.57575757575757576e-02,
+                                     -2.53113553113553114e-01,
+                                     1.16666666666666667e+00,
+                                     -7.09215686274509804e+00,
+                                     5.49711779448621554e+01,
+                                     -5.29124242424242424e+02,
+                                     6.19212318840579710e+03,
+                                     -8.65802531135531136e+04,
+                                     1.42551716666666667e+06,
+                                     -2.72982310678160920e+07,
+                                     6.01580873900642368e+08,
+                                     -1.51163157670921569e+10,
+                                     4.29614643061166667e+11,
+                                     -1.37116552050883328e+13,
+                                     4.88332318973593167e+14,
+                                     -1.92965793419400681e+16};
+
 namespace {
 
-// Bernoulli numbers B_0, B_1, B_2, B_4, ..., B_40 (1-based in the loops below).
-const double kBernoulli[23] = {0.0,  // unused, keeps the published 1-based indices
-                               1.00000000000000000e+00,
-                               -5.00000000000000000e-01,
-                               1.66666666666666667e-01,
-                               -3.33333333333333333e-02,
-                               2.38095238095238095e-02,
-                               -3.33333333333333333e-02,
-                               7.57575757575757576e-02,
-                               -2.53113553113553114e-01,
-                               1.16666666666666667e+00,
-                               -7.09215686274509804e+00,
-                               5.49711779448621554e+01,
-                               -5.29124242424242424e+02,
-                               6.19212318840579710e+03,
-                               -8.65802531135531136e+04,
-                               1.42551716666666667e+06,
-                               -2.72982310678160920e+07,
-                               6.01580873900642368e+08,
-                               -1.51163157670921569e+10,
-                               4.29614643061166667e+11,
-                               -1.37116552050883328e+13,
-                               4.88332318973593167e+14,
-                               -1.92965793419400681e+16};
 const int kNmax = 100;
 
 // -pi cot(pi x) for x < 0.5 away from the poles, from sin/cos of the first
@@ -202,12 +203,12 @@ void XDPSIFN(double x, int n, int kode, int m, double* ans, int* nz, int* ierr) 
     const double rxsq = 1.0 / (xdmy * xdmy);
     ta = 0.5 * rxsq;
     t = (fn + 1.0) * ta;
-    s = t * kBernoulli[3];
+    s = t * kDpsifnBernoulli[3];
     if (std::fabs(s) >= tst) {
       double tk = 2.0;
       for (int k = 4; k <= 22; ++k) {
         t = t * ((tk + fn + 1.0) / (tk + 1.0)) * ((tk + fn) / (tk + 2.0)) * rxsq;
-        trm[k] = t * kBernoulli[k];
+        trm[k] = t * kDpsifnBernoulli[k];
         if (std::fabs(trm[k]) < tst) break;
         s += trm[k];
         tk += 2.0;
@@ -245,7 +246,7 @@ void XDPSIFN(double x, int n, int kode, int m, double* ans, int* nz, int* ierr) 
         t1 = tt;
         if (fn != 0.0) t1 = tt + 1.0 / fn;
         t = (fn + 1.0) * ta;
-        s = t * kBernoulli[3];
+        s = t * kDpsifnBernoulli[3];
         if (std::fabs(s) >= tst) {
           double tk = 4.0 + fn;
           for (int k = 4; k <= 22; ++k) {
