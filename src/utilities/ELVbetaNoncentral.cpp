@@ -123,37 +123,6 @@ class SecondShapeLower : public MixtureComponents {
   double a_, b_, x_;
 };
 
-// Method numbers of the two sums: 11 to 13 descending, 21 to 24 ascending.
-int64_t methodOf(const MixtureResult& r, bool descending) {
-  switch (r.end) {
-    case MixtureEnd::SeriesFailed:
-    case MixtureEnd::StartFailed:
-      return descending ? 11 : 21;
-    case MixtureEnd::CapReached:
-      return 22;
-    case MixtureEnd::Underflow:
-      return descending ? 12 : 23;
-    case MixtureEnd::AboveLimit:
-      return 100;
-    case MixtureEnd::Normal:
-      break;
-  }
-  return descending ? 13 : 24;
-}
-
-int codeOf(const MixtureResult& r) {
-  switch (r.end) {
-    case MixtureEnd::SeriesFailed:
-    case MixtureEnd::StartFailed:
-    case MixtureEnd::CapReached:
-      return 4;
-    case MixtureEnd::Underflow:
-      return 1;
-    default:
-      return 0;
-  }
-}
-
 // One mixture: which shape moves and the arguments.
 struct Mixture {
   bool secondShape;  // beta_ncdf2
@@ -210,11 +179,11 @@ void mixtureTails(const char* name, const Mixture& m, double L, double* lower, d
   double* otherOut = lowerFirst ? upper : lower;
   try {
     result = runSum(m, descending, settings);
-    method = methodOf(result, descending);
+    method = mixtureMethod(result, descending);
     if (result.end == MixtureEnd::AboveLimit) {
       settings.switchAbove = kHuge;
       result = runSum(m, !descending, settings);
-      method = 100 + methodOf(result, !descending);
+      method = 100 + mixtureMethod(result, !descending);
       std::swap(directOut, otherOut);
     }
   } catch (const std::runtime_error&) {
@@ -230,7 +199,7 @@ void mixtureTails(const char* name, const Mixture& m, double L, double* lower, d
   ELVsteps1 = result.start;
   ELVsteps2 = result.peak;
   ELVsteps3 = result.last;
-  ELVexit(name, codeOf(result), 'F');
+  ELVexit(name, mixtureCode(result), 'F');
 }
 
 // Checks shared by both routines; true when the run ends here.

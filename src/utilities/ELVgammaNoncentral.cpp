@@ -60,37 +60,6 @@ class GammaUpperTails : public MixtureComponents {
   double a_, x_;
 };
 
-// Method numbers of the two sums: 11 to 13 descending, 21 to 24 ascending.
-int64_t methodOf(const MixtureResult& r, bool descending) {
-  switch (r.end) {
-    case MixtureEnd::SeriesFailed:
-    case MixtureEnd::StartFailed:
-      return descending ? 11 : 21;
-    case MixtureEnd::CapReached:
-      return 22;
-    case MixtureEnd::Underflow:
-      return descending ? 12 : 23;
-    case MixtureEnd::AboveLimit:
-      return 100;
-    case MixtureEnd::Normal:
-      break;
-  }
-  return descending ? 13 : 24;
-}
-
-int codeOf(const MixtureResult& r) {
-  switch (r.end) {
-    case MixtureEnd::SeriesFailed:
-    case MixtureEnd::StartFailed:
-    case MixtureEnd::CapReached:
-      return 4;
-    case MixtureEnd::Underflow:
-      return 1;
-    default:
-      return 0;
-  }
-}
-
 MixtureResult runSum(bool descending, double a, double x, const MixtureSettings& settings) {
   if (descending) {
     const long k = descendingMixtureStart(settings.L);
@@ -145,7 +114,7 @@ void gamma_ncdf(double x, double a, double L, double* lower, double* upper) {
   settings.L = L;
   const bool descending = x <= a + L;
   MixtureResult result = runSum(descending, a, x, settings);
-  int64_t method = methodOf(result, descending);
+  int64_t method = mixtureMethod(result, descending);
   double direct = result.sum;
   double* directOut = descending ? lower : upper;
   double* otherOut = descending ? upper : lower;
@@ -153,7 +122,7 @@ void gamma_ncdf(double x, double a, double L, double* lower, double* upper) {
     // The other tail is the smaller one: sum it in its own right.
     settings.switchAbove = kHuge;
     result = runSum(!descending, a, x, settings);
-    method = 100 + methodOf(result, !descending);
+    method = 100 + mixtureMethod(result, !descending);
     direct = result.sum;
     std::swap(directOut, otherOut);
   }
@@ -163,7 +132,7 @@ void gamma_ncdf(double x, double a, double L, double* lower, double* upper) {
   ELVsteps1 = result.start;
   ELVsteps2 = result.peak;
   ELVsteps3 = result.last;
-  ELVexit(name, codeOf(result), 'F');
+  ELVexit(name, mixtureCode(result), 'F');
 }
 
 }  // extern "C"

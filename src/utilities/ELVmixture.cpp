@@ -154,5 +154,35 @@ MixtureResult ascendingMixtureSum(const MixtureComponents& components, long k,
   return ended(result, MixtureEnd::Normal, sum);
 }
 
+long long mixtureMethod(const MixtureResult& r, bool descending) {
+  switch (r.end) {
+    case MixtureEnd::SeriesFailed:
+    case MixtureEnd::StartFailed:
+      return descending ? 11 : 21;
+    case MixtureEnd::CapReached:
+      return 22;
+    case MixtureEnd::Underflow:
+      return descending ? 12 : 23;
+    case MixtureEnd::AboveLimit:
+      return 100;
+    case MixtureEnd::Normal:
+      break;
+  }
+  return descending ? 13 : 24;
+}
+
+int mixtureCode(const MixtureResult& r) {
+  switch (r.end) {
+    case MixtureEnd::SeriesFailed:
+    case MixtureEnd::StartFailed:
+    case MixtureEnd::CapReached:
+      return 4;
+    case MixtureEnd::Underflow:
+      return 1;
+    default:
+      return 0;
+  }
+}
+
 }  // namespace elv
 }  // namespace qel

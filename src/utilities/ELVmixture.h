@@ -68,6 +68,13 @@ MixtureResult descendingMixtureSum(const MixtureComponents& components, long k,
 MixtureResult ascendingMixtureSum(const MixtureComponents& components, long k,
                                   const MixtureSettings& settings);
 
+// The method number a sum reports: 11 to 13 for a descending sum (series
+// failed, underflow, normal end), 21 to 24 for an ascending one (series
+// failed, cap reached, underflow, normal end), 100 above the switch limit.
+long long mixtureMethod(const MixtureResult& r, bool descending);
+// The ELV code of a sum's end: 4 for a failure, 1 for an underflow, else 0.
+int mixtureCode(const MixtureResult& r);
+
 }  // namespace elv
 }  // namespace qel
 
