@@ -151,3 +151,13 @@ run(2 "^$" fit ${WORK}/qelcalc_weibull.txt --dist gauss)
 run(2 "^$" fit --dist weibull)
 run(2 "^$" pplot ${WORK}/qelcalc_weibull.txt --dist normal --method best)
 run(2 "^$" fit ${WORK}/qelcalc_weibull.txt --dist weibull --out x.csv)
+# summary: the extended summary of a column (quartiles of type 6 and moments
+# as R's quantile(x, type = 6), var and sd give them).
+file(WRITE ${WORK}/qelcalc_summary.txt "2\n4\n4\n4\n5\n5\n7\n9\n")
+run(0 "^n 8\nmean 5\nstddev 2\\.13808993529939[0-9]*\nvariance 4\\.57142857142857[0-9]*\nsum 40\nminimum 2\nq1 4\nmedian 4\\.5\nq3 6\\.5\nmaximum 9\nmodecount 1\nmodefrequency 3\nmode 4\n$"
+    summary ${WORK}/qelcalc_summary.txt)
+run(0 "^n 3\nmean 0\\.58333333333333[0-9]*\nstddev 0\\.38188130791298[0-9]*\nvariance 0\\.14583333333333[0-9]*\nsum 1\\.75\nminimum 0\\.25\nq1 0\\.25\nmedian 0\\.5\nq3 1\nmaximum 1\nmodecount 0\nmodefrequency 0\n$"
+    summary -)
+run(2 "^$" summary)
+run(2 "^$" summary ${WORK}/qelcalc_bad.txt)
+run(2 "^$" summary ${WORK}/qelcalc_summary.txt --upper 1)

@@ -12,6 +12,7 @@
 #include "fit_mode.h"
 #include "pvalue_mode.h"
 #include "sample_mode.h"
+#include "summary_mode.h"
 #include "ttest_mode.h"
 
 namespace {
@@ -25,6 +26,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printTTestUsage(out);
   qelcalc::printTestUsage(out);
   qelcalc::printFitUsage(out);
+  qelcalc::printSummaryUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -49,6 +51,7 @@ int main(int argc, char** argv) {
     if (mode == "ttest") return qelcalc::runTTestMode(argc, argv, std::cout);
     if (mode == "test") return qelcalc::runTestMode(argc, argv, std::cout);
     if (mode == "fit") return qelcalc::runFitMode(argc, argv, std::cout);
+    if (mode == "summary") return qelcalc::runSummaryMode(argc, argv, std::cout);
     if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {

@@ -10,5 +10,6 @@
 #include <qel/order_statistics.h>
 #include <qel/random.h>
 #include <qel/sampler.h>
+#include <qel/summaries.h>
 
 #endif

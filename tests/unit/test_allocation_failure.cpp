@@ -148,3 +148,47 @@ TEST(AllocationFailure, FitsAndPlotsReportOutOfMemory) {
 }
 
 }  // namespace
+
+#include <qel/summaries.h>
+
+namespace {
+
+TEST(AllocationFailure, SummariesReportOutOfMemory) {
+  const double x[] = {4.0, 1.0, 3.0, 3.0, 2.0};
+  qel::v1::LynBoxplotHelper box;
+  box.mean = 0.0;
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v1::RunLynBoxplotHelper(&box, 0.9, x, 5), qel::qelFailOutOfMemory);
+  failNextAllocation = false;
+  for (double v : {box.minimum, box.maximum, box.firstQuartile, box.median, box.thirdQuartile,
+                   box.medianLowerLimit, box.medianUpperLimit, box.lowerHinge, box.upperHinge,
+                   box.mean, box.standardDeviation}) {
+    EXPECT_TRUE(std::isnan(v));
+  }
+
+  qel::v1::SecondSampleMoments moments;
+  moments.n = 5;
+  qel::v1::FiveNumberSummary five;
+  double modes[5] = {0, 0, 0, 0, 0};
+  unsigned modeCount = 9, frequency = 9;
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v1::GetLyn2013ExtendedSummary(&moments, &five, modes, &modeCount, &frequency, x),
+            qel::qelFailOutOfMemory);
+  failNextAllocation = false;
+  EXPECT_TRUE(std::isnan(five.median));
+  EXPECT_TRUE(std::isnan(modes[0]));
+  EXPECT_EQ(modeCount, 0u);
+  EXPECT_EQ(moments.mean, 2.6);  // the moments need no scratch
+
+  five.median = 0.0;
+  failNextAllocation = true;
+  EXPECT_EQ(qel::v1::GetLynFiveNumberSummary(&five, x, 5), qel::qelFailOutOfMemory);
+  failNextAllocation = false;
+  EXPECT_EQ(five.median, 0.0);  // written only on success
+
+  // With memory again the helper succeeds.
+  EXPECT_EQ(qel::v1::RunLynBoxplotHelper(&box, 0.9, x, 5), qel::qelOk);
+  EXPECT_EQ(box.median, 3.0);
+}
+
+}  // namespace
