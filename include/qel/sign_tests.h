@@ -1,0 +1,60 @@
+// Distribution-free one-sample location tests: the sign test with its
+// interpolated interval of the median, the Wilcoxon signed rank test with the
+// Hodges-Lehmann estimate, and the runs test about a value.
+//
+// Records are caller-owned; the caller sets n and calls a Run function.
+// Return codes: 0; 10001 when the sign interval can only offer the extreme
+// order statistics (the confidence is beyond what the sample reaches); 10002
+// when the interval has to be interpolated toward the median (both warnings
+// come with valid results); 30001 when memory runs out; 30002 for an
+// IntervalType outside -1, 0, 1 (limits NaN, test not run).
+#ifndef QEL_SIGN_TESTS_H
+#define QEL_SIGN_TESTS_H
+
+#include <qel/basic_types.h>
+#include <qel/export.h>
+
+namespace qel {
+namespace v0 {
+
+// The sign test. Three interval rows: the narrower order-statistic interval
+// (x[d], x[n-d-1]), the interpolated one, and the wider (x[d-1], x[n-d]),
+// positions counted from 1 in the sorted sample.
+struct OneSampleSign {
+  double median;
+  double narrowerConfidence;  // achieved by the narrower row
+  double widerConfidence;     // achieved by the wider row
+  double narrowerLowerLimit;
+  double interpolatedLowerLimit;
+  double widerLowerLimit;
+  double narrowerUpperLimit;
+  double interpolatedUpperLimit;
+  double widerUpperLimit;
+  double narrowerPosition;  // d + 1
+  double widerPosition;     // d
+  double pValue;
+  double countBelow;
+  double countEqual;
+  double countAbove;
+  unsigned int n;
+};
+
+// Sets every double of the record to NaN; n is kept.
+QEL_API void InitializeOneSampleSign(OneSampleSign* record);
+
+// Binomial law throughout.
+QEL_API int RunOneSampleSign(OneSampleSign* record, double const* x, double confidence,
+                             IntervalType type);
+QEL_API int RunOneSampleSign(OneSampleSign* record, double const* x, double confidence,
+                             IntervalType type, AlternativeHypothesis alternative, double mu0);
+// Binomial law for n <= 50, its continuity-corrected normal approximation
+// above.
+QEL_API int RunLynOneSampleSign(OneSampleSign* record, double const* x, double confidence,
+                                IntervalType type);
+QEL_API int RunLynOneSampleSign(OneSampleSign* record, double const* x, double confidence,
+                                IntervalType type, AlternativeHypothesis alternative, double mu0);
+
+}  // namespace v0
+}  // namespace qel
+
+#endif

@@ -1,0 +1,112 @@
+#!/usr/bin/env Rscript
+# Reference values of the sign test, the Wilcoxon signed rank test and the
+# runs test from R (a peer system, used as an oracle):
+#  - sign test P-values: binom.test (n <= 50, or the exact form), and for the
+#    large-sample form the continuity-corrected normal approximation;
+#  - sign interval rows: order statistics of depth d and d+1 with d and the
+#    coverages from qbinom/pbinom (or qnorm/pnorm with continuity
+#    correction), interpolated after Hettmansperger and Sheather (1986);
+# Writes tests/data/sign_tests_samples.csv and tests/data/sign_tests_r.csv.
+# Run: Rscript tools/reference/gen_sign_tests.R (needs r-base-core).
+args <- commandArgs(trailingOnly = FALSE)
+here <- dirname(normalizePath(sub("--file=", "", args[grep("--file=", args)])))
+data <- file.path(here, "..", "..", "tests", "data")
+
+set.seed(8601)
+samples <- list(
+  one = c(3.5),
+  three = c(4, -1, 2),
+  seven = c(6.5, 1.25, 3, 9, 2.5, 4, 8),
+  ties = c(2, 2, 2, 3, 3, 7, 1, 1, 9, 2, 3, 2, 5),
+  twenty = round(rnorm(20, 1, 2), 3),
+  n50 = round(rnorm(50, 10, 3), 3),
+  n51 = round(rnorm(51, 10, 3), 3),
+  n120 = round(rexp(120, 0.5), 3)
+)
+mu0s <- list(one = 3, three = 0, seven = 3, ties = 2, twenty = 0, n50 = 11, n51 = 9.5,
+             n120 = 1.5)
+
+fmt <- function(v) ifelse(is.na(v), "nan", ifelse(is.infinite(v),
+                          ifelse(v > 0, "inf", "-inf"), sprintf("%.17g", v)))
+
+signRows <- function(x, conf, type, normal) {
+  s <- sort(x); n <- length(s)
+  out <- rep(NA_real_, 11)  # median, cn, cw, nlo, ilo, wlo, nup, iup, wup, npos, wpos
+  out[1] <- median(s)
+  code <- 0
+  cc <- if (type == 0) conf else 1 - 2 * (1 - conf)
+  if (normal) {
+    sd <- sqrt(n) / 2
+    d <- floor(qnorm((1 - cc) / 2, n / 2, sd) + 0.5)
+    F <- function(k) pnorm(k + 0.5, n / 2, sd)
+  } else {
+    d <- qbinom((1 - cc) / 2, n, 0.5)
+    F <- function(k) pbinom(k, n, 0.5)
+  }
+  if (d == 0) {
+    out[4] <- s[1]; out[7] <- s[n]; out[10] <- 1; out[2] <- 1 - 2 * F(0)
+    code <- 10001
+  } else {
+    cw <- 1 - 2 * F(d - 1)
+    out[6] <- s[d]; out[9] <- s[n - d + 1]; out[11] <- d; out[3] <- cw
+    if (2 * d < n) {
+      cn <- 1 - 2 * F(d)
+      out[4] <- s[d + 1]; out[7] <- s[n - d]; out[10] <- d + 1; out[2] <- cn
+      I <- (cw - cc) / (cw - cn)
+      lam <- (n - d) * I / (d + (n - 2 * d) * I)
+      out[5] <- s[d] + lam * (s[d + 1] - s[d])
+      out[8] <- s[n - d + 1] + lam * (s[n - d] - s[n - d + 1])
+    } else {
+      I <- (cw - cc) / cw
+      out[5] <- s[d] + I * (out[1] - s[d])
+      out[8] <- s[n - d + 1] + I * (out[1] - s[n - d + 1])
+      code <- 10002
+    }
+  }
+  if (type != 0) {
+    out[2:3] <- 1 - (1 - out[2:3]) / 2
+    if (type == 1) out[7:9] <- Inf else out[4:6] <- -Inf
+    if (type == -1 && normal) {
+      wpos <- out[11]
+      if (!is.na(out[10])) out[10] <- n - wpos
+      if (!is.na(wpos)) out[11] <- n - wpos + 1
+    }
+  }
+  c(out, code)
+}
+
+signP <- function(x, mu0, alt, normal) {
+  below <- sum(x < mu0); above <- sum(x > mu0); tot <- below + above
+  p <- if (tot == 0) 1 else if (!normal) {
+    binom.test(above, tot, 0.5, c("less", "two.sided", "greater")[alt + 2])$p.value
+  } else {
+    half <- tot / 2
+    cc <- if (alt == -1) 0.5 else if (alt == 1) -0.5 else if (above > half)
+      -min(0.5, above - half) else min(0.5, half - above)
+    z <- (above + cc - half) / sqrt(tot * 0.25)
+    if (alt == -1) pnorm(z) else if (alt == 1) pnorm(z, lower.tail = FALSE) else
+      2 * pnorm(-abs(z))
+  }
+  c(p, below, length(x) - below - above, above)
+}
+
+lines <- c("# kind,sample,type,confidence,alternative,mu0,median,narrowerConfidence,",
+           "# widerConfidence,narrowerLower,interpolatedLower,widerLower,narrowerUpper,",
+           "# interpolatedUpper,widerUpper,narrowerPosition,widerPosition,code,pValue,",
+           "# below,equal,above   (kind: sign = binomial throughout, lynsign = normal above 50)")
+for (name in names(samples)) {
+  x <- samples[[name]]
+  for (kind in c("sign", "lynsign")) {
+    normal <- kind == "lynsign" && length(x) > 50
+    for (type in c(0, 1, -1)) for (conf in c(0.9, 0.95, 0.99)) {
+      alt <- if (type == 0) 0 else -type  # a lower bound goes with "greater"
+      r <- signRows(x, conf, type, normal)
+      p <- signP(x, mu0s[[name]], alt, normal)
+      lines <- c(lines, paste(c(kind, name, fmt(c(type, conf, alt, mu0s[[name]], r, p))),
+                              collapse = ","))
+    }
+  }
+}
+writeLines(lines, file.path(data, "sign_tests_r.csv"))
+writeLines(vapply(names(samples), function(k) paste(c(k, fmt(samples[[k]])), collapse = ","), ""),
+           file.path(data, "sign_tests_samples.csv"))
