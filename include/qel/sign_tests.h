@@ -54,6 +54,29 @@ QEL_API int RunLynOneSampleSign(OneSampleSign* record, double const* x, double c
 QEL_API int RunLynOneSampleSign(OneSampleSign* record, double const* x, double confidence,
                                 IntervalType type, AlternativeHypothesis alternative, double mu0);
 
+// The Wilcoxon signed rank test. The estimate is the Hodges-Lehmann median of
+// the Walsh averages; the interval takes its ranks from the normal
+// approximation of the signed rank law. The test form replaces n by the
+// number of observations not tied with mu0; W is the signed rank sum of
+// those above mu0 (mid-ranks for ties), its P-value the continuity-corrected
+// normal approximation without a tie correction of the variance.
+struct OneSampleWilcoxon {
+  QEL_API OneSampleWilcoxon();
+  double estimatedMedian;
+  double achievedConfidence;
+  double lowerLimit;
+  double upperLimit;
+  double W;
+  double pValue;
+  int n;
+};
+
+QEL_API int RunLynOneSampleWilcoxon(OneSampleWilcoxon* record, double const* x, double confidence,
+                                    IntervalType type);
+QEL_API int RunLynOneSampleWilcoxon(OneSampleWilcoxon* record, double const* x, double confidence,
+                                    IntervalType type, AlternativeHypothesis alternative,
+                                    double mu0);
+
 }  // namespace v0
 }  // namespace qel
 

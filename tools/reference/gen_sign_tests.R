@@ -6,6 +6,13 @@
 #  - sign interval rows: order statistics of depth d and d+1 with d and the
 #    coverages from qbinom/pbinom (or qnorm/pnorm with continuity
 #    correction), interpolated after Hettmansperger and Sheather (1986);
+#  - Wilcoxon: the estimate is the median of the Walsh averages (checked
+#    against wilcox.test(exact = TRUE, conf.int = TRUE) where R computes it
+#    that way), V from wilcox.test(exact = FALSE); the P-value from
+#    wilcox.test(exact = FALSE, correct = TRUE) when there are no ties and no
+#    zeros, otherwise from the same normal formula without the tie
+#    correction of the variance; the interval is the pair of Walsh averages
+#    of ranks k+1 and T-k with k from the normal approximation;
 # Writes tests/data/sign_tests_samples.csv and tests/data/sign_tests_r.csv.
 # Run: Rscript tools/reference/gen_sign_tests.R (needs r-base-core).
 args <- commandArgs(trailingOnly = FALSE)
@@ -105,6 +112,62 @@ for (name in names(samples)) {
       lines <- c(lines, paste(c(kind, name, fmt(c(type, conf, alt, mu0s[[name]], r, p))),
                               collapse = ","))
     }
+  }
+}
+wilcoxRows <- function(x, conf, type, alt, mu0) {
+  n <- length(x)
+  out <- rep(NA_real_, 7)  # estimate, confidence, lower, upper, W, P, n
+  if (n == 1) out[1] <- x[1]
+  if (n > 1) {
+    w <- outer(x, x, "+") / 2
+    w <- sort(w[upper.tri(w, diag = TRUE)])
+    T <- n * (n + 1) / 2
+    sd <- sqrt(n * (n + 1) * (2 * n + 1) / 24)
+    a <- if (type == 0) (1 - conf) / 2 else 1 - conf
+    k <- qnorm(a) * sd + T / 2
+    k <- if (k < 0) 0 else floor(k)
+    if (k + 1 > T / 2) k <- k - 1
+    p <- pnorm((k + 0.5 - T / 2) / sd)
+    out[2] <- if (type == 0) 1 - 2 * p else 1 - p
+    out[3] <- if (type == -1) -Inf else w[k + 1]
+    out[4] <- if (type == 1) Inf else w[T - k]
+    out[1] <- median(w)
+    if (!any(duplicated(x)) && n < 50) {
+      hl <- suppressWarnings(wilcox.test(x, exact = TRUE, conf.int = TRUE))$estimate
+      stopifnot(abs(hl - out[1]) < 1e-12 * max(1, abs(hl)))
+    }
+  }
+  d <- x - mu0
+  nz <- d[d != 0]
+  m <- length(nz)
+  out[7] <- m
+  if (m > 0) {
+    alternative <- c("less", "two.sided", "greater")[alt + 2]
+    V <- unname(suppressWarnings(wilcox.test(x, mu = mu0, exact = FALSE))$statistic)
+    out[5] <- V
+    mean <- m * (m + 1) / 4
+    sd <- sqrt(m * (m + 1) * (2 * m + 1) / 24)
+    cc <- if (alt == -1) 0.5 else if (alt == 1) -0.5 else if (V > mean)
+      -min(0.5, V - mean) else min(0.5, mean - V)
+    z <- (V + cc - mean) / sd
+    out[6] <- if (alt == -1) pnorm(z) else if (alt == 1) pnorm(z, lower.tail = FALSE) else
+      2 * pnorm(-abs(z))
+    if (m == n && !any(duplicated(abs(nz))) && abs(V - mean) >= 0.5) {
+      pr <- wilcox.test(x, mu = mu0, exact = FALSE, correct = TRUE,
+                        alternative = alternative)$p.value
+      stopifnot(abs(pr - out[6]) < 1e-13)
+    }
+  }
+  out
+}
+lines <- c(lines, "# wilcoxon,sample,type,confidence,alternative,mu0,estimate,confidence,lower,upper,W,P,n")
+for (name in names(samples)) {
+  x <- samples[[name]]
+  for (type in c(0, 1, -1)) for (conf in c(0.9, 0.95)) {
+    alt <- if (type == 0) 0 else -type
+    r <- wilcoxRows(x, conf, type, alt, mu0s[[name]])
+    lines <- c(lines, paste(c("wilcoxon", name, fmt(c(type, conf, alt, mu0s[[name]], r))),
+                            collapse = ","))
   }
 }
 writeLines(lines, file.path(data, "sign_tests_r.csv"))
