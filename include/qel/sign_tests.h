@@ -78,6 +78,31 @@ QEL_API int RunLynOneSampleWilcoxon(OneSampleWilcoxon* record, double const* x, 
                                     double mu0);
 
 }  // namespace v0
+
+namespace v1 {
+
+// The runs test about a value k: observations equal to k are skipped, the
+// others are above (strictly greater than k) or below, and a run ends where
+// the side changes.
+struct RunsTest {
+  QEL_API RunsTest();
+  unsigned int countBelow;
+  unsigned int countAbove;
+  unsigned int observedRuns;
+  double expectedRuns;  // 2 * above * below / m + 1, m = above + below
+  double pValue;
+};
+
+// Each returns 0. With nothing but values equal to k the counts are 0 and
+// the expected runs and P-value NaN; with a single side the P-value is NaN.
+// The exact two-sided P-value from the distribution of the number of runs.
+QEL_API int RunRunsTest(RunsTest* record, double const* x, double k, unsigned n);
+// The two-sided P-value from the normal approximation.
+QEL_API int RunLynRunsTest(RunsTest* record, double const* x, double k, unsigned n);
+// The counts and the expected runs only.
+QEL_API int CreateRunsTestStatistics(RunsTest* record, double const* x, double k, unsigned n);
+
+}  // namespace v1
 }  // namespace qel
 
 #endif

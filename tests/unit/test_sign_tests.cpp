@@ -30,7 +30,7 @@ TEST(SignTest, MatchesR) {
   const auto rows = qeltest::loadReferenceData("sign_tests_r.csv", 2);
   ASSERT_GT(rows.size(), 100u);
   for (const auto& row : rows) {
-    if (row.text[0] == "wilcoxon") continue;
+    if (row.text[0] != "sign" && row.text[0] != "lynsign") continue;
     const auto& x = samples.at(row.text[1]);
     const double* v = row.numbers.data();
     qel::v0::OneSampleSign r;
@@ -162,6 +162,44 @@ TEST(WilcoxonTest, EdgeCases) {
             qel::qelFailBadEnumValue);
   EXPECT_TRUE(std::isnan(bad.lowerLimit));
   EXPECT_TRUE(std::isnan(bad.upperLimit));
+}
+
+TEST(RunsTest, MatchesR) {
+  const auto samples = loadSamples();
+  int checked = 0;
+  for (const auto& row : qeltest::loadReferenceData("sign_tests_r.csv", 2)) {
+    if (row.text[0] != "runs") continue;
+    ++checked;
+    const auto& x = samples.at(row.text[1]);
+    const double* v = row.numbers.data();
+    const std::string where = "line " + std::to_string(row.line);
+    const auto n = static_cast<unsigned>(x.size());
+    qel::v1::RunsTest exact, approximate, counts;
+    EXPECT_EQ(qel::v1::RunRunsTest(&exact, x.data(), v[0], n), 0);
+    EXPECT_EQ(qel::v1::RunLynRunsTest(&approximate, x.data(), v[0], n), 0);
+    EXPECT_EQ(qel::v1::CreateRunsTestStatistics(&counts, x.data(), v[0], n), 0);
+    for (auto const* r : {&exact, &approximate, &counts}) {
+      EXPECT_EQ(r->countBelow, v[1]) << where;
+      EXPECT_EQ(r->countAbove, v[2]) << where;
+      EXPECT_EQ(r->observedRuns, v[3]) << where;
+      expectClose(r->expectedRuns, v[4], 1e-15, where + " expected");
+    }
+    expectClose(exact.pValue, v[5], 1e-12, where + " exact P");
+    expectClose(approximate.pValue, v[6], 1e-10, where + " approximate P");
+    EXPECT_TRUE(std::isnan(counts.pValue));
+  }
+  EXPECT_GT(checked, 10);
+}
+
+TEST(RunsTest, AllEqualToK) {
+  const double x[] = {4.0, 4.0, 4.0};
+  qel::v1::RunsTest r;
+  EXPECT_EQ(qel::v1::RunRunsTest(&r, x, 4.0, 3), 0);
+  EXPECT_EQ(r.countBelow + r.countAbove + r.observedRuns, 0u);
+  EXPECT_TRUE(std::isnan(r.expectedRuns));
+  EXPECT_TRUE(std::isnan(r.pValue));
+  EXPECT_EQ(qel::v1::RunLynRunsTest(&r, x, 4.0, 0), 0);
+  EXPECT_TRUE(std::isnan(r.pValue));
 }
 
 }  // namespace

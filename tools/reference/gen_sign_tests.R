@@ -13,6 +13,10 @@
 #    zeros, otherwise from the same normal formula without the tie
 #    correction of the variance; the interval is the pair of Walsh averages
 #    of ranks k+1 and T-k with k from the normal approximation;
+#  - runs test about k: counts and runs by rle() after dropping the values
+#    equal to k; the exact P-value from the distribution of the number of
+#    runs (Swed and Eisenhart, 1943) with choose(), the approximate one from
+#    its mean and variance with pnorm;
 # Writes tests/data/sign_tests_samples.csv and tests/data/sign_tests_r.csv.
 # Run: Rscript tools/reference/gen_sign_tests.R (needs r-base-core).
 args <- commandArgs(trailingOnly = FALSE)
@@ -167,6 +171,37 @@ for (name in names(samples)) {
     alt <- if (type == 0) 0 else -type
     r <- wilcoxRows(x, conf, type, alt, mu0s[[name]])
     lines <- c(lines, paste(c("wilcoxon", name, fmt(c(type, conf, alt, mu0s[[name]], r))),
+                            collapse = ","))
+  }
+}
+runsProb <- function(r, n1, n2) {
+  ch <- function(a, b) if (b < 0 || a < 0 || b > a) 0 else choose(a, b)
+  if (r %% 2 == 0) {
+    h <- r / 2 - 1
+    2 * ch(n1 - 1, h) * ch(n2 - 1, h) / choose(n1 + n2, n1)
+  } else {
+    h <- (r - 1) / 2
+    (ch(n1 - 1, h) * ch(n2 - 1, h - 1) + ch(n1 - 1, h - 1) * ch(n2 - 1, h)) / choose(n1 + n2, n1)
+  }
+}
+lines <- c(lines, "# runs,sample,k,below,above,runs,expected,exactP,approximateP")
+for (name in names(samples)) {
+  x <- samples[[name]]
+  for (k in c(mu0s[[name]], median(x))) {
+    y <- x[x != k]
+    above <- sum(y > k); below <- length(y) - above; m <- length(y)
+    runs <- length(rle(y > k)$lengths)
+    expected <- if (m > 0) 2 * above * below / m + 1 else NA
+    exact <- NA; approx <- NA
+    if (above > 0 && below > 0) {
+      lo <- sum(vapply(2:runs, function(r) runsProb(r, below, above), 0))
+      up <- sum(vapply(runs:m, function(r) runsProb(r, below, above), 0))
+      exact <- min(1, 2 * min(lo, up))
+      A <- 2 * above * below
+      v <- A * (A - m) / (m * m * (m - 1))
+      if (v > 0) approx <- 2 * pnorm(-abs(runs - expected) / sqrt(v))
+    }
+    lines <- c(lines, paste(c("runs", name, fmt(c(k, below, above, runs, expected, exact, approx))),
                             collapse = ","))
   }
 }
