@@ -26,6 +26,7 @@ data <- file.path(here, "..", "..", "tests", "data")
 set.seed(8601)
 samples <- list(
   one = c(3.5),
+  two = c(5, 1),
   three = c(4, -1, 2),
   seven = c(6.5, 1.25, 3, 9, 2.5, 4, 8),
   ties = c(2, 2, 2, 3, 3, 7, 1, 1, 9, 2, 3, 2, 5),
@@ -34,7 +35,7 @@ samples <- list(
   n51 = round(rnorm(51, 10, 3), 3),
   n120 = round(rexp(120, 0.5), 3)
 )
-mu0s <- list(one = 3, three = 0, seven = 3, ties = 2, twenty = 0, n50 = 11, n51 = 9.5,
+mu0s <- list(one = 3, two = 5, three = 0, seven = 3, ties = 2, twenty = 0, n50 = 11, n51 = 9.5,
              n120 = 1.5)
 
 fmt <- function(v) ifelse(is.na(v), "nan", ifelse(is.infinite(v),
@@ -109,7 +110,8 @@ for (name in names(samples)) {
   x <- samples[[name]]
   for (kind in c("sign", "lynsign")) {
     normal <- kind == "lynsign" && length(x) > 50
-    for (type in c(0, 1, -1)) for (conf in c(0.9, 0.95, 0.99)) {
+    for (type in c(0, 1, -1)) for (conf in c(0.4, 0.9, 0.95, 0.99)) {
+      if (type != 0 && conf < 0.5) next  # one-sided needs 1 - 2(1 - conf) > 0
       alt <- if (type == 0) 0 else -type  # a lower bound goes with "greater"
       r <- signRows(x, conf, type, normal)
       p <- signP(x, mu0s[[name]], alt, normal)
