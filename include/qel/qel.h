@@ -6,6 +6,7 @@
 #include <qel/descriptive.h>
 #include <qel/distributions.h>
 #include <qel/location_tests.h>
+#include <qel/sign_tests.h>
 #include <qel/fits.h>
 #include <qel/order_statistics.h>
 #include <qel/random.h>
