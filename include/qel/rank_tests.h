@@ -1,0 +1,53 @@
+// Rank tests: Mann-Whitney with the Hodges-Lehmann estimate of the shift and
+// its interval, and Kruskal-Wallis.
+//
+// Every test has a caller-owned record. The Run function resets the outputs
+// of the record to NaN (a P-value adjusted for ties to -1 when there are no
+// ties) and then fills them from the inputs, so the caller sets only the
+// sample sizes and data.
+//
+// Values are tied when the larger exceeds the smaller by no more than a small
+// tolerance relative to the size of the data, not only when they are equal.
+//
+// Return codes: 0; 30002 for an IntervalType or alternative outside -1, 0, 1
+// (outputs NaN); 30023 for a Mann-Whitney sample of identical values
+// (outputs NaN); 30001 when memory runs out.
+#ifndef QEL_RANK_TESTS_H
+#define QEL_RANK_TESTS_H
+
+#include <qel/basic_types.h>
+#include <qel/export.h>
+
+namespace qel {
+namespace v0 {
+
+// Mann-Whitney rank-sum test of two independent samples, with the
+// Hodges-Lehmann estimate of the shift first - second (the median of the
+// n1 * n2 pairwise differences) and its distribution-free interval from
+// order statistics of those differences (normal approximation of the rank).
+struct MannWhitney {
+  QEL_API MannWhitney();
+  double firstMedian;
+  double secondMedian;
+  double estimate;  // Hodges-Lehmann shift, first minus second
+  double lowerLimit;
+  double upperLimit;
+  double achievedConfidence;
+  double statistic;       // W: the rank sum of the first sample
+  double pValue;          // normal approximation with continuity correction
+  double adjustedPValue;  // variance adjusted for ties; -1 without ties
+  int firstN;
+  int secondN;
+};
+
+// x holds firstN values, y secondN. confidence is a fraction in (0, 1); type
+// -1 gives (-inf, upper], 0 a two-sided interval, 1 [lower, +inf). The
+// alternative -1 tests "first below second", 1 "first above second".
+QEL_API int RunLynMannWhitney(MannWhitney* record, double const* x, double const* y,
+                              double confidence, IntervalType type,
+                              AlternativeHypothesis alternative);
+
+}  // namespace v0
+}  // namespace qel
+
+#endif

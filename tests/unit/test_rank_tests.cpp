@@ -1,0 +1,162 @@
+// Rank tests against R (tools/reference/gen_rank_tests.R) and, for the
+// Hodges-Lehmann shift and its limits, against all pairwise differences.
+#include <gtest/gtest.h>
+#include <qel/rank_tests.h>
+
+#include <algorithm>
+#include <cmath>
+#include <map>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "reference_data.h"
+
+namespace {
+
+struct Cases {
+  std::map<std::string, std::map<std::string, std::vector<double>>> byCase;
+};
+
+Cases loadCases() {
+  Cases cases;
+  for (auto const& row : qeltest::loadReferenceData("rank_tests_r.csv", 2)) {
+    cases.byCase[row.text[1]][row.text[0]] = row.numbers;
+  }
+  return cases;
+}
+
+// All differences x[i] - y[j], sorted.
+std::vector<double> allDifferences(std::vector<double> const& x, std::vector<double> const& y) {
+  std::vector<double> d;
+  for (double a : x) {
+    for (double b : y) d.push_back(a - b);
+  }
+  std::sort(d.begin(), d.end());
+  return d;
+}
+
+double sortedMedian(std::vector<double> const& d) {
+  std::size_t n = d.size();
+  return n % 2 ? d[n / 2] : 0.5 * (d[n / 2 - 1] + d[n / 2]);
+}
+
+int runMannWhitney(qel::v0::MannWhitney& r, std::vector<double> const& x,
+                   std::vector<double> const& y, double confidence, int type, int alternative) {
+  r.firstN = static_cast<int>(x.size());
+  r.secondN = static_cast<int>(y.size());
+  return qel::v0::RunLynMannWhitney(&r, x.data(), y.data(), confidence,
+                                    static_cast<qel::IntervalType>(type),
+                                    static_cast<qel::AlternativeHypothesis>(alternative));
+}
+
+}  // namespace
+
+TEST(MannWhitney, MatchesR) {
+  Cases cases = loadCases();
+  int checked = 0;
+  for (auto const& [name, rows] : cases.byCase) {
+    if (!rows.count("mw")) continue;
+    std::vector<double> const& x = rows.at("mw_x");
+    std::vector<double> const& y = rows.at("mw_y");
+    std::vector<double> const& ref = rows.at("mw");
+    qel::v0::MannWhitney r;
+    ASSERT_EQ(runMannWhitney(r, x, y, ref[1], int(ref[2]), int(ref[0])), 0) << name;
+    EXPECT_EQ(r.statistic, ref[3]) << name;
+    const bool ties = ref[5] != 0.0;
+    EXPECT_LT(qeltest::relativeError(ties ? r.adjustedPValue : r.pValue, ref[4]), 1e-9) << name;
+    if (!ties) {
+      EXPECT_EQ(r.adjustedPValue, -1.0) << name;
+    }
+    EXPECT_NEAR(r.estimate, ref[6], 1e-12) << name;
+    EXPECT_NEAR(r.lowerLimit, ref[7], 1e-12) << name;
+    EXPECT_NEAR(r.upperLimit, ref[8], 1e-12) << name;
+    std::vector<double> sx = x, sy = y;
+    std::sort(sx.begin(), sx.end());
+    std::sort(sy.begin(), sy.end());
+    EXPECT_DOUBLE_EQ(r.firstMedian, sortedMedian(sx)) << name;
+    EXPECT_DOUBLE_EQ(r.secondMedian, sortedMedian(sy)) << name;
+    EXPECT_GT(r.achievedConfidence, ref[1] - 0.02) << name;
+    ++checked;
+  }
+  EXPECT_EQ(checked, 6);
+}
+
+// Random sizes, with and without heavy ties, one- and two-sided: the shift
+// is the median of all differences and the limits are order statistics of
+// them, with the same rank from each end.
+TEST(MannWhitney, ShiftAndLimitsAgreeWithAllDifferences) {
+  std::mt19937 rng(5);
+  std::normal_distribution<double> normal;
+  for (int trial = 0; trial < 40; ++trial) {
+    int n1 = 2 + int(rng() % 30);
+    int n2 = 2 + int(rng() % 30);
+    bool rounded = trial % 2 == 1;
+    std::vector<double> x(n1), y(n2);
+    for (double& v : x) v = rounded ? std::round(2 * normal(rng)) : normal(rng) + 0.4;
+    for (double& v : y) v = rounded ? std::round(2 * normal(rng)) : normal(rng);
+    std::vector<double> d = allDifferences(x, y);
+    const std::size_t N = d.size();
+    qel::v0::MannWhitney two, lower, upper;
+    if (runMannWhitney(two, x, y, 0.9, 0, 0) != 0) continue;  // a constant rounded sample
+    ASSERT_EQ(runMannWhitney(upper, x, y, 0.9, -1, 0), 0);
+    ASSERT_EQ(runMannWhitney(lower, x, y, 0.9, 1, 0), 0);
+    EXPECT_NEAR(two.estimate, sortedMedian(d), 1e-12) << trial;
+    EXPECT_EQ(two.estimate, upper.estimate);
+    // The two-sided limits are symmetric in rank.
+    auto upperRank =
+        std::count_if(d.begin(), d.end(), [&](double v) { return v < two.upperLimit - 1e-9; });
+    auto lowerRank =
+        std::count_if(d.begin(), d.end(), [&](double v) { return v <= two.lowerLimit + 1e-9; });
+    EXPECT_TRUE(std::binary_search(d.begin(), d.end(), two.lowerLimit) ||
+                std::any_of(d.begin(), d.end(),
+                            [&](double v) { return std::fabs(v - two.lowerLimit) < 1e-12; }));
+    EXPECT_LE(lowerRank, long(N));
+    EXPECT_LE(two.lowerLimit, two.estimate);
+    EXPECT_GE(two.upperLimit, two.estimate);
+    if (!rounded) {
+      EXPECT_EQ(std::size_t(lowerRank), N - std::size_t(upperRank)) << trial;
+    }
+    // One-sided limits sit further in than the two-sided ones at the same
+    // confidence and the other side is infinite.
+    EXPECT_EQ(upper.lowerLimit, -INFINITY);
+    EXPECT_EQ(lower.upperLimit, INFINITY);
+    EXPECT_LE(upper.upperLimit, two.upperLimit);
+    EXPECT_GE(lower.lowerLimit, two.lowerLimit);
+  }
+}
+
+TEST(MannWhitney, DegenerateAndBadInput) {
+  std::vector<double> constant(6, 2.5), varying{1, 2, 3, 4, 5};
+  qel::v0::MannWhitney r;
+  EXPECT_EQ(runMannWhitney(r, constant, varying, 0.95, 0, 0), 30023);
+  EXPECT_TRUE(std::isnan(r.statistic) && std::isnan(r.estimate) && std::isnan(r.firstMedian));
+  EXPECT_EQ(runMannWhitney(r, varying, constant, 0.95, 0, 0), 30023);
+  // Values differing by less than the tolerance count as one value.
+  std::vector<double> nearly{1.0, 1.0 + 1e-14, 1.0 - 1e-14};
+  EXPECT_EQ(runMannWhitney(r, nearly, varying, 0.95, 0, 0), 30023);
+  EXPECT_EQ(runMannWhitney(r, varying, varying, 0.95, 2, 0), 30002);
+  EXPECT_TRUE(std::isnan(r.lowerLimit) && std::isnan(r.pValue));
+  EXPECT_EQ(runMannWhitney(r, varying, varying, 0.95, 0, -2), 30002);
+  EXPECT_TRUE(std::isnan(r.statistic));
+  // Identical samples: W equals its expectation, no correction at all, P 1.
+  EXPECT_EQ(runMannWhitney(r, varying, varying, 0.95, 0, 0), 0);
+  EXPECT_EQ(r.statistic, 27.5);
+  EXPECT_DOUBLE_EQ(r.adjustedPValue, 1.0);
+  EXPECT_EQ(r.estimate, 0.0);
+}
+
+// The two-sided continuity correction: 0.5 towards the expectation, and
+// none when W equals it (a fixed 0.5 would overshoot past it).
+TEST(MannWhitney, SmallTwoSidedCorrection) {
+  std::vector<double> x2{1, 3.5, 5.5}, y2{2, 3, 4, 6};  // W 1 + 4 + 6 = 11, EW 12
+  qel::v0::MannWhitney r;
+  ASSERT_EQ(runMannWhitney(r, x2, y2, 0.9, 0, 0), 0);
+  EXPECT_EQ(r.statistic, 11.0);
+  const double sd = std::sqrt(8.0 * 12.0 / 12.0);
+  EXPECT_NEAR(r.pValue, std::erfc((0.5 / sd) / std::sqrt(2.0)), 1e-14);
+  std::vector<double> x3{1, 3.5, 6.5}, y3{2, 3, 4, 6};  // W 1 + 4 + 7 = 12 = EW
+  ASSERT_EQ(runMannWhitney(r, x3, y3, 0.9, 0, 0), 0);
+  EXPECT_EQ(r.statistic, 12.0);
+  EXPECT_DOUBLE_EQ(r.pValue, 1.0);
+}

@@ -1,0 +1,47 @@
+# Reference values of the rank tests from R's wilcox.test and kruskal.test.
+# Run: Rscript tools/reference/gen_rank_tests.R > tests/data/rank_tests_r.csv
+#
+# Rows: kind,case,numbers...
+#   mw_x / mw_y / kw_g<i> : the data of a case
+#   mw   : alternative(-1 less,0,1 greater), confidence, type(0 two-sided),
+#          W (rank sum of x), P-value (continuity-corrected normal
+#          approximation, variance adjusted for ties when there are ties),
+#          ties(0/1), Hodges-Lehmann shift (median of all x - y),
+#          lower, upper (the (N-k)-th and (k+1)-th smallest y - x, negated)
+#   kw   : H adjusted for ties, degrees of freedom, P-value, ties(0/1)
+options(digits = 17)
+set.seed(20261123)
+emitRow <- function(kind, case, v) cat(paste(c(kind, case, sprintf("%.17g", v)), collapse = ","), "\n", sep = "")
+
+mwCase <- function(name, x, y, alt, conf) {
+  emitRow("mw_x", name, x)
+  emitRow("mw_y", name, y)
+  altName <- c("less", "two.sided", "greater")[alt + 2]
+  r <- wilcox.test(x, y, alternative = altName, exact = FALSE, correct = TRUE)
+  n1 <- length(x); n2 <- length(y); N <- n1 * n2
+  d <- sort(as.vector(outer(y, x, "-")))          # y - x, all of them
+  sd <- sqrt((n1 + n2 + 1) * N / 12)
+  k <- max(0, floor(N / 2 - 0.5 + qnorm((1 - conf) / 2) * sd))
+  ties <- as.numeric(length(unique(c(x, y))) < n1 + n2)
+  emitRow("mw", name, c(alt, conf, 0, unname(r$statistic) + n1 * (n1 + 1) / 2, r$p.value,
+                        ties, median(-d), -d[N - k], -d[k + 1]))
+}
+
+mwCase("small", c(1.83, 0.50, 1.62, 2.48, 1.68, 1.88, 1.55, 3.06, 1.30),
+       c(0.878, 0.647, 0.598, 2.05, 1.06, 1.29, 1.06, 3.14, 1.29), 0, 0.95)
+mwCase("normal_greater", rnorm(40, 1), rnorm(33), 1, 0.9)
+mwCase("normal_less", rnorm(25), rnorm(60, 0.3, 2), -1, 0.99)
+mwCase("ties", round(rnorm(50, 0.5) * 2) / 2, round(rnorm(45) * 2) / 2, 0, 0.95)
+mwCase("even_N", rexp(20), rexp(30, 2), 0, 0.8)
+mwCase("large", rnorm(700, 0.1), rnorm(900), 0, 0.95)
+
+kwCase <- function(name, groups) {
+  for (i in seq_along(groups)) emitRow(paste0("kw_g", i), name, groups[[i]])
+  r <- kruskal.test(groups)
+  all <- unlist(groups)
+  ties <- as.numeric(length(unique(all)) < length(all))
+  emitRow("kw", name, c(unname(r$statistic), unname(r$parameter), r$p.value, ties))
+}
+kwCase("three", list(rnorm(10), rnorm(15, 0.8), rnorm(7, -0.3)))
+kwCase("ties", list(round(rnorm(20)), round(rnorm(25, 0.5)), round(rnorm(18)), round(rnorm(9, 1))))
+kwCase("two", list(rexp(30), rexp(41, 0.7)))
