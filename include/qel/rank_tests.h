@@ -1,5 +1,5 @@
 // Rank tests: Mann-Whitney with the Hodges-Lehmann estimate of the shift and
-// its interval, and Kruskal-Wallis.
+// its interval, and Kruskal-Wallis with group medians and mean ranks.
 //
 // Every test has a caller-owned record. The Run function resets the outputs
 // of the record to NaN (a P-value adjusted for ties to -1 when there are no
@@ -46,6 +46,33 @@ struct MannWhitney {
 QEL_API int RunLynMannWhitney(MannWhitney* record, double const* x, double const* y,
                               double confidence, IntervalType type,
                               AlternativeHypothesis alternative);
+
+// One group of a Kruskal-Wallis test: data and n are inputs, the rest
+// outputs. meanRank is the group's average rank among all observations and z
+// its standardised distance from the overall average (N + 1) / 2.
+struct KruskalWallisGroup {
+  double median;
+  double meanRank;
+  double z;
+  double const* data;
+  unsigned int n;
+};
+
+// Kruskal-Wallis test of k independent groups: H on k - 1 degrees of freedom
+// (chi-square approximation), and H divided by the tie correction
+// 1 - sum(m^3 - m) / (N^3 - N) when there are ties.
+struct KruskalWallis {
+  QEL_API KruskalWallis();
+  double statistic;  // H
+  double degreesOfFreedom;
+  double pValue;
+  double adjustedStatistic;    // NaN without ties
+  double adjustedPValue;       // -1 without ties
+  KruskalWallisGroup* groups;  // caller-owned, groupCount entries
+  unsigned int groupCount;
+};
+
+QEL_API int RunLynKruskalWallis(KruskalWallis* record);
 
 }  // namespace v0
 }  // namespace qel

@@ -160,3 +160,71 @@ TEST(MannWhitney, SmallTwoSidedCorrection) {
   EXPECT_EQ(r.statistic, 12.0);
   EXPECT_DOUBLE_EQ(r.pValue, 1.0);
 }
+
+namespace {
+
+int runKruskalWallis(qel::v0::KruskalWallis& r, std::vector<std::vector<double>> const& data,
+                     std::vector<qel::v0::KruskalWallisGroup>& groups) {
+  groups.clear();
+  for (auto const& d : data) {
+    qel::v0::KruskalWallisGroup g{};
+    g.data = d.data();
+    g.n = static_cast<unsigned int>(d.size());
+    groups.push_back(g);
+  }
+  r.groups = groups.data();
+  r.groupCount = static_cast<unsigned int>(groups.size());
+  return qel::v0::RunLynKruskalWallis(&r);
+}
+
+}  // namespace
+
+TEST(KruskalWallis, MatchesR) {
+  Cases cases = loadCases();
+  int checked = 0;
+  for (auto const& [name, rows] : cases.byCase) {
+    if (!rows.count("kw")) continue;
+    std::vector<std::vector<double>> data;
+    for (int i = 1; rows.count("kw_g" + std::to_string(i)); ++i) {
+      data.push_back(rows.at("kw_g" + std::to_string(i)));
+    }
+    std::vector<double> const& ref = rows.at("kw");
+    qel::v0::KruskalWallis r;
+    std::vector<qel::v0::KruskalWallisGroup> groups;
+    ASSERT_EQ(runKruskalWallis(r, data, groups), 0) << name;
+    const bool ties = ref[3] != 0.0;
+    EXPECT_LT(qeltest::relativeError(ties ? r.adjustedStatistic : r.statistic, ref[0]), 1e-12)
+        << name;
+    EXPECT_EQ(r.degreesOfFreedom, ref[1]);
+    EXPECT_LT(qeltest::relativeError(ties ? r.adjustedPValue : r.pValue, ref[2]), 1e-9) << name;
+    if (ties) {
+      EXPECT_LT(r.statistic, r.adjustedStatistic) << name;
+    } else {
+      EXPECT_TRUE(std::isnan(r.adjustedStatistic)) << name;
+      EXPECT_EQ(r.adjustedPValue, -1.0) << name;
+    }
+    // The mean ranks average to (N + 1) / 2; the medians are those of the data.
+    double N = 0.0, rankTotal = 0.0;
+    for (std::size_t g = 0; g < data.size(); ++g) {
+      std::vector<double> sorted = data[g];
+      std::sort(sorted.begin(), sorted.end());
+      EXPECT_EQ(groups[g].median, sortedMedian(sorted)) << name << " group " << g;
+      N += double(sorted.size());
+      rankTotal += groups[g].meanRank * double(sorted.size());
+    }
+    EXPECT_NEAR(rankTotal, N * (N + 1) / 2, 1e-9) << name;
+    ++checked;
+  }
+  EXPECT_EQ(checked, 3);
+}
+
+TEST(KruskalWallis, OneGroupHasNoDegreesOfFreedom) {
+  std::vector<std::vector<double>> data{{3.0, 1.0, 2.0, 5.0}};
+  qel::v0::KruskalWallis r;
+  std::vector<qel::v0::KruskalWallisGroup> groups;
+  EXPECT_EQ(runKruskalWallis(r, data, groups), 0);
+  EXPECT_EQ(r.degreesOfFreedom, 0.0);
+  EXPECT_EQ(r.statistic, 0.0);
+  EXPECT_EQ(groups[0].median, 2.5);
+  EXPECT_EQ(groups[0].meanRank, 2.5);
+}
