@@ -74,6 +74,47 @@ struct KruskalWallis {
 
 QEL_API int RunLynKruskalWallis(KruskalWallis* record);
 
+// One group of Mood's median test: data and n are inputs, the rest outputs
+// (NaN until computed). The limits are the group median's sign interval at
+// 95% with the nonlinear interpolation of Hettmansperger and Sheather.
+struct MoodGroup {
+  double countAtOrBelow;  // of the overall median (class of the ties)
+  double countAbove;
+  double median;
+  double interquartileRange;  // Q3 - Q1 at positions (n + 1) / 4, 3 (n + 1) / 4
+  double lowerLimit;
+  double upperLimit;
+  double const* data;
+  unsigned int n;
+};
+
+// Flags of Mood's median test; any of them makes the run return 10000
+// (results still valid).
+constexpr unsigned int kMoodFewAbove = 2;      // fewer values above than groups
+constexpr unsigned int kMoodFewBelow = 4;      // ties went up, fewer below than groups
+constexpr unsigned int kMoodNoDegrees = 8;     // fewer than two groups of n > 1
+constexpr unsigned int kMoodTiesMovedUp = 16;  // values at the median counted above
+
+// Mood's median test of k groups: the 2 x k table of counts at or below and
+// above the overall median, chi-square on (groups of n > 1) - 1 degrees of
+// freedom. With two groups, an interval for the difference of the medians
+// from one-sample sign intervals whose confidences combine to 95%.
+struct Mood {
+  QEL_API Mood();
+  double overallMedian;
+  double statistic;  // chi-square
+  double degreesOfFreedom;
+  double pValue;
+  double lowerLimit;  // median difference first - second, two groups only
+  double upperLimit;
+  double achievedConfidence;
+  MoodGroup* groups;  // caller-owned, groupCount entries
+  unsigned int groupCount;
+  unsigned int flags;
+};
+
+QEL_API int RunLynMood(Mood* record);
+
 }  // namespace v0
 }  // namespace qel
 

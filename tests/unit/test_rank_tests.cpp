@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "interfaces/basic_statistics/sign_interval.h"
 #include "reference_data.h"
 
 namespace {
@@ -227,4 +228,102 @@ TEST(KruskalWallis, OneGroupHasNoDegreesOfFreedom) {
   EXPECT_EQ(r.statistic, 0.0);
   EXPECT_EQ(groups[0].median, 2.5);
   EXPECT_EQ(groups[0].meanRank, 2.5);
+}
+
+namespace {
+
+int runMood(qel::v0::Mood& r, std::vector<std::vector<double>> const& data,
+            std::vector<qel::v0::MoodGroup>& groups) {
+  groups.clear();
+  for (auto const& d : data) {
+    qel::v0::MoodGroup g{};
+    g.data = d.data();
+    g.n = static_cast<unsigned int>(d.size());
+    groups.push_back(g);
+  }
+  r.groups = groups.data();
+  r.groupCount = static_cast<unsigned int>(groups.size());
+  return qel::v0::RunLynMood(&r);
+}
+
+}  // namespace
+
+TEST(Mood, MatchesR) {
+  Cases cases = loadCases();
+  int checked = 0;
+  for (auto const& [name, rows] : cases.byCase) {
+    if (!rows.count("md")) continue;
+    std::vector<std::vector<double>> data;
+    for (int i = 1; rows.count("md_g" + std::to_string(i)); ++i) {
+      data.push_back(rows.at("md_g" + std::to_string(i)));
+    }
+    std::vector<double> const& ref = rows.at("md");
+    qel::v0::Mood r;
+    std::vector<qel::v0::MoodGroup> groups;
+    ASSERT_EQ(runMood(r, data, groups), 0) << name;
+    EXPECT_EQ(r.overallMedian, ref[0]) << name;
+    EXPECT_LT(qeltest::relativeError(r.statistic, ref[1]), 1e-12) << name;
+    EXPECT_EQ(r.degreesOfFreedom, ref[2]) << name;
+    EXPECT_LT(qeltest::relativeError(r.pValue, ref[3]), 1e-9) << name;
+    for (std::size_t g = 0; g < data.size(); ++g) {
+      std::vector<double> const& s = rows.at("md_s" + std::to_string(g + 1));
+      EXPECT_EQ(groups[g].median, s[0]) << name << g;
+      EXPECT_NEAR(groups[g].interquartileRange, s[1], 1e-13) << name << g;
+      EXPECT_EQ(groups[g].countAtOrBelow, s[2]) << name << g;
+      EXPECT_EQ(groups[g].countAbove, s[3]) << name << g;
+      EXPECT_LE(groups[g].lowerLimit, groups[g].median);
+      EXPECT_GE(groups[g].upperLimit, groups[g].median);
+    }
+    if (data.size() == 2) {
+      EXPECT_LE(r.lowerLimit, groups[0].median - groups[1].median) << name;
+      EXPECT_GE(r.upperLimit, groups[0].median - groups[1].median) << name;
+      EXPECT_NEAR(r.achievedConfidence, 0.95, 1e-12) << name;
+    } else {
+      EXPECT_TRUE(std::isnan(r.lowerLimit) && std::isnan(r.achievedConfidence)) << name;
+    }
+    ++checked;
+  }
+  EXPECT_EQ(checked, 3);
+}
+
+// n = 5 cannot reach 95%: the whole range. A confidence equal to the
+// coverage of [x(2), x(9)] for n = 10, 1 - 22/1024, gives exactly those
+// order statistics.
+TEST(Mood, SignIntervalLimits) {
+  std::vector<std::vector<double>> data{{4, 1, 5, 3, 2}, {10, 2, 8, 6, 4, 1, 9, 3, 7, 5}};
+  qel::v0::Mood r;
+  std::vector<qel::v0::MoodGroup> groups;
+  runMood(r, data, groups);
+  EXPECT_EQ(groups[0].lowerLimit, 1.0);
+  EXPECT_EQ(groups[0].upperLimit, 5.0);
+  unsigned int d = 0;
+  double lambda = -1.0;
+  qel::v0::Sint(10, 1.0 - 22.0 / 1024.0, &d, &lambda);
+  EXPECT_EQ(d, 1u);
+  EXPECT_NEAR(lambda, 1.0, 1e-12);
+  qel::v0::Sint(5, 0.95, &d, &lambda);
+  EXPECT_EQ(d, 1u);
+  EXPECT_EQ(lambda, 0.0);
+}
+
+TEST(Mood, FlagsAndSingletonGroups) {
+  // Most values tie at the median on the low side: they move up, flag 16.
+  std::vector<std::vector<double>> tied{{1, 2, 2, 2, 2}, {2, 2, 2, 3}, {2, 2, 0}};
+  qel::v0::Mood r;
+  std::vector<qel::v0::MoodGroup> groups;
+  EXPECT_EQ(runMood(r, tied, groups), 10000);
+  EXPECT_TRUE(r.flags & qel::v0::kMoodTiesMovedUp);
+  EXPECT_EQ(groups[0].countAtOrBelow, 1.0);  // only the 1 is clearly below
+  EXPECT_EQ(groups[0].countAbove, 4.0);
+  EXPECT_FALSE(std::isnan(r.statistic));
+  // A group of one is counted and described but adds no degree of freedom.
+  std::vector<std::vector<double>> single{{1.5, 2.5, 3.5, 0.5}, {4.0}, {0.2, 3.1, 2.2}};
+  EXPECT_EQ(runMood(r, single, groups), 0);
+  EXPECT_EQ(r.degreesOfFreedom, 1.0);
+  EXPECT_EQ(groups[1].median, 4.0);
+  EXPECT_EQ(groups[1].countAbove, 1.0);
+  // One group only: no degrees of freedom, flag 8.
+  std::vector<std::vector<double>> one{{1, 2, 3, 4, 5, 6}};
+  EXPECT_EQ(runMood(r, one, groups), 10000);
+  EXPECT_TRUE(r.flags & qel::v0::kMoodNoDegrees);
 }

@@ -45,3 +45,24 @@ kwCase <- function(name, groups) {
 kwCase("three", list(rnorm(10), rnorm(15, 0.8), rnorm(7, -0.3)))
 kwCase("ties", list(round(rnorm(20)), round(rnorm(25, 0.5)), round(rnorm(18)), round(rnorm(9, 1))))
 kwCase("two", list(rexp(30), rexp(41, 0.7)))
+
+# Mood's median test from its definition: counts above the overall median
+# against those at or below it, Pearson's chi-square without continuity
+# correction. Group medians and Q3 - Q1 at positions (n + 1) p (type 6).
+#   md   : overall median, chi-square, degrees of freedom, P-value
+#   md_s<i> : group median, Q3 - Q1, count at or below, count above
+moodCase <- function(name, groups) {
+  for (i in seq_along(groups)) emitRow(paste0("md_g", i), name, groups[[i]])
+  M <- median(unlist(groups))
+  tab <- rbind(sapply(groups, function(g) sum(g <= M)), sapply(groups, function(g) sum(g > M)))
+  r <- suppressWarnings(chisq.test(tab, correct = FALSE))
+  emitRow("md", name, c(M, unname(r$statistic), unname(r$parameter), r$p.value))
+  for (i in seq_along(groups)) {
+    g <- groups[[i]]
+    q <- quantile(g, c(0.25, 0.75), type = 6)
+    emitRow(paste0("md_s", i), name, c(median(g), unname(q[2] - q[1]), sum(g <= M), sum(g > M)))
+  }
+}
+moodCase("three", list(rnorm(12), rnorm(17, 1), rnorm(9, 0.5)))
+moodCase("two", list(rexp(25), rexp(31, 0.5)))
+moodCase("four", list(rnorm(30), rnorm(22, 0.2), rnorm(41, -0.4), rnorm(15)))
