@@ -1,5 +1,6 @@
 // Rank tests: Mann-Whitney with the Hodges-Lehmann estimate of the shift and
-// its interval, and Kruskal-Wallis with group medians and mean ranks.
+// its interval, Kruskal-Wallis, Mood's median test and Friedman's test with
+// treatment effects.
 //
 // Every test has a caller-owned record. The Run function resets the outputs
 // of the record to NaN (a P-value adjusted for ties to -1 when there are no
@@ -114,6 +115,34 @@ struct Mood {
 };
 
 QEL_API int RunLynMood(Mood* record);
+
+// One treatment of a Friedman test. column holds the treatment's value in
+// each block (input) and is overwritten with the fitted values B[t] + e,
+// block effect plus treatment effect.
+struct FriedmanTreatment {
+  double estimatedMedian;
+  double rankSum;
+  double* column;
+};
+
+// Friedman's test of k treatments in b blocks: ranks within each block, S on
+// k - 1 degrees of freedom, S corrected for ties within blocks. The
+// treatment effects are Doksum's: e_i is the mean over j of the median
+// difference of treatments i and j across blocks.
+struct Friedman {
+  QEL_API Friedman();
+  double grandMedian;
+  double statistic;  // S
+  double degreesOfFreedom;
+  double pValue;
+  double adjustedStatistic;       // NaN without ties
+  double adjustedPValue;          // -1 without ties
+  FriedmanTreatment* treatments;  // caller-owned, treatmentCount entries
+  unsigned int blocks;
+  unsigned int treatmentCount;
+};
+
+QEL_API int RunLynFriedman(Friedman* record);
 
 }  // namespace v0
 }  // namespace qel

@@ -327,3 +327,80 @@ TEST(Mood, FlagsAndSingletonGroups) {
   EXPECT_EQ(runMood(r, one, groups), 10000);
   EXPECT_TRUE(r.flags & qel::v0::kMoodNoDegrees);
 }
+
+namespace {
+
+int runFriedman(qel::v0::Friedman& r, std::vector<std::vector<double>>& columns,
+                std::vector<qel::v0::FriedmanTreatment>& treatments) {
+  treatments.clear();
+  for (auto& c : columns) {
+    qel::v0::FriedmanTreatment t{};
+    t.column = c.data();
+    treatments.push_back(t);
+  }
+  r.treatments = treatments.data();
+  r.treatmentCount = static_cast<unsigned int>(treatments.size());
+  r.blocks = static_cast<unsigned int>(columns[0].size());
+  return qel::v0::RunLynFriedman(&r);
+}
+
+}  // namespace
+
+TEST(Friedman, MatchesR) {
+  Cases cases = loadCases();
+  int checked = 0;
+  for (auto const& [name, rows] : cases.byCase) {
+    if (!rows.count("fr")) continue;
+    std::vector<std::vector<double>> columns;
+    for (int i = 1; rows.count("fr_t" + std::to_string(i)); ++i) {
+      columns.push_back(rows.at("fr_t" + std::to_string(i)));
+    }
+    std::vector<double> const& ref = rows.at("fr");
+    qel::v0::Friedman r;
+    std::vector<qel::v0::FriedmanTreatment> treatments;
+    ASSERT_EQ(runFriedman(r, columns, treatments), 0) << name;
+    const bool ties = ref[3] != 0.0;
+    EXPECT_LT(qeltest::relativeError(ties ? r.adjustedStatistic : r.statistic, ref[0]), 1e-12)
+        << name;
+    EXPECT_EQ(r.degreesOfFreedom, ref[1]) << name;
+    EXPECT_LT(qeltest::relativeError(ties ? r.adjustedPValue : r.pValue, ref[2]), 1e-9) << name;
+    if (ties) {
+      EXPECT_GT(r.adjustedPValue, 0.0) << name;
+    } else {
+      EXPECT_TRUE(std::isnan(r.adjustedStatistic)) << name;
+      EXPECT_EQ(r.adjustedPValue, -1.0) << name;
+    }
+    double rankTotal = 0.0;
+    for (auto const& t : treatments) rankTotal += t.rankSum;
+    const double k = double(columns.size()), b = double(columns[0].size());
+    EXPECT_EQ(rankTotal, b * k * (k + 1) / 2) << name;
+    ++checked;
+  }
+  EXPECT_EQ(checked, 3);
+}
+
+// An exactly additive table x_i[t] = a_i + c_t: the effects recover a_i
+// up to a constant, the fitted values are the data themselves and the
+// estimated medians are a_i + median(c).
+TEST(Friedman, AdditiveTableIsFittedExactly) {
+  const std::vector<double> a{0.0, 1.5, -2.0, 4.0};
+  const std::vector<double> c{10.0, 12.0, 7.0, 30.0, 8.0};  // median 10
+  std::vector<std::vector<double>> columns(a.size());
+  for (std::size_t i = 0; i < a.size(); ++i) {
+    for (double block : c) columns[i].push_back(a[i] + block);
+  }
+  std::vector<std::vector<double>> original = columns;
+  qel::v0::Friedman r;
+  std::vector<qel::v0::FriedmanTreatment> treatments;
+  ASSERT_EQ(runFriedman(r, columns, treatments), 0);
+  for (std::size_t i = 0; i < a.size(); ++i) {
+    EXPECT_NEAR(treatments[i].estimatedMedian, a[i] + 10.0, 1e-12) << i;
+    for (std::size_t t = 0; t < c.size(); ++t) {
+      EXPECT_NEAR(columns[i][t], original[i][t], 1e-12) << i << " " << t;
+    }
+  }
+  // Every block ranks the treatments alike: S = b (k - 1), no ties.
+  EXPECT_DOUBLE_EQ(r.statistic, 5.0 * 3.0);
+  EXPECT_EQ(r.adjustedPValue, -1.0);
+  EXPECT_NEAR(r.grandMedian, 10.0 + (0.0 + 1.5 - 2.0 + 4.0) / 4.0, 1e-12);
+}

@@ -66,3 +66,17 @@ moodCase <- function(name, groups) {
 moodCase("three", list(rnorm(12), rnorm(17, 1), rnorm(9, 0.5)))
 moodCase("two", list(rexp(25), rexp(31, 0.5)))
 moodCase("four", list(rnorm(30), rnorm(22, 0.2), rnorm(41, -0.4), rnorm(15)))
+
+# Friedman's test: rows are blocks, columns treatments.
+#   fr_t<i> : the column of treatment i
+#   fr      : statistic (adjusted for ties when there are ties), degrees of
+#             freedom, P-value, ties(0/1)
+friedmanCase <- function(name, m) {
+  for (i in seq_len(ncol(m))) emitRow(paste0("fr_t", i), name, m[, i])
+  r <- friedman.test(m)
+  ties <- as.numeric(any(apply(m, 1, function(b) length(unique(b)) < length(b))))
+  emitRow("fr", name, c(unname(r$statistic), unname(r$parameter), r$p.value, ties))
+}
+friedmanCase("plain", matrix(rnorm(12 * 4) + rep(c(0, 0.5, 1, 0.2), each = 12), 12, 4))
+friedmanCase("ties", matrix(round(rnorm(15 * 3) + rep(c(0, 0.7, 0.3), each = 15)), 15, 3))
+friedmanCase("wide", matrix(rnorm(6 * 7), 6, 7))
