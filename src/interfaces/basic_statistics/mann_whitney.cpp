@@ -128,11 +128,11 @@ void interval(MannWhitney* record, SortedSample const& x, SortedSample const& y,
 
 // Sum of m (m^2 - 1) over the runs of tied values of both samples merged.
 double tieSum(SortedSample const& x, SortedSample const& y, double tolerance) {
-  std::vector<double> all;
-  all.reserve(static_cast<std::size_t>(x.n + y.n));
-  for (int i = 0; i < x.n; ++i) all.push_back(at(x, i));
-  for (int j = 0; j < y.n; ++j) all.push_back(at(y, j));
-  std::inplace_merge(all.begin(), all.begin() + x.n, all.end());
+  std::vector<double> first(static_cast<std::size_t>(x.n)), second(static_cast<std::size_t>(y.n));
+  for (int i = 0; i < x.n; ++i) first[i] = at(x, i);
+  for (int j = 0; j < y.n; ++j) second[j] = at(y, j);
+  std::vector<double> all(first.size() + second.size());
+  std::merge(first.begin(), first.end(), second.begin(), second.end(), all.begin());
   double sum = 0.0;
   for (std::size_t start = 0; start < all.size();) {
     std::size_t end = start + 1;
