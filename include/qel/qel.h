@@ -9,6 +9,7 @@
 #include <qel/sign_tests.h>
 #include <qel/fits.h>
 #include <qel/order_statistics.h>
+#include <qel/rank_tests.h>
 #include <qel/random.h>
 #include <qel/sampler.h>
 #include <qel/summaries.h>
