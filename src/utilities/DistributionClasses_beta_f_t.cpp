@@ -7,7 +7,7 @@
 #include "utilities/Distributions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

@@ -6,7 +6,7 @@
 #include "utilities/DistributionClasses.h"
 #include "utilities/Distributions.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

@@ -18,7 +18,7 @@
 #include "utilities/IncompleteBeta.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

@@ -15,7 +15,7 @@
 #include "utilities/ELVwrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

@@ -14,7 +14,7 @@
 #include "utilities/Distributions_discrete_rules.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 
@@ -55,10 +55,9 @@ double negBinomialMass(double k, double p, double r) {
     const double logComplement = p < 0.5 ? std::log1p(-p) : mLog(1.0 - p, true);
     // Beyond the int range (a huge or missing x) the binomial coefficient
     // is formed on doubles: converting such a count to int would trap.
-    const double logChoose =
-        m <= 2147483647.0
-            ? mLogNChooseK(static_cast<int>(m), static_cast<int>(j))
-            : mLogGamma(m + 1.0) - mLogGamma(j + 1.0) - mLogGamma(m - j + 1.0);
+    const double logChoose = m <= 2147483647.0
+                                 ? mLogNChooseK(static_cast<int>(m), static_cast<int>(j))
+                                 : mLogGamma(m + 1.0) - mLogGamma(j + 1.0) - mLogGamma(m - j + 1.0);
     value = mExponential(logChoose + j * mLog(p, true) + (m - j) * logComplement, true);
   }
   return value * p;

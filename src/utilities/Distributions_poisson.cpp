@@ -11,7 +11,7 @@
 #include "utilities/Distributions_discrete_rules.h"
 #include "utilities/ELVwrappers.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

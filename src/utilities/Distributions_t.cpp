@@ -12,7 +12,7 @@
 #include "utilities/Distributions_pvalue.h"
 #include "utilities/ELVwrappers.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

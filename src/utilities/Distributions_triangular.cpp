@@ -2,7 +2,7 @@
 #include <cmath>
 
 #include "utilities/Distributions.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

@@ -6,7 +6,7 @@
 #include <cmath>
 
 #include "utilities/IncompleteBeta.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

@@ -4,7 +4,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 
@@ -12,7 +12,9 @@ namespace {
 
 constexpr int kLargestChunk = 308;
 
-double roundHalfAwayFromZero(double y) { return y >= 0.0 ? std::floor(y + 0.5) : std::ceil(y - 0.5); }
+double roundHalfAwayFromZero(double y) {
+  return y >= 0.0 ? std::floor(y + 0.5) : std::ceil(y - 0.5);
+}
 
 }  // namespace
 

@@ -14,7 +14,7 @@
 #include <cmath>
 
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

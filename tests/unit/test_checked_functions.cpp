@@ -7,7 +7,7 @@
 #include <string>
 
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace {
 

@@ -9,7 +9,7 @@
 #include "fpu_state.h"
 #include "interfaces/math/random_distributions_v0.h"
 #include "interfaces/math/random_distributions_v1.h"
-#include "interfaces/math/special_functions_v1.h"
+#include "interfaces/math/transcendental_v1.h"
 #include "reference_data.h"
 
 namespace {

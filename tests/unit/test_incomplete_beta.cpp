@@ -10,7 +10,7 @@
 #include "reference_data.h"
 #include "utilities/IncompleteBeta.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace {
 

@@ -11,7 +11,7 @@
 
 #include "reference_data.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace {
 

@@ -4,7 +4,7 @@
 #include <cmath>
 #include <limits>
 
-#include "interfaces/math/special_functions_v1.h"
+#include "interfaces/math/transcendental_v1.h"
 #include "utilities/ELVwrappers.h"
 #include "utilities/IncompleteBeta.h"
 #include "utilities/LYNBasicTypes.h"

@@ -4,7 +4,7 @@
 #include <cmath>
 #include <limits>
 
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

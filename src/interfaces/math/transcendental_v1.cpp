@@ -1,11 +1,11 @@
-#include "interfaces/math/special_functions_v1.h"
+#include "interfaces/math/transcendental_v1.h"
 
 #include <algorithm>
 #include <cmath>
 #include <limits>
 
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 namespace v1 {

@@ -13,7 +13,7 @@
 
 #include "reference_data.h"
 #include "utilities/IncompleteBeta.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace {
 
@@ -58,8 +58,8 @@ const std::map<std::string, Unary>& unaryFunctions() {
   return table;
 }
 
-TEST(SpecialFunctions, HelpersMatchHighPrecisionValues) {
-  const auto rows = qeltest::loadReferenceData("special_unary.csv", 1);
+TEST(Transcendental, HelpersMatchHighPrecisionValues) {
+  const auto rows = qeltest::loadReferenceData("transcendental_unary.csv", 1);
   std::map<std::string, double> worst;
   std::map<std::string, int> count;
   for (const auto& row : rows) {
@@ -93,7 +93,7 @@ TEST(SpecialFunctions, HelpersMatchHighPrecisionValues) {
   }
 }
 
-TEST(SpecialFunctions, PolygammaOrdersZeroToFiveAndHigh) {
+TEST(Transcendental, PolygammaOrdersZeroToFiveAndHigh) {
   const auto rows = qeltest::loadReferenceData("polygamma.csv", 0);
   std::map<int, double> worst;
   std::vector<double> out;
@@ -127,7 +127,7 @@ TEST(SpecialFunctions, PolygammaOrdersZeroToFiveAndHigh) {
   for (const auto& [n, error] : worst) std::printf("  order %3d: max error %.2e\n", n, error);
 }
 
-TEST(SpecialFunctions, DigammaAndScaledForm) {
+TEST(Transcendental, DigammaAndScaledForm) {
   // psi(1) = -Euler's constant, psi(1/2) = -gamma - 2 ln 2.
   const double euler = 0.57721566490153286061;
   EXPECT_NEAR(qel::mPsi(1.0), -euler, 1e-15);
@@ -152,7 +152,7 @@ TEST(SpecialFunctions, DigammaAndScaledForm) {
   EXPECT_EQ(qel::psi(1e10), std::log(1e10));
 }
 
-TEST(SpecialFunctions, PolygammaErrorCodes) {
+TEST(Transcendental, PolygammaErrorCodes) {
   double ans[4] = {7, 7, 7, 7};
   int nz = -1, ierr = -1;
   qel::XDPSIFN(-1.0, 0, 1, 1, ans, &nz, &ierr);
@@ -185,7 +185,7 @@ TEST(SpecialFunctions, PolygammaErrorCodes) {
   EXPECT_EQ(out.size(), 3u);
 }
 
-TEST(SpecialFunctions, LogGammaExactValuesAndFailures) {
+TEST(Transcendental, LogGammaExactValuesAndFailures) {
   EXPECT_EQ(qel::mLogGamma(1.0), 0.0);
   EXPECT_EQ(qel::mLogGamma(2.0), 0.0);
   EXPECT_EQ(qel::XGAMMLN(1.0), 0.0);
@@ -206,7 +206,7 @@ TEST(SpecialFunctions, LogGammaExactValuesAndFailures) {
   }
 }
 
-TEST(SpecialFunctions, ErrorFunctionLimits) {
+TEST(Transcendental, ErrorFunctionLimits) {
   EXPECT_EQ(qel::erf(5.8), 1.0);
   EXPECT_EQ(qel::erf(-7.0), -1.0);
   EXPECT_EQ(qel::erfc1(0, -5.6), 2.0);
@@ -217,7 +217,7 @@ TEST(SpecialFunctions, ErrorFunctionLimits) {
   EXPECT_EQ(messageOf<std::runtime_error>([] { qel::erfc1(1, -30.0); }), "float overflow");
 }
 
-TEST(SpecialFunctions, MachineConstants) {
+TEST(Transcendental, MachineConstants) {
   const int table[10] = {2, 31, 2147483647, 2, 24, -125, 128, 53, -1021, 1024};
   for (int i = 1; i <= 10; ++i) EXPECT_EQ(qel::ipmpar(i), table[i - 1]) << i;
   EXPECT_EQ(qel::spmpar(1), DBL_EPSILON);

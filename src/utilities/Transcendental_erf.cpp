@@ -3,7 +3,7 @@
 // |x| > 4, coefficients as published (stored highest power first).
 #include <cmath>
 
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 

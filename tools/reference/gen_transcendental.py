@@ -4,7 +4,7 @@ function, digamma and polygamma, the incomplete gamma ratio, the incomplete
 beta ratio and the derivatives of the incomplete gamma integral.
 
 Writes, under tests/data/:
-  special_unary.csv      function,x,y,expected      (y = 0 for one-argument functions)
+  transcendental_unary.csv      function,x,y,expected      (y = 0 for one-argument functions)
   polygamma.csv          x,order,expected           (-1)^(k+1) psi^(k-1)(x)/(k-1)!, k = order+1
   incomplete_gamma.csv   region,a,x,P,Q,cond  (cond: relative condition number of P in x)
   incomplete_beta.csv    branch,a,b,x,y,I,Ic,cond,condc (y = 1 - x exactly, or 1 for tiny x;
@@ -348,7 +348,7 @@ def digami_rows():
 
 
 def main():
-    write_rows(os.path.join(DATA, "special_unary.csv"), "function,x,y,expected", unary_rows())
+    write_rows(os.path.join(DATA, "transcendental_unary.csv"), "function,x,y,expected", unary_rows())
     write_rows(os.path.join(DATA, "polygamma.csv"), "x,order,expected", polygamma_rows())
     write_rows(os.path.join(DATA, "incomplete_gamma.csv"), "region,a,x,P,Q,cond", gamma_rows())
     write_rows(os.path.join(DATA, "incomplete_beta.csv"), "branch,a,b,x,y,I,Ic,cond,condc", beta_rows())

@@ -9,7 +9,7 @@
 #include <vector>
 
 #include "utilities/IncompleteBeta.h"
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace {
 

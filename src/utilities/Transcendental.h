@@ -2,8 +2,8 @@
 // wherever a bad argument is possible: an argument that would overflow or is
 // outside the domain becomes a standard exception (or a stated substitute when
 // throwOnError is false), even in a thread that is not armed.
-#ifndef QEL_SRC_UTILITIES_SPECIALFUNCTIONS_H
-#define QEL_SRC_UTILITIES_SPECIALFUNCTIONS_H
+#ifndef QEL_SRC_UTILITIES_TRANSCENDENTAL_H
+#define QEL_SRC_UTILITIES_TRANSCENDENTAL_H
 
 #include <vector>
 

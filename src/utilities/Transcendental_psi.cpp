@@ -9,7 +9,7 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/SpecialFunctions.h"
+#include "utilities/Transcendental.h"
 
 namespace qel {
 
