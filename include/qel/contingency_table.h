@@ -33,30 +33,30 @@ namespace qel {
 
 // Bits of the request mask, and the size of each result buffer.
 enum EContingencyResult : unsigned {
-  kTableExpectedCounts = 0x1,             // columns of R values
-  kTableRawResiduals = 0x2,               // columns, o - e
-  kTableStandardizedResiduals = 0x4,      // columns, (o - e) / sqrt(e)
-  kTableAdjustedResiduals = 0x8,          // columns
-  kTableChisquareContributions = 0x10,    // columns, (o - e)^2 / e
-  kTableColumnPercentages = 0x20,         // columns, of the column total
-  kTableRowPercentages = 0x40,            // columns, of the row total
-  kTablePercentages = 0x80,               // columns, of the grand total
-  kTableColumnTotals = 0x100,             // C values
-  kTableRowTotals = 0x200,                // R values
-  kTableColumnTotalPercentages = 0x400,   // C values
-  kTableRowTotalPercentages = 0x800,      // R values
-  kTableGrandTotal = 0x1000,              // 1 value
-  kTablePearsonChisquare = 0x2000,        // statistic, df, P-value
-  kTableLikelihoodRatio = 0x4000,         // statistic, df, P-value
-  kTableFisherExact = 0x8000,             // two-sided P-value (2 x 2 only)
-  kTableMcNemar = 0x10000,                // estimate, lower, upper, P-value
-  kTableCramerVSquare = 0x20000,          // 1 value
-  kTableKappa = 0x40000,                  // 1 value
-  kTablePearsonR = 0x80000,               // 1 value
-  kTableSpearmanRho = 0x100000,           // 1 value
-  kTableGoodmanKruskal = 0x200000,        // 4 values (see SetupGoodmanKruskal)
-  kTableMeasuresOfConcordance = 0x400000, // 9 values (see SetupMeasuresOfConcordance)
-  kTableMHCTest = 0x800000,               // 4 values (see SetupMHCTest)
+  kTableExpectedCounts = 0x1,              // columns of R values
+  kTableRawResiduals = 0x2,                // columns, o - e
+  kTableStandardizedResiduals = 0x4,       // columns, (o - e) / sqrt(e)
+  kTableAdjustedResiduals = 0x8,           // columns
+  kTableChisquareContributions = 0x10,     // columns, (o - e)^2 / e
+  kTableColumnPercentages = 0x20,          // columns, of the column total
+  kTableRowPercentages = 0x40,             // columns, of the row total
+  kTablePercentages = 0x80,                // columns, of the grand total
+  kTableColumnTotals = 0x100,              // C values
+  kTableRowTotals = 0x200,                 // R values
+  kTableColumnTotalPercentages = 0x400,    // C values
+  kTableRowTotalPercentages = 0x800,       // R values
+  kTableGrandTotal = 0x1000,               // 1 value
+  kTablePearsonChisquare = 0x2000,         // statistic, df, P-value
+  kTableLikelihoodRatio = 0x4000,          // statistic, df, P-value
+  kTableFisherExact = 0x8000,              // two-sided P-value (2 x 2 only)
+  kTableMcNemar = 0x10000,                 // estimate, lower, upper, P-value
+  kTableCramerVSquare = 0x20000,           // 1 value
+  kTableKappa = 0x40000,                   // 1 value
+  kTablePearsonR = 0x80000,                // 1 value
+  kTableSpearmanRho = 0x100000,            // 1 value
+  kTableGoodmanKruskal = 0x200000,         // 4 values (see SetupGoodmanKruskal)
+  kTableMeasuresOfConcordance = 0x400000,  // 9 values (see SetupMeasuresOfConcordance)
+  kTableMHCTest = 0x800000,                // 4 values (see SetupMHCTest)
 };
 
 class IContingencyTable {

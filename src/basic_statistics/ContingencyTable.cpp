@@ -167,27 +167,53 @@ void ContingencyTable::SetupRowPercentages(double* column, unsigned c) {
 void ContingencyTable::SetupPercentages(double* column, unsigned c) {
   storeColumn(mPercentages, column, c);
 }
-void ContingencyTable::SetupColumnTotals(double* result) { mColumnTotals = result; }
-void ContingencyTable::SetupRowTotals(double* result) { mRowTotals = result; }
+void ContingencyTable::SetupColumnTotals(double* result) {
+  mColumnTotals = result;
+}
+void ContingencyTable::SetupRowTotals(double* result) {
+  mRowTotals = result;
+}
 void ContingencyTable::SetupColumnTotalPercentages(double* result) {
   mColumnTotalPercentages = result;
 }
-void ContingencyTable::SetupRowTotalPercentages(double* result) { mRowTotalPercentages = result; }
-void ContingencyTable::SetupGrandTotal(double* result) { mGrandTotal = result; }
-void ContingencyTable::SetupPearsonChisquareTest(double* result) { mPearson = result; }
-void ContingencyTable::SetupLikelihoodRatioTest(double* result) { mLikelihoodRatio = result; }
-void ContingencyTable::SetupFisherExactTest(double* result) { mFisher = result; }
-void ContingencyTable::SetupMcNemarTest(double* result) { mMcNemar = result; }
-void ContingencyTable::SetupCramerVSquare(double* result) { mCramer = result; }
+void ContingencyTable::SetupRowTotalPercentages(double* result) {
+  mRowTotalPercentages = result;
+}
+void ContingencyTable::SetupGrandTotal(double* result) {
+  mGrandTotal = result;
+}
+void ContingencyTable::SetupPearsonChisquareTest(double* result) {
+  mPearson = result;
+}
+void ContingencyTable::SetupLikelihoodRatioTest(double* result) {
+  mLikelihoodRatio = result;
+}
+void ContingencyTable::SetupFisherExactTest(double* result) {
+  mFisher = result;
+}
+void ContingencyTable::SetupMcNemarTest(double* result) {
+  mMcNemar = result;
+}
+void ContingencyTable::SetupCramerVSquare(double* result) {
+  mCramer = result;
+}
 void ContingencyTable::SetupKappa(double const* levelMarks, double* result, unsigned markCount) {
   mKappaMarks = levelMarks;
   mKappa = result;
   mKappaMarkCount = markCount;
 }
-void ContingencyTable::SetupPearsonR(double* result) { mPearsonR = result; }
-void ContingencyTable::SetupSpearmanRho(double* result) { mSpearman = result; }
-void ContingencyTable::SetupGoodmanKruskal(double* result) { mGoodmanKruskal = result; }
-void ContingencyTable::SetupMeasuresOfConcordance(double* result) { mConcordance = result; }
+void ContingencyTable::SetupPearsonR(double* result) {
+  mPearsonR = result;
+}
+void ContingencyTable::SetupSpearmanRho(double* result) {
+  mSpearman = result;
+}
+void ContingencyTable::SetupGoodmanKruskal(double* result) {
+  mGoodmanKruskal = result;
+}
+void ContingencyTable::SetupMeasuresOfConcordance(double* result) {
+  mConcordance = result;
+}
 
 // The buffer of the stratified test is zeroed once, for the first stratum;
 // later calls leave it alone so that the strata add up in it.
@@ -285,24 +311,47 @@ int ContingencyTable::analyzeTable() {
 
   failures += runSections(13, [&](int section) {
     switch (section) {
-      case 0: GetRawResiduals(o.data(), ex, mRawResiduals, C, R, mask); break;
-      case 1: GetStandardizedResiduals(o.data(), ex, mStandardized, C, R, mask); break;
-      case 2: GetAdjustedResiduals(o.data(), ex, mAdjusted, T, U, N, C, R, mask); break;
-      case 3: GetChisquareContributions(o.data(), ex, mContributions, C, R, mask); break;
-      case 4: GetPearsonChisquareTest(o.data(), ex, mPearson, T, C, R, Cp, Rp, mask); break;
-      case 5: GetLikelihoodRatioTest(o.data(), ex, mLikelihoodRatio, T, C, R, Cp, Rp, mask); break;
-      case 6: GetCramerVSquared(o.data(), ex, T, mCramer, N, C, R, Cp, Rp, mask); break;
+      case 0:
+        GetRawResiduals(o.data(), ex, mRawResiduals, C, R, mask);
+        break;
+      case 1:
+        GetStandardizedResiduals(o.data(), ex, mStandardized, C, R, mask);
+        break;
+      case 2:
+        GetAdjustedResiduals(o.data(), ex, mAdjusted, T, U, N, C, R, mask);
+        break;
+      case 3:
+        GetChisquareContributions(o.data(), ex, mContributions, C, R, mask);
+        break;
+      case 4:
+        GetPearsonChisquareTest(o.data(), ex, mPearson, T, C, R, Cp, Rp, mask);
+        break;
+      case 5:
+        GetLikelihoodRatioTest(o.data(), ex, mLikelihoodRatio, T, C, R, Cp, Rp, mask);
+        break;
+      case 6:
+        GetCramerVSquared(o.data(), ex, T, mCramer, N, C, R, Cp, Rp, mask);
+        break;
       case 7:
         GetCohenKappa(o.data(), T, U, mKappaMarks, mKappa, N, C, R, mKappaMarkCount, mask);
         break;
-      case 8: GetPearsonR(o.data(), mPearsonR, N, C, R, mask); break;
-      case 9: GetSpearmanRho(o.data(), T, U, mSpearman, N, C, R, mask); break;
-      case 10: GetGoodmanKruskalPRE(o.data(), T, U, mGoodmanKruskal, N, C, R, mask); break;
-      case 11: GetConcordanceMeasures(o.data(), T, U, mConcordance, N, C, R, mask); break;
+      case 8:
+        GetPearsonR(o.data(), mPearsonR, N, C, R, mask);
+        break;
+      case 9:
+        GetSpearmanRho(o.data(), T, U, mSpearman, N, C, R, mask);
+        break;
+      case 10:
+        GetGoodmanKruskalPRE(o.data(), T, U, mGoodmanKruskal, N, C, R, mask);
+        break;
+      case 11:
+        GetConcordanceMeasures(o.data(), T, U, mConcordance, N, C, R, mask);
+        break;
       case 12:
         GetMHCTest(o.data(), T, U, mMHC, &mFirstStratum, &mInvalidStratum, N, C, R, Cp, Rp, mask);
         break;
-      default: break;
+      default:
+        break;
     }
   });
 

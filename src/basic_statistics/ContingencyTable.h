@@ -16,8 +16,8 @@ using TableOutput = double* const*;
 
 // Cell results (no guard: a zero total or a NaN expected count goes through
 // as IEEE arithmetic gives it).
-void GetColumnPercentages(TableColumns o, TableOutput out, double const* T, unsigned C,
-                          unsigned R, unsigned mask);
+void GetColumnPercentages(TableColumns o, TableOutput out, double const* T, unsigned C, unsigned R,
+                          unsigned mask);
 void GetRowPercentages(TableColumns o, TableOutput out, double const* U, unsigned C, unsigned R,
                        unsigned mask);
 void GetPercentages(TableColumns o, TableOutput out, double N, unsigned C, unsigned R,
@@ -62,8 +62,8 @@ void GetSpearmanRho(TableColumns o, double const* T, double const* U, double* ou
 void GetGoodmanKruskalPRE(TableColumns o, double const* T, double const* U, double* out, double N,
                           unsigned C, unsigned R, unsigned mask);
 // Slot 8 holds the z statistic; Analyze turns it into its P-value.
-void GetConcordanceMeasures(TableColumns o, double const* T, double const* U, double* out,
-                            double N, unsigned C, unsigned R, unsigned mask);
+void GetConcordanceMeasures(TableColumns o, double const* T, double const* U, double* out, double N,
+                            unsigned C, unsigned R, unsigned mask);
 
 class ContingencyTable : public IContingencyTable {
  public:

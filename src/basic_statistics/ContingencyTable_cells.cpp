@@ -28,8 +28,8 @@ bool wanted(unsigned mask, unsigned bit, void const* out) {
 
 }  // namespace
 
-void GetColumnPercentages(TableColumns o, TableOutput out, double const* T, unsigned C,
-                          unsigned R, unsigned mask) {
+void GetColumnPercentages(TableColumns o, TableOutput out, double const* T, unsigned C, unsigned R,
+                          unsigned mask) {
   if (!wanted(mask, kTableColumnPercentages, out)) return;
   forEachCell(out, C, R, [&](unsigned c, unsigned r) { return o[c][r] * (100.0 / T[c]); });
 }
@@ -47,8 +47,7 @@ void GetPercentages(TableColumns o, TableOutput out, double N, unsigned C, unsig
   forEachCell(out, C, R, [&](unsigned c, unsigned r) { return o[c][r] * scale; });
 }
 
-void GetColumnTotalPercentages(double const* T, double* out, double N, unsigned C,
-                               unsigned mask) {
+void GetColumnTotalPercentages(double const* T, double* out, double N, unsigned C, unsigned mask) {
   if (!wanted(mask, kTableColumnTotalPercentages, out)) return;
   const double scale = 100.0 / N;
   for (unsigned c = 0; c < C; ++c) out[c] = T[c] * scale;

@@ -132,9 +132,8 @@ void GetFisherExactTest(TableColumns o, double const* T, double const* U, double
 // c = (0, 1): the difference of the marginal proportions with a 95% Wald
 // interval widened by the continuity term 1/N, and the exact binomial
 // P-value of the smaller discordant count among b + c.
-void GetMcNemarTest(TableColumns o, double const* /*T*/, double const* /*U*/, double* out,
-                    double N, unsigned C, unsigned R, unsigned /*Cp*/, unsigned /*Rp*/,
-                    unsigned mask) {
+void GetMcNemarTest(TableColumns o, double const* /*T*/, double const* /*U*/, double* out, double N,
+                    unsigned C, unsigned R, unsigned /*Cp*/, unsigned /*Rp*/, unsigned mask) {
   if (!wanted(mask, kTableMcNemar, out)) return;
   if (C != 2 || R != 2) {
     out[0] = out[1] = out[2] = kNaN;

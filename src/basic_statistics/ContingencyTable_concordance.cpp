@@ -63,8 +63,8 @@ void marginSums(double const* totals, unsigned n, double* tiedPairs, double* cub
 
 }  // namespace
 
-void GetConcordanceMeasures(TableColumns o, double const* T, double const* U, double* out,
-                            double N, unsigned C, unsigned R, unsigned mask) {
+void GetConcordanceMeasures(TableColumns o, double const* T, double const* U, double* out, double N,
+                            unsigned C, unsigned R, unsigned mask) {
   if ((mask & kTableMeasuresOfConcordance) == 0 || out == nullptr) return;
   const PairCounts counts = countPairs(o, C, R);
   const double P = counts.concordant, Q = counts.discordant;

@@ -21,8 +21,8 @@ struct TableHost {
   // the order of the mask bits 0x1 to 0x80.
   std::vector<double> cells[8];
   std::vector<double> columnTotals, rowTotals, columnTotalPercentages, rowTotalPercentages;
-  double grandTotal[1], pearson[3], likelihoodRatio[3], fisher[1], mcNemar[4], cramer[1],
-      kappa[1], pearsonR[1], spearman[1], goodmanKruskal[4], concordance[9], mhc[4];
+  double grandTotal[1], pearson[3], likelihoodRatio[3], fisher[1], mcNemar[4], cramer[1], kappa[1],
+      pearsonR[1], spearman[1], goodmanKruskal[4], concordance[9], mhc[4];
   std::vector<double> marks;
   int code = -1;
 

@@ -9,17 +9,26 @@
 #include <qel/location_tests.h>
 #include <qel/order_statistics.h>
 
+#include <qel/contingency_table.h>
+
+#include <atomic>
 #include <cmath>
 #include <cstdlib>
 #include <new>
 
 namespace {
 bool failNextAllocation = false;
+// When not negative: the number of allocations to grant before one fails
+// (on any thread).
+std::atomic<int> failAllocationAfter{-1};
 }  // namespace
 
 void* operator new(std::size_t size) {
   if (failNextAllocation) {
     failNextAllocation = false;
+    throw std::bad_alloc();
+  }
+  if (failAllocationAfter.load(std::memory_order_relaxed) >= 0 && failAllocationAfter-- == 0) {
     throw std::bad_alloc();
   }
   if (void* p = std::malloc(size ? size : 1)) return p;
@@ -189,6 +198,59 @@ TEST(AllocationFailure, SummariesReportOutOfMemory) {
   // With memory again the helper succeeds.
   EXPECT_EQ(qel::v1::RunLynBoxplotHelper(&box, 0.9, x, 5), qel::qelOk);
   EXPECT_EQ(box.median, 3.0);
+}
+
+}  // namespace
+
+namespace {
+
+// Every allocation of MakeIContingencyTable in turn fails: a null table and
+// 30001, never a half-made object. Then every allocation of Analyze: 30001,
+// kept by the object for later passes.
+TEST(AllocationFailure, ContingencyTableReportsOutOfMemory) {
+  int failures = 0;
+  for (int k = 0; k < 50; ++k) {
+    int code = -1;
+    failAllocationAfter = k;
+    qel::IContingencyTable* t = qel::MakeIContingencyTable(3, 3, 0xFFFFFF, &code);
+    failAllocationAfter = -1;
+    if (t != nullptr) {
+      EXPECT_EQ(code, 0);
+      qel::DeleteIContingencyTable(&t);
+      break;
+    }
+    EXPECT_EQ(code, qel::qelFailOutOfMemory);
+    ++failures;
+  }
+  EXPECT_GE(failures, 3);  // the object, the observed array, a result array
+
+  double counts[9] = {4, 2, 1, 3, 5, 2, 1, 2, 6};
+  double pearson[3], concordance[9], goodmanKruskal[4], spearman;
+  failures = 0;
+  for (int k = 0; k < 50; ++k) {
+    int code = -1;
+    qel::IContingencyTable* t = qel::MakeIContingencyTable(3, 3, 0xFFFFFF & ~0x1u, &code);
+    ASSERT_NE(t, nullptr);
+    for (unsigned c = 0; c < 3; ++c) t->SetupObservedCounts(counts + 3 * c, c);
+    t->SetupPearsonChisquareTest(pearson);
+    t->SetupMeasuresOfConcordance(concordance);
+    t->SetupGoodmanKruskal(goodmanKruskal);
+    t->SetupSpearmanRho(&spearman);
+    failAllocationAfter = k;
+    code = t->Analyze();
+    failAllocationAfter = -1;
+    if (code == qel::qelOk) {
+      EXPECT_EQ(pearson[1], 4.0);
+      qel::DeleteIContingencyTable(&t);
+      break;
+    }
+    EXPECT_EQ(code, qel::qelFailOutOfMemory);
+    EXPECT_EQ(t->Analyze(), qel::qelFailOutOfMemory);  // the code is kept
+    qel::DeleteIContingencyTable(&t);
+    ++failures;
+  }
+  // Temporary totals, expected counts and the scratch of three sections.
+  EXPECT_GE(failures, 4);
 }
 
 }  // namespace
