@@ -13,6 +13,7 @@
 #include "pvalue_mode.h"
 #include "sample_mode.h"
 #include "summary_mode.h"
+#include "table_mode.h"
 #include "ttest_mode.h"
 
 namespace {
@@ -27,6 +28,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printTestUsage(out);
   qelcalc::printFitUsage(out);
   qelcalc::printSummaryUsage(out);
+  qelcalc::printTableUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -53,6 +55,7 @@ int main(int argc, char** argv) {
     if (mode == "fit") return qelcalc::runFitMode(argc, argv, std::cout);
     if (mode == "summary") return qelcalc::runSummaryMode(argc, argv, std::cout);
     if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
+    if (mode == "table") return qelcalc::runTableMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";
