@@ -17,7 +17,11 @@
 // Marks in the results: NaN where a statistic does not exist (an empty
 // margin, N at most 1 for the correlations); -2.0 in the P-value slot of the
 // Fisher, McNemar and Mantel-Haenszel-Cochran results when the table is not
-// 2 x 2. A column never lent counts as a column of zeros. A Setup call for a
+// 2 x 2. Rows and columns with a total of 0 or less count as empty, and a
+// table whose grand total is not finite (a NaN or infinite count) as having
+// no non-empty row or column. Counts are not checked otherwise: a negative
+// count goes through the formulas, except that the exact tests give NaN.
+// A column never lent counts as a column of zeros. A Setup call for a
 // result outside the mask, or for a column index not below `columns`, is
 // ignored; a null buffer for a requested result is skipped.
 //

@@ -14,6 +14,11 @@ namespace qel {
 using TableColumns = double const* const*;
 using TableOutput = double* const*;
 
+// The test each function begins with: its bit is set and it has a buffer.
+inline bool isRequested(unsigned mask, unsigned bit, void const* out) {
+  return (mask & bit) != 0 && out != nullptr;
+}
+
 // Cell results (no guard: a zero total or a NaN expected count goes through
 // as IEEE arithmetic gives it).
 void GetColumnPercentages(TableColumns o, TableOutput out, double const* T, unsigned C, unsigned R,

@@ -15,10 +15,6 @@ namespace {
 
 constexpr double kNaN = std::numeric_limits<double>::quiet_NaN();
 
-bool wanted(unsigned mask, unsigned bit, void const* out) {
-  return (mask & bit) != 0 && out != nullptr;
-}
-
 // Weighted means, sums of squares and cross-product in one pass (West,
 // CACM 22 (1979) 532), every accumulator compensated. A point of weight w
 // moves each mean by the fraction f = w / W' of its distance, W' being the
@@ -73,7 +69,7 @@ double largestOf(double const* x, unsigned n) {
 void GetCohenKappa(TableColumns o, double const* T, double const* U, double const* marks,
                    double* out, double N, unsigned C, unsigned R, unsigned markCount,
                    unsigned mask) {
-  if (!wanted(mask, kTableKappa, out)) return;
+  if (!isRequested(mask, kTableKappa, out)) return;
   if (marks == nullptr && markCount != 0) {
     *out = kNaN;
     return;
@@ -100,7 +96,7 @@ void GetCohenKappa(TableColumns o, double const* T, double const* U, double cons
 // Scores are the 0-based level indices, so the levels count as equally
 // spaced; only cells with a positive count enter.
 void GetPearsonR(TableColumns o, double* out, double N, unsigned C, unsigned R, unsigned mask) {
-  if (!wanted(mask, kTablePearsonR, out)) return;
+  if (!isRequested(mask, kTablePearsonR, out)) return;
   if (!(N > 1.0)) {
     *out = kNaN;
     return;
@@ -118,7 +114,7 @@ void GetPearsonR(TableColumns o, double* out, double N, unsigned C, unsigned R, 
 // the table counts, with ties at the levels.
 void GetSpearmanRho(TableColumns o, double const* T, double const* U, double* out, double N,
                     unsigned C, unsigned R, unsigned mask) {
-  if (!wanted(mask, kTableSpearmanRho, out)) return;
+  if (!isRequested(mask, kTableSpearmanRho, out)) return;
   if (!(N > 1.0)) {
     *out = kNaN;
     return;
@@ -137,7 +133,7 @@ void GetSpearmanRho(TableColumns o, double const* T, double const* U, double* ou
 // same for guessing in proportion to the margins.
 void GetGoodmanKruskalPRE(TableColumns o, double const* T, double const* U, double* out, double N,
                           unsigned C, unsigned R, unsigned mask) {
-  if (!wanted(mask, kTableGoodmanKruskal, out)) return;
+  if (!isRequested(mask, kTableGoodmanKruskal, out)) return;
   std::vector<double> rowLargest(R, -std::numeric_limits<double>::infinity());
   std::vector<double> rowSquares(R, 0.0);
   double A = 0.0, P = 0.0, ST = 0.0;

@@ -22,52 +22,48 @@ void forEachCell(TableOutput out, unsigned C, unsigned R, Cell cell) {
   }
 }
 
-bool wanted(unsigned mask, unsigned bit, void const* out) {
-  return (mask & bit) != 0 && out != nullptr;
-}
-
 }  // namespace
 
 void GetColumnPercentages(TableColumns o, TableOutput out, double const* T, unsigned C, unsigned R,
                           unsigned mask) {
-  if (!wanted(mask, kTableColumnPercentages, out)) return;
+  if (!isRequested(mask, kTableColumnPercentages, out)) return;
   forEachCell(out, C, R, [&](unsigned c, unsigned r) { return o[c][r] * (100.0 / T[c]); });
 }
 
 void GetRowPercentages(TableColumns o, TableOutput out, double const* U, unsigned C, unsigned R,
                        unsigned mask) {
-  if (!wanted(mask, kTableRowPercentages, out)) return;
+  if (!isRequested(mask, kTableRowPercentages, out)) return;
   forEachCell(out, C, R, [&](unsigned c, unsigned r) { return (100.0 / U[r]) * o[c][r]; });
 }
 
 void GetPercentages(TableColumns o, TableOutput out, double N, unsigned C, unsigned R,
                     unsigned mask) {
-  if (!wanted(mask, kTablePercentages, out)) return;
+  if (!isRequested(mask, kTablePercentages, out)) return;
   const double scale = 100.0 / N;
   forEachCell(out, C, R, [&](unsigned c, unsigned r) { return o[c][r] * scale; });
 }
 
 void GetColumnTotalPercentages(double const* T, double* out, double N, unsigned C, unsigned mask) {
-  if (!wanted(mask, kTableColumnTotalPercentages, out)) return;
+  if (!isRequested(mask, kTableColumnTotalPercentages, out)) return;
   const double scale = 100.0 / N;
   for (unsigned c = 0; c < C; ++c) out[c] = T[c] * scale;
 }
 
 void GetRowTotalPercentages(double const* U, double* out, double N, unsigned R, unsigned mask) {
-  if (!wanted(mask, kTableRowTotalPercentages, out)) return;
+  if (!isRequested(mask, kTableRowTotalPercentages, out)) return;
   const double scale = 100.0 / N;
   for (unsigned r = 0; r < R; ++r) out[r] = U[r] * scale;
 }
 
 void GetRawResiduals(TableColumns o, TableColumns e, TableOutput out, unsigned C, unsigned R,
                      unsigned mask) {
-  if (!wanted(mask, kTableRawResiduals, out)) return;
+  if (!isRequested(mask, kTableRawResiduals, out)) return;
   forEachCell(out, C, R, [&](unsigned c, unsigned r) { return o[c][r] - e[c][r]; });
 }
 
 void GetStandardizedResiduals(TableColumns o, TableColumns e, TableOutput out, unsigned C,
                               unsigned R, unsigned mask) {
-  if (!wanted(mask, kTableStandardizedResiduals, out)) return;
+  if (!isRequested(mask, kTableStandardizedResiduals, out)) return;
   forEachCell(out, C, R,
               [&](unsigned c, unsigned r) { return (o[c][r] - e[c][r]) / std::sqrt(e[c][r]); });
 }
@@ -76,7 +72,7 @@ void GetStandardizedResiduals(TableColumns o, TableColumns e, TableOutput out, u
 // error under independence, sqrt(e (1 - T/N) (1 - U/N)).
 void GetAdjustedResiduals(TableColumns o, TableColumns e, TableOutput out, double const* T,
                           double const* U, double N, unsigned C, unsigned R, unsigned mask) {
-  if (!wanted(mask, kTableAdjustedResiduals, out)) return;
+  if (!isRequested(mask, kTableAdjustedResiduals, out)) return;
   forEachCell(out, C, R, [&](unsigned c, unsigned r) {
     const double variance = (1.0 - T[c] / N) * e[c][r] * (1.0 - U[r] / N);
     return (o[c][r] - e[c][r]) / std::sqrt(variance);
@@ -85,7 +81,7 @@ void GetAdjustedResiduals(TableColumns o, TableColumns e, TableOutput out, doubl
 
 void GetChisquareContributions(TableColumns o, TableColumns e, TableOutput out, unsigned C,
                                unsigned R, unsigned mask) {
-  if (!wanted(mask, kTableChisquareContributions, out)) return;
+  if (!isRequested(mask, kTableChisquareContributions, out)) return;
   forEachCell(out, C, R, [&](unsigned c, unsigned r) {
     const double d = o[c][r] - e[c][r];
     return d * (d / e[c][r]);

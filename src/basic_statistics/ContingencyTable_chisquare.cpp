@@ -24,10 +24,6 @@ constexpr double kNaN = std::numeric_limits<double>::quiet_NaN();
 // shape.
 constexpr double kNotTwoByTwo = -2.0;
 
-bool wanted(unsigned mask, unsigned bit, void const* out) {
-  return (mask & bit) != 0 && out != nullptr;
-}
-
 // Sum of (o - e)^2 / e over the cells of non-empty columns with a positive
 // expected count, compensated (Kahan).
 double pearsonSum(TableColumns o, TableColumns e, double const* T, unsigned C, unsigned R) {
@@ -63,7 +59,7 @@ bool truncatedCount(double x, unsigned* n) {
 // its kernel does not catch leaves NaN, not an armed thread.
 void GetPearsonChisquareTest(TableColumns o, TableColumns e, double* out, double const* T,
                              unsigned C, unsigned R, unsigned Cp, unsigned Rp, unsigned mask) {
-  if (!wanted(mask, kTablePearsonChisquare, out)) return;
+  if (!isRequested(mask, kTablePearsonChisquare, out)) return;
   if (Cp == 0 || Rp == 0) {
     out[0] = out[1] = out[2] = kNaN;
     return;
@@ -80,7 +76,7 @@ void GetPearsonChisquareTest(TableColumns o, TableColumns e, double* out, double
 
 void GetLikelihoodRatioTest(TableColumns o, TableColumns e, double* out, double const* T,
                             unsigned C, unsigned R, unsigned Cp, unsigned Rp, unsigned mask) {
-  if (!wanted(mask, kTableLikelihoodRatio, out)) return;
+  if (!isRequested(mask, kTableLikelihoodRatio, out)) return;
   if (Cp == 0 || Rp == 0) {
     out[0] = out[1] = out[2] = kNaN;
     return;
@@ -100,7 +96,7 @@ void GetLikelihoodRatioTest(TableColumns o, TableColumns e, double* out, double 
 
 void GetCramerVSquared(TableColumns o, TableColumns e, double const* T, double* out, double N,
                        unsigned C, unsigned R, unsigned Cp, unsigned Rp, unsigned mask) {
-  if (!wanted(mask, kTableCramerVSquare, out)) return;
+  if (!isRequested(mask, kTableCramerVSquare, out)) return;
   if (Cp == 0 || Rp == 0) {
     *out = kNaN;
     return;
@@ -113,7 +109,7 @@ void GetCramerVSquared(TableColumns o, TableColumns e, double const* T, double* 
 // (row 0 total marked, column 0 total drawn).
 void GetFisherExactTest(TableColumns o, double const* T, double const* U, double* out, double N,
                         unsigned C, unsigned R, unsigned Cp, unsigned Rp, unsigned mask) {
-  if (!wanted(mask, kTableFisherExact, out)) return;
+  if (!isRequested(mask, kTableFisherExact, out)) return;
   if (C != 2 || R != 2) {
     *out = kNotTwoByTwo;
     return;
@@ -134,7 +130,7 @@ void GetFisherExactTest(TableColumns o, double const* T, double const* U, double
 // P-value of the smaller discordant count among b + c.
 void GetMcNemarTest(TableColumns o, double const* /*T*/, double const* /*U*/, double* out, double N,
                     unsigned C, unsigned R, unsigned /*Cp*/, unsigned /*Rp*/, unsigned mask) {
-  if (!wanted(mask, kTableMcNemar, out)) return;
+  if (!isRequested(mask, kTableMcNemar, out)) return;
   if (C != 2 || R != 2) {
     out[0] = out[1] = out[2] = kNaN;
     out[3] = kNotTwoByTwo;

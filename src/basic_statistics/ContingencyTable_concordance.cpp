@@ -65,7 +65,7 @@ void marginSums(double const* totals, unsigned n, double* tiedPairs, double* cub
 
 void GetConcordanceMeasures(TableColumns o, double const* T, double const* U, double* out, double N,
                             unsigned C, unsigned R, unsigned mask) {
-  if ((mask & kTableMeasuresOfConcordance) == 0 || out == nullptr) return;
+  if (!isRequested(mask, kTableMeasuresOfConcordance, out)) return;
   const PairCounts counts = countPairs(o, C, R);
   const double P = counts.concordant, Q = counts.discordant;
   const double pairs = (N - 1.0) * N * 0.5;
