@@ -4,12 +4,11 @@
 // next allocation fail.
 #include <gtest/gtest.h>
 #include <qel/basic_types.h>
+#include <qel/contingency_table.h>
 #include <qel/descriptive.h>
 #include <qel/fits.h>
 #include <qel/location_tests.h>
 #include <qel/order_statistics.h>
-
-#include <qel/contingency_table.h>
 
 #include <atomic>
 #include <cmath>
@@ -42,6 +41,17 @@ void operator delete(void* p) noexcept {
   std::free(p);
 }
 void operator delete(void* p, std::size_t) noexcept {
+  std::free(p);
+}
+// The array forms too: the sanitizer runtime would otherwise serve them
+// without passing through the replacement above.
+void* operator new[](std::size_t size) {
+  return operator new(size);
+}
+void operator delete[](void* p) noexcept {
+  std::free(p);
+}
+void operator delete[](void* p, std::size_t) noexcept {
   std::free(p);
 }
 #pragma GCC diagnostic pop
