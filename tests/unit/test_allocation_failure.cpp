@@ -43,10 +43,21 @@ void operator delete(void* p) noexcept {
 void operator delete(void* p, std::size_t) noexcept {
   std::free(p);
 }
-// The array forms too: the sanitizer runtime would otherwise serve them
-// without passing through the replacement above.
+// The array and no-throw forms too: the sanitizer runtime would otherwise
+// serve them itself, without the replacement's failure, and its memory would
+// then reach the free() of the deletes here.
 void* operator new[](std::size_t size) {
   return operator new(size);
+}
+void* operator new(std::size_t size, std::nothrow_t const&) noexcept {
+  try {
+    return operator new(size);
+  } catch (std::bad_alloc const&) {
+    return nullptr;
+  }
+}
+void* operator new[](std::size_t size, std::nothrow_t const&) noexcept {
+  return operator new(size, std::nothrow);
 }
 void operator delete[](void* p) noexcept {
   std::free(p);
