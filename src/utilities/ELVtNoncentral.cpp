@@ -11,8 +11,9 @@
 // When t and delta have opposite signs the lower tail is a difference of
 // nearly equal terms; it is kept only while it stays well above the terms,
 // otherwise it comes from the saddle-centred integral, from Owen's T and
-// Owen's recursion for small integer degrees of freedom, flagged with
-// status 1 where the result is a last resort.
+// Owen's recursion for small integer degrees of freedom, or from the
+// expansion in m/(m + t^2) in their far tail, flagged with status 1 where
+// the result is a last resort.
 #include <qel/elv.h>
 
 #include <algorithm>
@@ -304,14 +305,20 @@ Tails oppositeSigns(double t, double df, double delta) {
   const bool expansion = (m >= 2 && m <= 6 && t <= -10.0) || (m >= 7 && m <= 12 && t < -25.0);
   if (expansion) {
     // Far tail of a small integer df, where the recursion's terms of both
-    // signs would swamp the tail. An expansion in 1/t^2 with coefficients
-    // p(delta) phi(delta) + q(delta) Q(delta) cancels as badly once delta
-    // is large (the tail is far below either part); the integral around
-    // the saddle has no such loss and stands in, still flagged with
-    // status 1 as a last-resort path.
-    out.lower = saddle;
-    out.upper = 1.0 - saddle;
-    out.code = 1;
+    // signs would swamp the tail: the expansion in m/(m + t^2). A last
+    // resort like the recursion, hence status 1.
+    const double lower = t_expansion_approx(t, df, delta);
+    if (lower == -1.0) {
+      out.lower = out.upper = -1.0;
+      out.code = 4;
+    } else {
+      // For large delta the expansion's two parts cancel beyond the tail
+      // itself and the sum may turn negative: the tail is then set to 0,
+      // which status 1 announces.
+      out.lower = std::max(lower, 0.0);
+      out.upper = 1.0 - out.lower;
+      out.code = 1;
+    }
     ELVmethod = m <= 6 ? 3000 : 3001;
     return out;
   }

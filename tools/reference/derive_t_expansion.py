@@ -117,22 +117,43 @@ def integer_table(m):
     return scale, Pi, Ri
 
 
-def expansion_lower(t, m, dl, scale, Pi, Ri):
-    """The truncated expansion evaluated in mpmath (its truncation error only)."""
-    t, dl = mpf(t), mpf(dl)
+def expansion_parts(t, df, dl, scale, Pi, Ri):
+    """The truncated expansion evaluated in mpmath (its truncation error only),
+    as the kernel forms it: m = int(df) for the table, B and c, the central t
+    tail of the true df for A(0). Returns the value and its condition number:
+    the sum of the magnitudes of all products (with A(j) taken as the sum of
+    the magnitudes of its recursion's parts) over the magnitude of their sum,
+    which multiplies the relative error of the inputs."""
+    t, dl, df = mpf(t), mpf(dl), mpf(df)
+    m = int(df)
     B = mpmath.beta(mpf(1) / 2, mpf(m) / 2)
     cc = m / (m + t * t)
-    central = mpmath.betainc(mpf(m) / 2, mpf(1) / 2, 0, cc, regularized=True) / 2
+    central = mpmath.betainc(df / 2, mpf(1) / 2, 0, df / (df + t * t), regularized=True) / 2
     A = [B * mpmath.sqrt(m) * central]
+    # Magnitudes of A(j) as the recursion forms them (its two parts cancel).
+    size = [A[0]]
     for j in range(1, TERMS):
-        A.append((t * cc ** (mpf(m + 2 * j - 1) / 2) + (m + 2 * j - 2) * A[-1]) / (m + 2 * j - 1))
+        power = cc ** (mpf(m + 2 * j - 1) / 2)
+        A.append((t * power + (m + 2 * j - 2) * A[-1]) / (m + 2 * j - 1))
+        size.append((abs(t) * power + (m + 2 * j - 2) * size[-1]) / (m + 2 * j - 1))
     ph, Q = mpmath.npdf(dl), mpmath.ncdf(-dl)
-    total = 0
+    total, magnitude = 0, 0
     for j in range(TERMS):
         pv = sum(mpf(a) * dl ** k for k, a in enumerate(Pi[j]))
         rv = sum(mpf(a) * dl ** k for k, a in enumerate(Ri[j]))
         total += A[j] * (pv * ph + rv * Q)
-    return -mpmath.sqrt(2 * mpmath.pi) / (mpmath.sqrt(m) * B) * mpf(scale) * total
+        magnitude += size[j] * (abs(pv * ph) + abs(rv * Q))
+    factor = -mpmath.sqrt(2 * mpmath.pi) / (mpmath.sqrt(m) * B) * mpf(scale)
+    return factor * total, magnitude / abs(total)
+
+
+def tables():
+    """The integer tables of m = 1..MAX_M, with each scale as an mpmath string."""
+    out = []
+    for m in range(1, MAX_M + 1):
+        scale, Pi, Ri = integer_table(m)
+        out.append((scale, str(sp.N(scale, 45)), Pi, Ri))
+    return out
 
 
 def write_include(tables):
@@ -176,22 +197,19 @@ def write_include(tables):
 
 def main():
     check_polys()
-    tables = []
-    for m in range(1, MAX_M + 1):
-        tables.append(integer_table(m))
-        print("m =", m, "scale", tables[-1][0], file=sys.stderr)
-    write_include(tables)
+    all_tables = tables()
+    write_include([(scale, Pi, Ri) for scale, _, Pi, Ri in all_tables])
     # Truncation error of the 4-term expansion against the integrated tail.
     mp.dps = 40
     print("relative truncation error (mpmath, no rounding):")
     for m in range(1, MAX_M + 1):
-        scale, Pi, Ri = tables[m - 1]
+        _, scale, Pi, Ri = all_tables[m - 1]
         ts = (-10.0, -30.0, -300.0) if m <= 6 else (-25.5, -60.0, -300.0)
         for t in ts:
             errs = []
             for dl in (-3.0, 1.0, 3.0, 5.0, 10.0):
                 ref = tail(mpf(t), mpf(m), mpf(dl), False)
-                got = expansion_lower(t, m, dl, str(sp.N(scale, 45)), Pi, Ri)
+                got, _ = expansion_parts(t, m, dl, scale, Pi, Ri)
                 errs.append("%.1e" % float(abs(got / ref - 1)))
             print("  m=%2d t=%7.1f delta -3,1,3,5,10: %s" % (m, t, " ".join(errs)))
 
