@@ -124,7 +124,7 @@ std::string methodClass(int64_t method, int status) {
   }
   if (method == 2001) return "saddle integral, df>=1000";
   if (method == 2002 || method == 2003) return "saddle integral fallback";
-  if (method == 3000 || method == 3001) return "far-tail expansion (relative)";
+  if (method == 3000 || method == 3001) return "saddle integral far tail";
   if (method == 4000) return "Owen's T, m = 1";
   if (method == 4001 || method == 4002) return "Owen's recursion";
   if (method == 2000) return "saddle value 0";
@@ -153,18 +153,6 @@ TEST(ElvT, NoncentralTailsMatchReference) {
     const bool fractionalOwen = owen && df != std::floor(df);
     if (owen) {
       EXPECT_EQ(status, qel::ElvLossOfSignificance) << where;
-    }
-    if (method == 3000 || method == 3001) {
-      // The expansion's accuracy, which falls with delta, is held to its
-      // measured bounds in test_elv_t_expansion.cpp; here only its use.
-      EXPECT_EQ(status, qel::ElvLossOfSignificance) << where;
-      // A negative delta runs on (-t, -delta) and exchanges the tails.
-      const bool reflected = delta < 0.0;
-      const double tail = reflected ? upper : lower;
-      EXPECT_EQ(tail, std::max(t_expansion_approx(reflected ? -t : t, df, std::fabs(delta)), 0.0))
-          << where;
-      table.add(key, relativeError(tail, row.numbers[reflected ? 4 : 3]));
-      continue;
     }
     for (int i = 0; i < 2; ++i) {
       const double got = i == 0 ? lower : upper, want = row.numbers[3 + i];
