@@ -6,7 +6,9 @@ E[Q(t W - delta)]; both are integrated by mpmath.quad at 40 digits around the
 peak of their own integrand, so each tail keeps its relative accuracy however
 small it is. Tha_c(h, a) is the integral of phi(x) Q(a x) from h to infinity.
 
-Writes tests/data/elv_t_noncentral.csv and tests/data/elv_owen.csv.
+Writes tests/data/elv_t_noncentral.csv, tests/data/elv_owen.csv and
+tests/data/elv_t_expansion.csv (the far lower tail, t < 0 < delta mostly, of
+small integer df where the expansion in m/(m + t^2) is used).
 Run with /usr/bin/python3 from tools/reference.
 """
 import os
@@ -123,10 +125,39 @@ def gen_owen():
     write_rows(os.path.join(OUT, "elv_owen.csv"), "h,a,Tha_c", rows)
 
 
+def gen_expansion():
+    """Far-tail rows: the tail itself, the value of the four-term expansion
+    in m/(m + t^2) as t_expansion_approx forms it (exact arithmetic on the
+    derived tables), and that sum's condition number."""
+    from derive_t_expansion import expansion_parts, tables
+
+    table = tables()
+    rows = []
+    deltas = [-5.0, -3.0, -1.0, 0.5, 1.0, 2.0, 3.0, 5.0, 8.0, 10.0, 15.0, 21.3]
+    for df in [float(m) for m in range(1, 13)] + [2.5, 9.5]:
+        if df == 1.0:
+            ts = [-10.0, -50.0, -1000.0]
+        elif df < 7.0:
+            ts = [-10.0, -20.0, -50.0, -1000.0]
+        else:
+            ts = [-25.5, -40.0, -100.0, -1000.0]
+        _, scale, Pi, Ri = table[int(df) - 1]
+        for t in ts:
+            for delta in deltas:
+                value, condition = expansion_parts(d(t), d(df), d(delta), scale, Pi, Ri)
+                rows.append([repr(t), repr(df), repr(delta), tail(d(t), d(df), d(delta), False),
+                             value, condition])
+        print(df, file=sys.stderr)
+    write_rows(os.path.join(OUT, "elv_t_expansion.csv"), "t,df,delta,lower,expansion,condition",
+               rows)
+
+
 if __name__ == "__main__":
     mp.dps = 40
-    which = sys.argv[1:] or ["owen", "nct"]
+    which = sys.argv[1:] or ["owen", "nct", "expansion"]
     if "owen" in which:
         gen_owen()
     if "nct" in which:
         gen_nct()
+    if "expansion" in which:
+        gen_expansion()
