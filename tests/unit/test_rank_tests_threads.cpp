@@ -1,4 +1,5 @@
-// The parallel loops of Kruskal-Wallis, Mood and Friedman give the same
+// The parallel loops of Kruskal-Wallis, Mood and Friedman, and the parallel
+// sections of the Wilcoxon signed rank and runs tests, give the same
 // results on one thread and on four: every group or treatment record is
 // written by one thread only, and the reduced sums may differ only in
 // rounding. The data hold many ties, so the tie runs and the tie-adjusted
@@ -6,6 +7,7 @@
 #include <gtest/gtest.h>
 #include <omp.h>
 #include <qel/rank_tests.h>
+#include <qel/sign_tests.h>
 
 #include <cmath>
 #include <random>
@@ -189,6 +191,38 @@ TEST(RankTestThreads, FriedmanAgreesOnOneAndFourThreads) {
         << "treatment " << t;
     EXPECT_EQ(one.columns[t], four.columns[t]) << "fitted values of treatment " << t;
   }
+}
+
+// Sections write disjoint fields and reduce no sums: bit-identical results.
+TEST(RankTestThreads, WilcoxonAndRunsSectionsAgreeOnOneAndFourThreads) {
+  ThreadCount restore;
+  std::mt19937_64 engine(41);
+  std::normal_distribution<double> normal(0.3, 1.0);
+  std::vector<double> x(501);
+  for (double& v : x) v = std::round(normal(engine) * 8.0) / 8.0;  // ties, and zeros at mu0 = 0
+  qel::v0::OneSampleWilcoxon wilcoxon[2];
+  qel::v1::RunsTest runs[2];
+  for (int i = 0; i < 2; ++i) {
+    omp_set_num_threads(i == 0 ? 1 : 4);
+    wilcoxon[i].n = static_cast<int>(x.size());
+    ASSERT_EQ(qel::v0::RunLynOneSampleWilcoxon(&wilcoxon[i], x.data(), 0.95, qel::kIntervalTwoSided,
+                                               qel::kAlternativeNotEqual, 0.0),
+              qel::qelOk);
+    ASSERT_EQ(qel::v1::RunRunsTest(&runs[i], x.data(), 0.25, static_cast<unsigned>(x.size())),
+              qel::qelOk);
+  }
+  ASSERT_TRUE(std::isfinite(wilcoxon[0].pValue));
+  ASSERT_TRUE(std::isfinite(wilcoxon[0].lowerLimit));
+  EXPECT_EQ(wilcoxon[0].estimatedMedian, wilcoxon[1].estimatedMedian);
+  EXPECT_EQ(wilcoxon[0].achievedConfidence, wilcoxon[1].achievedConfidence);
+  EXPECT_EQ(wilcoxon[0].lowerLimit, wilcoxon[1].lowerLimit);
+  EXPECT_EQ(wilcoxon[0].upperLimit, wilcoxon[1].upperLimit);
+  EXPECT_EQ(wilcoxon[0].W, wilcoxon[1].W);
+  EXPECT_EQ(wilcoxon[0].pValue, wilcoxon[1].pValue);
+  EXPECT_EQ(wilcoxon[0].n, wilcoxon[1].n);
+  ASSERT_TRUE(std::isfinite(runs[0].pValue));
+  EXPECT_EQ(runs[0].observedRuns, runs[1].observedRuns);
+  EXPECT_EQ(runs[0].pValue, runs[1].pValue);
 }
 
 }  // namespace
