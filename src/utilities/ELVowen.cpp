@@ -334,7 +334,7 @@ int Tha_c(double* out, double h, double a) {
   if (a > 1e100) {
     // Q(a x) is a step at 0: the integral of phi over [h, 0), plus the
     // value atan(1/a)/(2 pi) = 1/(2 pi a) of the range beyond 0.
-    *out = (h < 0.0 ? 0.5 - upperNormal(-h) : 0.0) + (h <= 0.0 ? kInvTwoPi / a : 0.0);
+    *out = (h < 0.0 ? 0.5 * std::erf(-h * kInvSqrt2) : 0.0) + (h <= 0.0 ? kInvTwoPi / a : 0.0);
     ELVsteps1 = 0;
     return 0;
   }
@@ -350,9 +350,10 @@ int Tha_c(double* out, double h, double a) {
     code = nonNegativeH(h, a, out, &terms);
   } else {
     // T is even in h, so Tha_c(h, a) = (Q(h) - Q(-h))/2 + Tha_c(-h, a), and
-    // for h < 0 the first part is 1/2 - Q(-h): a sum of two positive parts.
+    // for h < 0 the first part is 1/2 - Q(-h) = erf(-h/sqrt(2))/2: a sum of
+    // two positive parts, without the cancellation of 1/2 - Q near h = 0.
     code = nonNegativeH(-h, a, out, &terms);
-    if (code == 0) *out += 0.5 - upperNormal(-h);
+    if (code == 0) *out += 0.5 * std::erf(-h * kInvSqrt2);
   }
   ELVsteps1 = terms;
   if (code != 0) *out = -1.0;
