@@ -22,9 +22,15 @@
 //
 // The double series needs about h^2 (2w - w^2)/2 terms before it decays, and
 // its inner alternating sum cancels like ((1 + w/2)/(1 - w/2))^n. Where 200
-// terms do not reach 1e-15, or its rounding error bound exceeds that, the
-// integral is evaluated by Gauss-Legendre panels instead (large h near a = 1,
-// where the integrand is a smooth, nearly exponential decay).
+// terms do not reach 1e-15, or its rounding error bound exceeds that (h above
+// about 4.5 at a = 0.75, 9 at a = 0.9, 26.5 for any a but 1), the integral
+// is evaluated by Gauss-Legendre panels instead, which keep 1e-15 there since
+// the integrand is a smooth, nearly exponential decay; `ELVsteps1` then holds
+// the number of panels instead of the number of terms.
+//
+// The incomplete gamma values are formed here to 1e-16 (Gamma(1/2, g) from
+// erfc, the others from a continued fraction run to convergence), as the
+// scaled series of the gamma kernels stop at 1e-9.
 #include <qel/elv.h>
 
 #include <algorithm>
