@@ -116,12 +116,52 @@ def check_owen():
         assert abs(tha_c(h, 1.0) / exact - 1) < mpf(10) ** -25, h
 
 
+def owen_rows():
+    """The grid of the first version, then rows on every region of Tha_c and
+    its borders (a = 0.75, 1, 1.333333), g = (a h)^2/2 or h^2/2 around 1,
+    h = 0, negative h, and large h with values from 1e-100 down to 1e-300."""
+    hs = [-3.0, -0.5, 0.0, 0.1, 0.5, 1.0, 2.0, 5.0, 10.0, 20.0, 30.0]
+    As = [0.01, 0.3, 0.74, 0.75, 0.9, 1.0, 1.2, 1.333333, 1.34, 3.0, 10.0, 100.0]
+    cases = [(h, a) for h in hs for a in As]
+    borders = [0.7499999999, 0.75, 0.7500000001, 0.99, 0.9999999999, 1.0, 1.0000000001, 1.01,
+               1.3333329999, 1.333333, 1.3333330001, 4.0 / 3.0]
+    cases += [(h, a) for h in (0.0, 0.3, 1.5, 3.0, 4.5, 7.0, 15.0, 26.0) for a in borders]
+    # g = (a h)^2/2 around 1 in the gamma series, directly and reflected.
+    root2 = 2.0 ** 0.5
+    for a in (1.5, 2.0, 5.0):
+        cases += [(root2 / a * f, a) for f in (0.9, 0.999999, 1.0, 1.000001, 1.1)]
+    for a in (0.2, 0.5, 0.7):
+        cases += [(root2 * f, a) for f in (0.9, 0.999999, 1.0, 1.000001, 1.1)]
+    cases += [(-h, a) for h in (1e-8, 1.0, 8.0, 37.0) for a in (0.5, 0.8, 1.2, 2.0, 1e3)]
+    cases += [(0.0, a) for a in (1e-50, 1e-5, 0.5, 2.0, 1e5, 1e50)]
+    # Far tails: Tha_c is about exp(-h^2 (1 + a^2)/2), so h^2 (1 + a^2) = 2 L
+    # gives values near e^-L.
+    for a in (0.01, 0.3, 0.74, 0.8, 0.95, 1.0, 1.05, 1.3, 1.4, 3.0, 30.0):
+        for L in (230.0, 460.0, 640.0, 686.0):
+            cases.append((float(mpmath.sqrt(2 * L / (1 + mpf(a) ** 2))), a))
+    return cases
+
+
+def owen_check(h, a, value):
+    """Second evaluation of Tha_c: 1/(2 pi) times the integral over (a, inf)
+    of exp(-h^2 (1 + t^2)/2)/(1 + t^2), with 1/2 - Q(-h) added for h < 0."""
+    from derive_owen_series import reference
+    h, a = d(h), d(a)
+    other = reference(h, a) if h >= 0 else mpmath.ncdf(-h) - mpf(1) / 2 + reference(-h, a)
+    assert abs(other - value) <= mpf(10) ** -25 * value, (h, a)
+
+
 def gen_owen():
     check_owen()
     rows = []
-    for h in [-3.0, -0.5, 0.0, 0.1, 0.5, 1.0, 2.0, 5.0, 10.0, 20.0, 30.0]:
-        for a in [0.01, 0.3, 0.74, 0.75, 0.9, 1.0, 1.2, 1.333333, 1.34, 3.0, 10.0, 100.0]:
-            rows.append([repr(h), repr(a), tha_c(h, a)])
+    for h, a in owen_rows():
+        if h == 0.0:
+            # exact: T(0, a) = atan(a)/(2 pi)
+            value = mpmath.atan(1 / d(a)) / (2 * mpmath.pi)
+        else:
+            value = tha_c(h, a)
+        owen_check(h, a, value)
+        rows.append([repr(h), repr(a), value])
     write_rows(os.path.join(OUT, "elv_owen.csv"), "h,a,Tha_c", rows)
 
 
