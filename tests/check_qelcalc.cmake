@@ -186,3 +186,63 @@ run(2 "^$" table ${WORK}/no_such_file.txt)
 run(2 "^$" table ${WORK}/qelcalc_table.txt --want chisq,sideways)
 run(2 "^$" table ${WORK}/qelcalc_table.txt --upper 1)
 run(2 "^$" table)
+# test with the distribution-free tests: values from R for the table below
+# (tools/reference/gen_qelcalc_rank_tests.R prints them).
+file(WRITE ${WORK}/qelcalc_groups.csv "a,b,c\n1.83,0.878,2.1\n0.5,0.647,3.3\n1.62,0.598,2.9\n2.48,2.05,4.0\n1.68,1.06,1.9\n1.88,1.29,3.6\n1.55,1.06,\n3.06,3.14,\n1.3,1.29,\n")
+file(WRITE ${WORK}/qelcalc_long.txt "value group\n1.83 a\n0.878 b\n2.1 c\n0.5 a\n0.647 b\n3.3 c\n1.62 a\n0.598 b\n2.9 c\n2.48 a\n2.05 b\n4.0 c\n1.68 a\n1.06 b\n1.9 c\n1.88 a\n1.29 b\n3.6 c\n1.55 a\n1.06 b\n3.06 a\n3.14 b\n1.3 a\n1.29 b\n")
+file(WRITE ${WORK}/qelcalc_long2.csv "group,value\nb,0.878\na,1.83\nb,0.647\na,0.5\nb,0.598\na,1.62\nb,2.05\na,2.48\nb,1.06\na,1.68\nb,1.29\na,1.88\nb,1.06\na,1.55\nb,3.14\na,3.06\nb,1.29\na,1.3\n")
+file(WRITE ${WORK}/qelcalc_ga.txt "1.83\n0.5\n1.62\n2.48\n1.68\n1.88\n1.55\n3.06\n1.3\n")
+file(WRITE ${WORK}/qelcalc_gb.txt "0.878\n0.647\n0.598\n2.05\n1.06\n1.29\n1.06\n3.14\n1.29\n")
+file(WRITE ${WORK}/qelcalc_gc.txt "2.1\n3.3\n2.9\n4.0\n1.9\n3.6\n")
+set(mw_out "^first a\nsecond b\nfirst_n 9\nsecond_n 9\nfirst_median 1\\.(68|6799999)[0-9]*\nsecond_median 1\\.06[0-9]*\nestimate 0\\.56[0-9]*\nlower -0\\.369999999[0-9]*\nupper 1\\.183[0-9]*\nachieved_confidence 0\\.957739893[0-9]*\nW 103\np 0\\.133320215[0-9]*\nadjusted_p 0\\.132919458[0-9]*\n$")
+run(0 "${mw_out}" test mann-whitney ${WORK}/qelcalc_groups.csv)
+run(0 "W 103\np 0\\.133320215" test mann-whitney ${WORK}/qelcalc_ga.txt ${WORK}/qelcalc_gb.txt)
+# Labels in order of appearance: b first, so W is the rank sum of b.
+run(0 "^first b\nsecond a\nfirst_n 9\nsecond_n 9\n.*\nestimate -0\\.56[0-9]*\n.*\nW 68\np 0\\.133320215"
+    test mann-whitney ${WORK}/qelcalc_long2.csv --group-column 1 --value-column 2)
+run(0 "^first b\nsecond a\n.*W 68\n" test mann-whitney ${WORK}/qelcalc_groups.csv --column 2
+    --column2 1)
+run(0 "\nlower -Inf\nupper 1\\.0[0-9]*\n" test mann-whitney ${WORK}/qelcalc_groups.csv
+    --alternative less)
+set(kw_out "^H 10\\.4399999[0-9]*\ndf 2\np 0\\.00540732912[0-9]*\nadjusted_H 10\\.4490861[0-9]*\nadjusted_p 0\\.00538281891[0-9]*\ngroups 3\ngroup1_label a\ngroup1_n 9\ngroup1_median 1\\.(68|6799999)[0-9]*\ngroup1_mean_rank 12\ngroup1_z -0\\.268328157[0-9]*\ngroup2_label b\ngroup2_n 9\ngroup2_median 1\\.06[0-9]*\ngroup2_mean_rank 8\ngroup2_z -2\\.41495341[0-9]*\ngroup3_label c\ngroup3_n 6\ngroup3_median 3\\.09999[0-9]*\ngroup3_mean_rank 20\ngroup3_z 3\n$")
+run(0 "${kw_out}" test kruskal-wallis ${WORK}/qelcalc_groups.csv)
+run(0 "${kw_out}" test kruskal-wallis ${WORK}/qelcalc_long.txt --value-column 1 --group-column 2)
+run(0 "^H 10\\.4399999[0-9]*\n" test kruskal-wallis ${WORK}/qelcalc_ga.txt ${WORK}/qelcalc_gb.txt
+    ${WORK}/qelcalc_gc.txt)
+run(0 "^overall_median 1\\.75499999[0-9]*\nchi_square 8\\.88888888[0-9]*\ndf 2\np 0\\.0117436284[0-9]*\n.*\nflags 0\nstatus 0\ngroups 3\ngroup1_label a\ngroup1_n 9\ngroup1_count_at_or_below 5\ngroup1_count_above 4\ngroup1_median 1\\.(68|6799999)[0-9]*\n.*group2_count_at_or_below 7\ngroup2_count_above 2\n.*group3_count_at_or_below 0\ngroup3_count_above 6\n"
+    test mood ${WORK}/qelcalc_long.txt --value-column 1 --group-column 2)
+run(0 "^overall_median .*\nlower [-0-9.]+\nupper [-0-9.]+\nachieved_confidence 0\\.9[0-9]*\n"
+    test mood ${WORK}/qelcalc_groups.csv --columns 1,2)
+file(STRINGS ${WORK}/qelcalc_groups.csv friedman_rows LIMIT_COUNT 7)
+string(REPLACE ";" "\n" friedman_rows "${friedman_rows}")
+file(WRITE ${WORK}/qelcalc_blocks.csv "${friedman_rows}\n")
+run(0 "^blocks 6\ntreatments 3\ngrand_median [0-9.]*\nS 10\\.3333333[0-9]*\ndf 2\np 0\\.00570354899[0-9]*\nadjusted_S NaN\nadjusted_p -1\ntreatment1_label a\ntreatment1_median [0-9.]*\ntreatment1_rank_sum 11\ntreatment1_fitted( [0-9.]+)+\ntreatment2_label b\n.*treatment2_rank_sum 7\n.*treatment3_rank_sum 18\ntreatment3_fitted( [0-9.]+)+\n$"
+    test friedman ${WORK}/qelcalc_blocks.csv)
+run(0 "^n 9\nmedian 1\\.(68|6799999)[0-9]*\nnarrower_confidence 0\\.8203125[0-9]*\nwider_confidence 0\\.9609375[0-9]*\nnarrower_lower 1\\.55[0-9]*\ninterpolated_lower 1\\.35697674[0-9]*\nwider_lower 1\\.3[0-9]*\nnarrower_upper 1\\.87999[0-9]*\ninterpolated_upper 2\\.34325581[0-9]*\nwider_upper 2\\.48[0-9]*\nnarrower_position 3\nwider_position 2\np 0\\.039062(5|49999)[0-9]*\ncount_below 1\ncount_equal 0\ncount_above 8\nstatus 0\n$"
+    test sign ${WORK}/qelcalc_groups.csv --mu 1)
+run(0 "^n 9\nestimate 0\\.46[0-9]*\nachieved_confidence 0\\.955989015[0-9]*\nlower 0\\.01[0-9]*\nupper 0\\.786[0-9]*\nW 40\np 0\\.0440109840[0-9]*\n$"
+    test wilcoxon ${WORK}/qelcalc_groups.csv --column 1 --column2 2)
+run(0 "^k 1\\.7\ncount_below 5\ncount_above 4\nobserved_runs 8\nexpected_runs 5\\.44444444[0-9]*\np 0\\.142857142[0-9]*\n$"
+    test runs ${WORK}/qelcalc_ga.txt --k 1.7)
+# Bad input: one-line errors, exit status 2.
+file(WRITE ${WORK}/qelcalc_constant.csv "x,y\n1,2\n2,2\n3,2\n")
+file(WRITE ${WORK}/qelcalc_badcell.csv "x,y\n1,2\n2,two\n3,4\n")
+file(WRITE ${WORK}/qelcalc_infinite.txt "1\n2\ninf\n")
+run(2 "^$" test mann-whitney ${WORK}/qelcalc_constant.csv)
+run(2 "^$" test mann-whitney ${WORK}/qelcalc_groups.csv --columns 1,2,3)
+run(2 "^$" test mann-whitney ${WORK}/qelcalc_groups.csv --column2 9)
+run(2 "^$" test kruskal-wallis ${WORK}/qelcalc_groups.csv --columns 2)
+run(2 "^$" test kruskal-wallis ${WORK}/qelcalc_ga.txt)
+run(2 "^$" test kruskal-wallis ${WORK}/qelcalc_badcell.csv)
+run(2 "^$" test kruskal-wallis ${WORK}/qelcalc_ga.txt ${WORK}/qelcalc_empty.txt)
+run(2 "^$" test kruskal-wallis ${WORK}/qelcalc_ga.txt ${WORK}/qelcalc_infinite.txt)
+run(2 "^$" test mood ${WORK}/qelcalc_long.txt --group-column 2 --columns 1,2)
+run(2 "^$" test mood ${WORK}/qelcalc_badcell.csv --value-column 2 --group-column 1)
+run(2 "^$" test friedman ${WORK}/qelcalc_groups.csv)
+run(2 "^$" test friedman ${WORK}/qelcalc_groups.csv --columns 1)
+run(2 "^$" test friedman ${WORK}/qelcalc_badcell.csv)
+run(2 "^$" test sign ${WORK}/qelcalc_badcell.csv --column 2)
+run(2 "^$" test wilcoxon ${WORK}/qelcalc_groups.csv --column 1 --column2 3)
+run(2 "^$" test wilcoxon ${WORK}/qelcalc_groups.csv --approximate)
+run(2 "^$" test runs ${WORK}/qelcalc_ga.txt --mu 1)
+run(2 "^$" test runs)

@@ -11,6 +11,7 @@
 #include "distribution_mode.h"
 #include "fit_mode.h"
 #include "pvalue_mode.h"
+#include "rank_test_mode.h"
 #include "sample_mode.h"
 #include "summary_mode.h"
 #include "table_mode.h"
@@ -26,6 +27,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printSampleUsage(out);
   qelcalc::printTTestUsage(out);
   qelcalc::printTestUsage(out);
+  qelcalc::printRankTestUsage(out);
   qelcalc::printFitUsage(out);
   qelcalc::printSummaryUsage(out);
   qelcalc::printTableUsage(out);

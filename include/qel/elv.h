@@ -128,6 +128,10 @@ QEL_API int Tha_c(double* out, double h, double a);
  * its saddle point; -1 for arguments outside df in (0, 189812530],
  * finite t and |delta| below 1e6. */
 QEL_API double t_saddle_approx(double t, double df, double delta);
+/* Far lower tail of the noncentral t at t < 0 for the integer part m of df
+ * in 1..12, by a four-term expansion in m/(m + t^2); -1 with ELVerrno 4 for
+ * any other m, a NaN argument or |delta| of 1e6 or more. */
+QEL_API double t_expansion_approx(double t, double df, double delta);
 
 /* Beta family: shapes a, b; lower = I_x(a,b), upper = 1 - I_x(a,b). The
  * scaled series return 0 or 4: I_x(a,b) = density * beta_Iabx,

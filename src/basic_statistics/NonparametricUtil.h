@@ -21,9 +21,13 @@
 // within a tolerance band of, and above it; the side that cannot hold the
 // k-th cell is dropped, and the next pivot is the weighted median of the
 // rows' median cells, which drops at least a quarter of the cells in play
-// every round. Each round walks the rows once along the staircase of the
-// sorted matrix, so a rank costs O(m log m) for m values, and the bounds of
-// one search are reused by the next, higher rank of the same sample.
+// every round. On matrices of many rows a round takes instead two pivots
+// from a systematic sample of the cells in play, which bracket rank k with
+// high probability (Floyd and Rivest 1975) and leave a few per mille of the
+// cells; the median pivot returns after a round that did not halve them.
+// Each round walks the rows once along the staircase of the sorted matrix,
+// so a rank costs O(m log m) for m values, and the bounds of one search are
+// reused by the next, higher rank of the same sample.
 //
 // Cell counts of a row are long long (a repeated value of frequency f has a
 // diagonal cell of f(f+1)/2, beyond 32 bits for long columns); totals and

@@ -45,6 +45,16 @@ class DifferenceRectangle {
     return columnValue(column) - rowValue(row);
   }
 
+  // The difference of rank target (from 1) among the row's cells in play:
+  // every column of the row counts f cells.
+  double rowCell(int row, CmSelectionBounds const& b, long long target) const {
+    long long f = cumulativeX_[row] - cumulativeAt(cumulativeX_, row - 1);
+    long long before = cumulativeAt(cumulativeY_, b.lower[row]);
+    int column = mLowerBound(static_cast<int>(before + (target + f - 1) / f), cumulativeY_,
+                             b.lower[row] + 1, b.upper[row]);
+    return columnValue(column) - rowValue(row);
+  }
+
   // Columns j with y[j] - x[i] below (resp. not above) a threshold form a
   // prefix of every row that grows with i: two pointers walk up.
   CmBandWeights bounds(CmSelectionBounds& b, double pivot, double tolerance) const {

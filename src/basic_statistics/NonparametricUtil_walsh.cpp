@@ -58,7 +58,12 @@ class WalshTriangle {
   // cell holding rank (weight + 1) / 2 counted from the left bound.
   double rowMedian(int row, CmSelectionBounds const& b) const {
     int left = b.lower[row], right = std::min(row, b.upper[row]);
-    long long target = (weightAvg(row, right, left, cumulative_) + 1) / 2;
+    return rowCell(row, b, (weightAvg(row, right, left, cumulative_) + 1) / 2);
+  }
+
+  // Sum of the cell of rank target (from 1) among the row's cells in play.
+  double rowCell(int row, CmSelectionBounds const& b, long long target) const {
+    int left = b.lower[row], right = std::min(row, b.upper[row]);
     long long f = frequency(cumulative_, row);
     int lastOffDiagonal = std::min(right, row - 1);
     long long offDiagonal =

@@ -17,9 +17,9 @@
 
 namespace {
 bool failNextAllocation = false;
-// When not negative: the number of allocations to grant before one fails
-// (on any thread).
-std::atomic<int> failAllocationAfter{-1};
+// Counts down with every allocation, from any thread; the allocation that
+// finds it at 0 fails. Negative: disarmed.
+std::atomic<long> allocationsBeforeFailure{-1};
 }  // namespace
 
 void* operator new(std::size_t size) {
@@ -27,7 +27,7 @@ void* operator new(std::size_t size) {
     failNextAllocation = false;
     throw std::bad_alloc();
   }
-  if (failAllocationAfter.load(std::memory_order_relaxed) >= 0 && failAllocationAfter-- == 0) {
+  if (allocationsBeforeFailure.load() >= 0 && allocationsBeforeFailure.fetch_sub(1) == 0) {
     throw std::bad_alloc();
   }
   if (void* p = std::malloc(size ? size : 1)) return p;
@@ -223,55 +223,204 @@ TEST(AllocationFailure, SummariesReportOutOfMemory) {
 
 }  // namespace
 
+#include <qel/rank_tests.h>
+#include <qel/sign_tests.h>
+
+#include <functional>
+#include <vector>
+
+namespace {
+
+// Makes the k-th allocation of `run` fail, for k = 0, 1, ... until a run
+// completes within k allocations, so that every allocation of the routine,
+// including those inside its parallel loops, fails once. Each failing run
+// must answer 30001 and pass `afterFailure`; the last run must succeed.
+// Returns the number of allocations met.
+int failEachAllocation(const std::function<int()>& run,
+                       const std::function<void(int)>& afterFailure) {
+  for (int k = 0; k < 1000; ++k) {
+    allocationsBeforeFailure = k;
+    const int code = run();
+    const bool failed = allocationsBeforeFailure.load() < 0;
+    allocationsBeforeFailure = -1;
+    if (!failed) {
+      EXPECT_EQ(code, qel::qelOk) << "run without a failure";
+      return k;
+    }
+    EXPECT_EQ(code, qel::qelFailOutOfMemory) << "allocation " << k << " failed";
+    afterFailure(k);
+  }
+  ADD_FAILURE() << "the routine allocates without end";
+  return -1;
+}
+
+const std::vector<double> kFirst = {1.83, 0.50, 1.62, 2.48, 1.68, 1.88, 1.55, 3.06, 1.30, 1.62};
+const std::vector<double> kSecond = {0.878, 0.647, 0.598, 2.05, 1.06, 1.29, 1.06, 3.14, 1.29};
+const std::vector<double> kThird = {2.1, 3.3, 2.9, 4.0, 1.9, 3.6};
+
+bool allNaN(std::initializer_list<double> values) {
+  for (double v : values) {
+    if (!std::isnan(v)) return false;
+  }
+  return true;
+}
+
+TEST(AllocationFailure, MannWhitneyResetsTheRecord) {
+  qel::v0::MannWhitney record;
+  record.firstN = static_cast<int>(kFirst.size());
+  record.secondN = static_cast<int>(kSecond.size());
+  const auto run = [&] {
+    return qel::v0::RunLynMannWhitney(&record, kFirst.data(), kSecond.data(), 0.95,
+                                      qel::kIntervalTwoSided, qel::kAlternativeNotEqual);
+  };
+  const int allocations = failEachAllocation(run, [&](int k) {
+    EXPECT_TRUE(allNaN({record.firstMedian, record.secondMedian, record.estimate, record.lowerLimit,
+                        record.upperLimit, record.achievedConfidence, record.statistic,
+                        record.pValue, record.adjustedPValue}))
+        << "allocation " << k;
+  });
+  EXPECT_GT(allocations, 2);
+  EXPECT_EQ(record.statistic, 120.0);  // the complete run: W of the first sample (R)
+}
+
+// A group whose median copy fails stays NaN while the rank statistics of
+// every group are still computed; earlier failures leave the record NaN.
+TEST(AllocationFailure, KruskalWallisCountsTheGroupsThatFailed) {
+  qel::v0::KruskalWallisGroup groups[3] = {
+      {0, 0, 0, kFirst.data(), 10}, {0, 0, 0, kSecond.data(), 9}, {0, 0, 0, kThird.data(), 6}};
+  qel::v0::KruskalWallis record;
+  record.groups = groups;
+  record.groupCount = 3;
+  int medianFailures = 0;
+  const int allocations = failEachAllocation(
+      [&] { return qel::v0::RunLynKruskalWallis(&record); },
+      [&](int) {
+        if (std::isnan(record.statistic)) return;
+        ++medianFailures;
+        EXPECT_TRUE(std::isnan(groups[0].median) || std::isnan(groups[1].median) ||
+                    std::isnan(groups[2].median));
+        EXPECT_TRUE(std::isfinite(groups[0].z) && std::isfinite(groups[2].z));
+      });
+  EXPECT_EQ(medianFailures, 3);  // one copy per group
+  EXPECT_GE(allocations, 4);
+  EXPECT_EQ(groups[1].median, 1.06);
+}
+
+TEST(AllocationFailure, MoodReportsOutOfMemory) {
+  qel::v0::MoodGroup groups[2] = {};
+  groups[0].data = kFirst.data();
+  groups[0].n = 10;
+  groups[1].data = kSecond.data();
+  groups[1].n = 9;
+  qel::v0::Mood record;
+  record.groups = groups;
+  record.groupCount = 2;
+  const int allocations =
+      failEachAllocation([&] { return qel::v0::RunLynMood(&record); }, [](int) {});
+  EXPECT_GT(allocations, 2);
+  EXPECT_EQ(record.overallMedian, 1.55);
+  EXPECT_TRUE(std::isfinite(record.lowerLimit) && std::isfinite(record.upperLimit));
+}
+
+// The columns are overwritten with fitted values, so each run starts from a
+// fresh copy; a failed run must not disturb the next one.
+TEST(AllocationFailure, FriedmanReportsOutOfMemory) {
+  const std::vector<double> table[3] = {{1.83, 0.50, 1.62, 2.48, 1.68, 1.88},
+                                        {0.878, 0.647, 0.598, 2.05, 1.06, 1.29},
+                                        {2.1, 3.3, 2.9, 4.0, 1.9, 3.6}};
+  std::vector<double> columns[3];
+  qel::v0::FriedmanTreatment treatments[3];
+  qel::v0::Friedman record;
+  record.treatments = treatments;
+  record.blocks = 6;
+  record.treatmentCount = 3;
+  const auto run = [&] {
+    for (int t = 0; t < 3; ++t) {
+      std::copy(table[t].begin(), table[t].end(), columns[t].begin());
+      treatments[t].column = columns[t].data();
+    }
+    return qel::v0::RunLynFriedman(&record);
+  };
+  for (auto& c : columns) c.resize(6);
+  const int allocations = failEachAllocation(run, [](int) {});
+  EXPECT_GT(allocations, 3);
+  EXPECT_DOUBLE_EQ(record.statistic, 31.0 / 3.0);  // rank sums 11, 7, 18
+  EXPECT_EQ(treatments[1].rankSum, 7.0);
+}
+
+TEST(AllocationFailure, SignAndWilcoxonReportOutOfMemory) {
+  qel::v0::OneSampleSign sign;
+  sign.n = 10;
+  int allocations = failEachAllocation(
+      [&] {
+        return qel::v0::RunLynOneSampleSign(&sign, kFirst.data(), 0.9, qel::kIntervalTwoSided,
+                                            qel::kAlternativeNotEqual, 1.0);
+      },
+      [&](int k) {
+        EXPECT_TRUE(std::isnan(sign.pValue) && std::isnan(sign.interpolatedLowerLimit))
+            << "allocation " << k;
+      });
+  EXPECT_GE(allocations, 1);
+  EXPECT_EQ(sign.countAbove, 9.0);
+
+  qel::v0::OneSampleWilcoxon wilcoxon;
+  wilcoxon.n = 10;
+  allocations = failEachAllocation(
+      [&] {
+        wilcoxon.n = 10;
+        return qel::v0::RunLynOneSampleWilcoxon(
+            &wilcoxon, kFirst.data(), 0.95, qel::kIntervalTwoSided, qel::kAlternativeNotEqual, 1.0);
+      },
+      [&](int k) { EXPECT_TRUE(std::isnan(wilcoxon.pValue)) << "allocation " << k; });
+  EXPECT_GT(allocations, 1);
+  EXPECT_EQ(wilcoxon.W, 53.0);  // V of R's wilcox.test(x - 1)
+}
+
+}  // namespace
+
 namespace {
 
 // Every allocation of MakeIContingencyTable in turn fails: a null table and
 // 30001, never a half-made object. Then every allocation of Analyze: 30001,
 // kept by the object for later passes.
 TEST(AllocationFailure, ContingencyTableReportsOutOfMemory) {
-  int failures = 0;
-  for (int k = 0; k < 50; ++k) {
-    int code = -1;
-    failAllocationAfter = k;
-    qel::IContingencyTable* t = qel::MakeIContingencyTable(3, 3, 0xFFFFFF, &code);
-    failAllocationAfter = -1;
-    if (t != nullptr) {
-      EXPECT_EQ(code, 0);
-      qel::DeleteIContingencyTable(&t);
-      break;
-    }
-    EXPECT_EQ(code, qel::qelFailOutOfMemory);
-    ++failures;
-  }
-  EXPECT_GE(failures, 3);  // the object, the observed array, a result array
+  qel::IContingencyTable* t = nullptr;
+  const int made = failEachAllocation(
+      [&] {
+        int code = -1;
+        t = qel::MakeIContingencyTable(3, 3, 0xFFFFFF, &code);
+        return code;
+      },
+      [&](int k) { EXPECT_EQ(t, nullptr) << "allocation " << k; });
+  qel::DeleteIContingencyTable(&t);
+  EXPECT_GE(made, 3);  // the object, the observed array, a result array
 
   double counts[9] = {4, 2, 1, 3, 5, 2, 1, 2, 6};
   double pearson[3], concordance[9], goodmanKruskal[4], spearman;
-  failures = 0;
-  for (int k = 0; k < 50; ++k) {
+  auto prepare = [&] {
     int code = -1;
-    qel::IContingencyTable* t = qel::MakeIContingencyTable(3, 3, 0xFFFFFF & ~0x1u, &code);
-    ASSERT_NE(t, nullptr);
-    for (unsigned c = 0; c < 3; ++c) t->SetupObservedCounts(counts + 3 * c, c);
-    t->SetupPearsonChisquareTest(pearson);
-    t->SetupMeasuresOfConcordance(concordance);
-    t->SetupGoodmanKruskal(goodmanKruskal);
-    t->SetupSpearmanRho(&spearman);
-    failAllocationAfter = k;
-    code = t->Analyze();
-    failAllocationAfter = -1;
-    if (code == qel::qelOk) {
-      EXPECT_EQ(pearson[1], 4.0);
-      qel::DeleteIContingencyTable(&t);
-      break;
-    }
-    EXPECT_EQ(code, qel::qelFailOutOfMemory);
-    EXPECT_EQ(t->Analyze(), qel::qelFailOutOfMemory);  // the code is kept
-    qel::DeleteIContingencyTable(&t);
-    ++failures;
-  }
+    qel::IContingencyTable* table = qel::MakeIContingencyTable(3, 3, 0xFFFFFF & ~0x1u, &code);
+    for (unsigned c = 0; c < 3; ++c) table->SetupObservedCounts(counts + 3 * c, c);
+    table->SetupPearsonChisquareTest(pearson);
+    table->SetupMeasuresOfConcordance(concordance);
+    table->SetupGoodmanKruskal(goodmanKruskal);
+    table->SetupSpearmanRho(&spearman);
+    return table;
+  };
+  // The tables are made outside the counted runs, so that only Analyze's
+  // own allocations fail.
+  t = prepare();
+  const int analyzed = failEachAllocation([&] { return t->Analyze(); },
+                                          [&](int k) {
+                                            EXPECT_EQ(t->Analyze(), qel::qelFailOutOfMemory)
+                                                << "the code is kept, " << k;
+                                            qel::DeleteIContingencyTable(&t);
+                                            t = prepare();
+                                          });
+  EXPECT_EQ(pearson[1], 4.0);
+  qel::DeleteIContingencyTable(&t);
   // Temporary totals, expected counts and the scratch of three sections.
-  EXPECT_GE(failures, 4);
+  EXPECT_GE(analyzed, 4);
 }
 
 }  // namespace

@@ -28,6 +28,8 @@ TEST(ElvNormalTFamily, BadArgumentsDoNotTrapWhenArmed) {
         Tha_c(&a, u, v);
         a = t_saddle_approx(u, v, 2.0);
         a = t_saddle_approx(-1.0, u, v);
+        a = t_expansion_approx(u, 3.0, v);
+        a = t_expansion_approx(u, v, 2.0);
         hypergeo_df(3, 10, 4, 5, &a, &b, &c);
         t_df(u, v, &a, &b);
         t_ncdf(u, v, 2.0, &a, &b);

@@ -329,3 +329,93 @@ TEST(Selection, DegenerateSamplesAndNaN) {
 }
 
 }  // namespace
+
+namespace {
+
+// Many rows: the search brackets rank k between two pivots from a sample of
+// the cells. Every rank tried, from the extremes (where the bracket reaches
+// past the sample on one side) to the middle, searched afresh and resumed in
+// ascending order, must give exactly the brute-force order statistic.
+TEST(Selection, SampledPivotsOnManyRows) {
+  std::mt19937 rng(29);
+  std::normal_distribution<double> normal(0.2, 1.5);
+  for (bool tied : {false, true}) {
+    std::vector<double> x(700), y(520);
+    for (double& v : x) v = tied ? std::round(normal(rng) * 40.0) / 8.0 : normal(rng);
+    for (double& v : y) v = tied ? std::round(normal(rng) * 40.0) / 8.0 : normal(rng) - 0.3;
+    const Compressed cx = compress(x, false), cy = compress(y, false);
+    const std::vector<double> averages = sortedWalshAverages(x);
+    const std::vector<double> differences = sortedDifferences(x, y);
+    for (int walsh = 0; walsh < 2; ++walsh) {
+      const std::vector<double>& all = walsh ? averages : differences;
+      const double total = double(all.size());
+      std::vector<double> ranks = {1, 2, 3, 40, std::floor(total / 1000), std::floor(total / 7)};
+      for (double f = 0.05; f < 1.0; f += 0.0731) ranks.push_back(std::floor(total * f));
+      for (double k : {std::floor((total + 1) / 2), total - 40, total - 2, total - 1, total}) {
+        ranks.push_back(k);
+      }
+      std::sort(ranks.begin(), ranks.end());
+      qel::CmSelectionBounds resumed;
+      if (walsh) {
+        qel::mResetBoundsAvg(700, resumed);
+      } else {
+        qel::mResetBoundsDiff(700, 520, resumed);
+      }
+      double eliminated = 0.0;
+      for (double k : ranks) {
+        const double expected = all[std::size_t(k) - 1];
+        qel::CmSelectionBounds fresh;
+        double found, again;
+        if (walsh) {
+          qel::mResetBoundsAvg(700, fresh);
+          found = qel::mFinderAvg(cx.index, x.data(), cx.cumulative, fresh, 0.0, std::nan(""), k);
+          again = qel::mFinderAvg(cx.index, x.data(), cx.cumulative, resumed, 0.0, x[0],
+                                  k - eliminated);
+          eliminated = qel::mGetEliminatedAvg(cx.cumulative, resumed);
+        } else {
+          qel::mResetBoundsDiff(700, 520, fresh);
+          found = qel::mFinderDiff(cx.index, x.data(), cx.cumulative, cy.index, y.data(),
+                                   cy.cumulative, fresh, 0.0, std::nan(""), k);
+          again = qel::mFinderDiff(cx.index, x.data(), cx.cumulative, cy.index, y.data(),
+                                   cy.cumulative, resumed, 0.0, 0.0, k - eliminated);
+          eliminated = qel::mGetEliminatedDiff(cx.cumulative, cy.cumulative, resumed);
+        }
+        EXPECT_EQ(found, expected) << "walsh " << walsh << " tied " << tied << " k " << k;
+        EXPECT_EQ(again, expected) << "resumed, walsh " << walsh << " tied " << tied << " k " << k;
+      }
+    }
+  }
+}
+
+// Many rows with a tolerance and with NaN: within the tolerance of the true
+// value, and a search over NaN returns (NaN or a candidate).
+TEST(Selection, SampledPivotsWithToleranceAndNaN) {
+  std::mt19937 rng(31);
+  std::uniform_real_distribution<double> jitter(-1e-14, 1e-14);
+  std::vector<double> x = tiedSample(rng, 500, 30, 1.0);
+  for (double& v : x) v += jitter(rng);
+  const std::vector<double> averages = sortedWalshAverages(x);
+  const Compressed c = compress(x, false);
+  for (std::size_t k = 1; k <= averages.size(); k += 4999) {
+    qel::CmSelectionBounds bounds;
+    qel::mResetBoundsAvg(500, bounds);
+    const double found =
+        qel::mFinderAvg(c.index, x.data(), c.cumulative, bounds, 1e-12, std::nan(""), double(k));
+    EXPECT_NEAR(found, averages[k - 1], 1e-12) << k;
+  }
+  for (int i = 0; i < 500; i += 11) x[i] = std::nan("");
+  const Compressed withNaN = compress(x, false);
+  for (double k : {1.0, 3000.0, 60000.0, 125000.0}) {
+    qel::CmSelectionBounds bounds;
+    qel::mResetBoundsAvg(500, bounds);
+    const double found =
+        qel::mFinderAvg(withNaN.index, x.data(), withNaN.cumulative, bounds, 0.0, std::nan(""), k);
+    bool candidate = std::isnan(found);
+    for (int i = 0; i < 500 && !candidate; ++i) {
+      for (int j = i; j < 500 && !candidate; ++j) candidate = (x[i] + x[j]) * 0.5 == found;
+    }
+    EXPECT_TRUE(candidate) << found;
+  }
+}
+
+}  // namespace

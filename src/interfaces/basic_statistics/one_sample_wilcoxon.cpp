@@ -3,6 +3,7 @@
 // them, by the selection of Monahan (1984, ACM TOMS Algorithm 616); the
 // statistic counts the Walsh sums above twice the hypothesised value, which
 // equals the sum of the positive signed ranks (Tukey's identity).
+#include <omp.h>
 #include <qel/sign_tests.h>
 
 #include <algorithm>
@@ -165,13 +166,33 @@ int RunLynOneSampleWilcoxon(OneSampleWilcoxon* record, double const* x, double c
   fresh.n = record->n;
   *record = fresh;
   if (!validType(type)) return qelFailBadEnumValue;
-  try {
-    intervalAndEstimate(record, x, fresh.n, confidence, type);
-    signedRankTest(record, x, fresh.n, alternative, mu0);
-  } catch (std::bad_alloc const&) {
-    return qelFailOutOfMemory;
+  // The interval and the test read the same sample and write disjoint
+  // fields of the record: two independent sections. No exception may leave
+  // a parallel region, so a failed allocation is counted instead.
+  int failures = 0;
+#pragma omp parallel sections reduction(+ : failures) if (!omp_in_parallel())
+  {
+#pragma omp section
+    {
+      try {
+        intervalAndEstimate(record, x, fresh.n, confidence, type);
+      } catch (std::bad_alloc const&) {
+        ++failures;
+      }
+    }
+#pragma omp section
+    {
+      try {
+        signedRankTest(record, x, fresh.n, alternative, mu0);
+      } catch (std::bad_alloc const&) {
+        ++failures;
+      }
+    }
   }
-  return qelOk;
+  if (failures == 0) return qelOk;
+  // Half a record would pass for a result: leave none.
+  *record = fresh;
+  return qelFailOutOfMemory;
 }
 
 }  // namespace v0
