@@ -161,6 +161,31 @@ run(0 "^n 3\nmean 0\\.58333333333333[0-9]*\nstddev 0\\.38188130791298[0-9]*\nvar
 run(2 "^$" summary)
 run(2 "^$" summary ${WORK}/qelcalc_bad.txt)
 run(2 "^$" summary ${WORK}/qelcalc_summary.txt --upper 1)
+# table: a two-way table of counts, one row a line. The values are R's
+# chisq.test(matrix(c(12, 3, 5, 9), 2), correct = FALSE) and fisher.test,
+# and gamma = (108 - 15) / (108 + 15) from the pair counts.
+file(WRITE ${WORK}/qelcalc_table.txt "12 5\n\n3 9\n")
+file(WRITE ${WORK}/qelcalc_table3.txt "20 15 30\n25 10 8\n")
+file(WRITE ${WORK}/qelcalc_ragged.txt "1 2 3\n4 5\n")
+file(WRITE ${WORK}/qelcalc_negative.txt "1 2\n-4 5\n")
+run(0 "^chisq 5\\.854831932773[0-9]*\nchisq_df 1\nchisq_p 0\\.0155343414[0-9]*\n$"
+    table ${WORK}/qelcalc_table.txt)
+run(0 "^fisher_p 0\\.025327687033[0-9]*\nconcordant 108\ndiscordant 15\ntied 283\npairs 406\nsomers_d_rows 0\\.44285714285714[0-9]*\nsomers_d_columns 0\\.4558823529411[0-9]*\ngamma 0\\.7560975609756[0-9]*\n"
+    table ${WORK}/qelcalc_table.txt --want concordance,fisher)
+run(0 "^expected 1 8\\.79310344827586[0-9]* 8\\.2068965517241[0-9]*\nexpected 2 6\\.2068965517241[0-9]* 5\\.7931034482758[0-9]*\ntotal 29\n$"
+    table ${WORK}/qelcalc_table.txt --want expected,total)
+# From standard input (qelcalc_input.txt: a table of one column).
+run(0 "^row_totals 0\\.25 0\\.5 1\ntotal 1\\.75\n$" table - --want rowtotals,total)
+# A 2 x 3 table: chi-square on 2 degrees of freedom; Fisher's test needs 2 x 2.
+run(0 "^chisq 10\\.235646360982[0-9]*\nchisq_df 2\nchisq_p 0\\.0059890457[0-9]*\nfisher_p NaN\n$"
+    table ${WORK}/qelcalc_table3.txt --want chisq,fisher)
+run(2 "^$" table ${WORK}/qelcalc_ragged.txt)
+run(2 "^$" table ${WORK}/qelcalc_negative.txt)
+run(2 "^$" table ${WORK}/qelcalc_bad.txt)
+run(2 "^$" table ${WORK}/no_such_file.txt)
+run(2 "^$" table ${WORK}/qelcalc_table.txt --want chisq,sideways)
+run(2 "^$" table ${WORK}/qelcalc_table.txt --upper 1)
+run(2 "^$" table)
 # test with the distribution-free tests: values from R for the table below
 # (tools/reference/gen_qelcalc_rank_tests.R prints them).
 file(WRITE ${WORK}/qelcalc_groups.csv "a,b,c\n1.83,0.878,2.1\n0.5,0.647,3.3\n1.62,0.598,2.9\n2.48,2.05,4.0\n1.68,1.06,1.9\n1.88,1.29,3.6\n1.55,1.06,\n3.06,3.14,\n1.3,1.29,\n")

@@ -14,6 +14,7 @@
 #include "rank_test_mode.h"
 #include "sample_mode.h"
 #include "summary_mode.h"
+#include "table_mode.h"
 #include "ttest_mode.h"
 
 namespace {
@@ -29,6 +30,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printRankTestUsage(out);
   qelcalc::printFitUsage(out);
   qelcalc::printSummaryUsage(out);
+  qelcalc::printTableUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -55,6 +57,7 @@ int main(int argc, char** argv) {
     if (mode == "fit") return qelcalc::runFitMode(argc, argv, std::cout);
     if (mode == "summary") return qelcalc::runSummaryMode(argc, argv, std::cout);
     if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
+    if (mode == "table") return qelcalc::runTableMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

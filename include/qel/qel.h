@@ -3,6 +3,7 @@
 #define QEL_QEL_H
 
 #include <qel/basic_types.h>
+#include <qel/contingency_table.h>
 #include <qel/descriptive.h>
 #include <qel/distributions.h>
 #include <qel/location_tests.h>

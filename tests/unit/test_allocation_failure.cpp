@@ -4,6 +4,7 @@
 // next allocation fail.
 #include <gtest/gtest.h>
 #include <qel/basic_types.h>
+#include <qel/contingency_table.h>
 #include <qel/descriptive.h>
 #include <qel/fits.h>
 #include <qel/location_tests.h>
@@ -40,6 +41,28 @@ void operator delete(void* p) noexcept {
   std::free(p);
 }
 void operator delete(void* p, std::size_t) noexcept {
+  std::free(p);
+}
+// The array and no-throw forms too: the sanitizer runtime would otherwise
+// serve them itself, without the replacement's failure, and its memory would
+// then reach the free() of the deletes here.
+void* operator new[](std::size_t size) {
+  return operator new(size);
+}
+void* operator new(std::size_t size, std::nothrow_t const&) noexcept {
+  try {
+    return operator new(size);
+  } catch (std::bad_alloc const&) {
+    return nullptr;
+  }
+}
+void* operator new[](std::size_t size, std::nothrow_t const&) noexcept {
+  return operator new(size, std::nothrow);
+}
+void operator delete[](void* p) noexcept {
+  std::free(p);
+}
+void operator delete[](void* p, std::size_t) noexcept {
   std::free(p);
 }
 #pragma GCC diagnostic pop
@@ -351,6 +374,53 @@ TEST(AllocationFailure, SignAndWilcoxonReportOutOfMemory) {
       [&](int k) { EXPECT_TRUE(std::isnan(wilcoxon.pValue)) << "allocation " << k; });
   EXPECT_GT(allocations, 1);
   EXPECT_EQ(wilcoxon.W, 53.0);  // V of R's wilcox.test(x - 1)
+}
+
+}  // namespace
+
+namespace {
+
+// Every allocation of MakeIContingencyTable in turn fails: a null table and
+// 30001, never a half-made object. Then every allocation of Analyze: 30001,
+// kept by the object for later passes.
+TEST(AllocationFailure, ContingencyTableReportsOutOfMemory) {
+  qel::IContingencyTable* t = nullptr;
+  const int made = failEachAllocation(
+      [&] {
+        int code = -1;
+        t = qel::MakeIContingencyTable(3, 3, 0xFFFFFF, &code);
+        return code;
+      },
+      [&](int k) { EXPECT_EQ(t, nullptr) << "allocation " << k; });
+  qel::DeleteIContingencyTable(&t);
+  EXPECT_GE(made, 3);  // the object, the observed array, a result array
+
+  double counts[9] = {4, 2, 1, 3, 5, 2, 1, 2, 6};
+  double pearson[3], concordance[9], goodmanKruskal[4], spearman;
+  auto prepare = [&] {
+    int code = -1;
+    qel::IContingencyTable* table = qel::MakeIContingencyTable(3, 3, 0xFFFFFF & ~0x1u, &code);
+    for (unsigned c = 0; c < 3; ++c) table->SetupObservedCounts(counts + 3 * c, c);
+    table->SetupPearsonChisquareTest(pearson);
+    table->SetupMeasuresOfConcordance(concordance);
+    table->SetupGoodmanKruskal(goodmanKruskal);
+    table->SetupSpearmanRho(&spearman);
+    return table;
+  };
+  // The tables are made outside the counted runs, so that only Analyze's
+  // own allocations fail.
+  t = prepare();
+  const int analyzed = failEachAllocation([&] { return t->Analyze(); },
+                                          [&](int k) {
+                                            EXPECT_EQ(t->Analyze(), qel::qelFailOutOfMemory)
+                                                << "the code is kept, " << k;
+                                            qel::DeleteIContingencyTable(&t);
+                                            t = prepare();
+                                          });
+  EXPECT_EQ(pearson[1], 4.0);
+  qel::DeleteIContingencyTable(&t);
+  // Temporary totals, expected counts and the scratch of three sections.
+  EXPECT_GE(analyzed, 4);
 }
 
 }  // namespace
