@@ -7,7 +7,9 @@ c = 2 (df/2)^(df/2)/Gamma(df/2) * sqrt(df/(2 pi)). In the coordinates
 s = y - x w (region s <= -d) and w, the exponent is -(df/2) psi~(w; s) with
   psi~ = (s + x w)^2 + w^2 - ln(w^2).
 For fixed s the inner integral over w is of Laplace type, with its stationary
-point w*(s) the root of (1 + x^2) w^2 + x s w... at s = -d:
+point w*(s) the root of x (s + x w) + w - 1/w = 0; at s = -d (the boundary
+point nearest in the exponent) that is the stationary point of
+u^2 + r^2 - ln(r^2) with u = d - x r:
   (1 + x^2) r^2 - x d r - 1 = 0,
   r = (x d + sqrt(x^2 d^2 + 4 (1 + x^2)))/(2 (1 + x^2)).
 The outer variable is eta = sqrt(psi(s)), psi(s) = min_w psi~ - 1, so that
