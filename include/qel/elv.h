@@ -124,9 +124,11 @@ QEL_API void t_ncdf(double t, double df, double delta, double* lower, double* up
 /* Complementary Owen's T: the integral from h to infinity of phi(x) Q(a x),
  * a > 0; returns 0 or 4. */
 QEL_API int Tha_c(double* out, double h, double a);
-/* Far lower tail of the noncentral t at t < 0 < delta, integrated around
- * its saddle point; -1 for arguments outside df in (0, 189812530],
- * finite t and |delta| below 1e6. */
+/* Far lower tail of the noncentral t at t < 0 < delta by the closed
+ * saddle-point expansion to order 1/df (relative error about 1e-4 at
+ * df = 10, falling like df^-2); 0 where the boundary does not lie beyond
+ * the mode (no lower tail to describe); -1 for arguments outside df in
+ * (0, 189812530], finite t and |delta| below 1e6. */
 QEL_API double t_saddle_approx(double t, double df, double delta);
 /* Far lower tail of the noncentral t at t < 0 for the integer part m of df
  * in 1..12, by a four-term expansion in m/(m + t^2); -1 with ELVerrno 4 for

@@ -8,6 +8,8 @@
 #include <exception>
 #include <limits>
 
+#include "utilities/ELVtInternal.h"
+
 namespace {
 
 constexpr double kNaN = std::numeric_limits<double>::quiet_NaN();
@@ -28,6 +30,8 @@ TEST(ElvNormalTFamily, BadArgumentsDoNotTrapWhenArmed) {
         Tha_c(&a, u, v);
         a = t_saddle_approx(u, v, 2.0);
         a = t_saddle_approx(-1.0, u, v);
+        a = t_saddle_approx(u, 1e6, v);
+        a = qel::elv::t_saddle_integral(u, v, 2.0);
         a = t_expansion_approx(u, 3.0, v);
         a = t_expansion_approx(u, v, 2.0);
         hypergeo_df(3, 10, 4, 5, &a, &b, &c);
