@@ -44,14 +44,16 @@ double parseNumber(const std::string& text, const std::string& what) {
   return value;
 }
 
+std::istream& openInput(const std::string& path, std::ifstream& file) {
+  if (path == "-") return std::cin;
+  file.open(path);
+  if (!file) throw UsageError("cannot read file '" + path + "'");
+  return file;
+}
+
 std::vector<double> readNumbers(const std::string& path) {
   std::ifstream file;
-  std::istream* in = &std::cin;
-  if (path != "-") {
-    file.open(path);
-    if (!file) throw UsageError("cannot read file '" + path + "'");
-    in = &file;
-  }
+  std::istream* in = &openInput(path, file);
   std::vector<double> values;
   std::string line;
   unsigned long lineNumber = 0;

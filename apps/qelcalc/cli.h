@@ -2,6 +2,8 @@
 #ifndef QELCALC_CLI_H
 #define QELCALC_CLI_H
 
+#include <fstream>
+#include <istream>
 #include <map>
 #include <stdexcept>
 #include <string>
@@ -32,6 +34,10 @@ double parseNumber(const std::string& text, const std::string& what);
 // Reads one number per line (blank lines skipped) from a file, or from
 // standard input when path is "-".
 std::vector<double> readNumbers(const std::string& path);
+
+// The stream to read: the file at path, opened into file, or standard input
+// for "-". An unreadable file is a UsageError.
+std::istream& openInput(const std::string& path, std::ifstream& file);
 
 // Formats a result with 17 significant digits, NaN as "NaN".
 std::string formatNumber(double value);

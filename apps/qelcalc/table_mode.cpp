@@ -32,12 +32,7 @@ struct Table {
 
 Table readTable(const std::string& path) {
   std::ifstream file;
-  std::istream* in = &std::cin;
-  if (path != "-") {
-    file.open(path);
-    if (!file) throw UsageError("cannot read file '" + path + "'");
-    in = &file;
-  }
+  std::istream* in = &openInput(path, file);
   std::vector<std::vector<double>> byRow;
   std::string text;
   int lineNumber = 0;

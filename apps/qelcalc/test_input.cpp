@@ -87,12 +87,7 @@ bool isNumber(const std::string& text) {
 
 std::vector<TableRow> readTableRows(const std::string& path) {
   std::ifstream file;
-  std::istream* in = &std::cin;
-  if (path != "-") {
-    file.open(path);
-    if (!file) throw UsageError("cannot read file '" + path + "'");
-    in = &file;
-  }
+  std::istream* in = &openInput(path, file);
   std::vector<TableRow> rows;
   std::string text;
   int lineNumber = 0;
