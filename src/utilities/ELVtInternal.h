@@ -9,12 +9,17 @@ namespace elv {
 // df; 0, or 4 when Owen's T failed or the result is exactly -1.
 int owenLowerTail(double t, double df, double delta, double* lower);
 
-// Beyond this |t| the saddle forms answer 0 or 1 (t squared would overflow).
-constexpr double kSaddleMaxT = 1e140;
+// The start shared by the saddle forms: x = t/sqrt(df), d = delta/sqrt(df)
+// and the saddle r = (x d + sqrt(x^2 d^2 + 4(1 + x^2)))/(2(1 + x^2)).
+struct SaddleStart {
+  double sqrtDf, x, d, onePlus, r;
+};
 
-// The argument check shared by the saddle forms: df in (0, kMaxDf], finite
-// t, |delta| below 1e6, no NaN.
-bool saddleArgumentsValid(double t, double df, double delta);
+// Fills *start and returns false, or returns true with the whole answer in
+// *answer: -1 for refused arguments (NaN, df outside (0, kMaxDf], |t| not
+// finite, |delta| of 1e6 or more), 0 or 1 beyond |t| = 1e140, where t
+// squared would overflow. Sets the three step counters to 0.
+bool saddleShortcut(double t, double df, double delta, SaddleStart* start, double* answer);
 
 // Lower tail of the noncentral t by the integral around its saddle point
 // (relative error about 1e-13); -1 for arguments the check refuses.

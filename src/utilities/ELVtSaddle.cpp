@@ -78,21 +78,33 @@ double panel(const Integrand& f, double from, double to) {
 namespace qel {
 namespace elv {
 
-bool saddleArgumentsValid(double t, double df, double delta) {
-  return !anyNan(t, df, delta) && df > 0.0 && df <= kMaxDf && std::fabs(t) < kHuge &&
-         std::fabs(delta) < 1e6;
+bool saddleShortcut(double t, double df, double delta, SaddleStart* start, double* answer) {
+  ELVsteps1 = ELVsteps2 = ELVsteps3 = 0;
+  if (anyNan(t, df, delta) || !(df > 0.0 && df <= kMaxDf) || !(std::fabs(t) < kHuge) ||
+      !(std::fabs(delta) < 1e6)) {
+    *answer = -1.0;
+    return true;
+  }
+  // Beyond this |t| (where the noncentral routine answers 0 or 1 outright)
+  // the squares below would overflow.
+  if (std::fabs(t) > 1e140) {
+    *answer = t < 0.0 ? 0.0 : 1.0;
+    return true;
+  }
+  start->sqrtDf = std::sqrt(df);
+  start->x = t / start->sqrtDf;
+  start->d = delta / start->sqrtDf;
+  start->onePlus = 1.0 + start->x * start->x;
+  const double x = start->x, d = start->d;
+  start->r = (x * d + std::sqrt(x * x * d * d + 4.0 * start->onePlus)) / (2.0 * start->onePlus);
+  return false;
 }
 
 double t_saddle_integral(double t, double df, double delta) {
-  ELVsteps1 = ELVsteps2 = ELVsteps3 = 0;
-  if (!saddleArgumentsValid(t, df, delta)) return -1.0;
-  // Beyond this |t| (where the noncentral routine answers 0 or 1 outright)
-  // the squares below would overflow.
-  if (std::fabs(t) > kSaddleMaxT) return t < 0.0 ? 0.0 : 1.0;
-  const double sqrtDf = std::sqrt(df);
-  const double x = t / sqrtDf, d = delta / sqrtDf;
-  const double onePlus = 1.0 + x * x;
-  const double r = (x * d + std::sqrt(x * x * d * d + 4.0 * onePlus)) / (2.0 * onePlus);
+  SaddleStart s;
+  double answer;
+  if (saddleShortcut(t, df, delta, &s, &answer)) return answer;
+  const double x = s.x, d = s.d, onePlus = s.onePlus, r = s.r;
   Integrand f{df, x, d, 0.0};
   const double centre = std::log(r);
   f.logScale = f.logValue(centre);

@@ -92,13 +92,10 @@ Coefficients coefficients(double p, double r, double u, double W) {
 extern "C" {
 
 double t_saddle_approx(double t, double df, double delta) {
-  ELVsteps1 = ELVsteps2 = ELVsteps3 = 0;
-  if (!saddleArgumentsValid(t, df, delta)) return -1.0;
-  if (std::fabs(t) > kSaddleMaxT) return t < 0.0 ? 0.0 : 1.0;
-  const double sqrtDf = std::sqrt(df);
-  const double x = t / sqrtDf, d = delta / sqrtDf;
-  const double onePlus = 1.0 + x * x;
-  const double r = (x * d + std::sqrt(x * x * d * d + 4.0 * onePlus)) / (2.0 * onePlus);
+  SaddleStart s;
+  double answer;
+  if (saddleShortcut(t, df, delta, &s, &answer)) return answer;
+  const double sqrtDf = s.sqrtDf, x = s.x, d = s.d, r = s.r;
   const double u = d - x * r;
   // The end point must lie beyond the mode of (W, Y), on the side of the
   // lower tail (u > 0): for t >= 0 with small delta, or delta <= 0, the
