@@ -15,7 +15,7 @@
 #include <boost/math/special_functions/gamma.hpp>
 #include <vector>
 
-#include "utilities/Distributions.h"
+#include "utilities/distributions/kernels.h"
 
 namespace {
 

@@ -8,8 +8,8 @@
 #include <cmath>
 #include <vector>
 
-#include "utilities/IncompleteBeta.h"
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/incomplete_beta.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace {
 

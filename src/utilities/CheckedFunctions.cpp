@@ -4,7 +4,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/Transcendental.h"
+#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 

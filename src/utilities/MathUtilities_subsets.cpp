@@ -2,7 +2,7 @@
 #include <cmath>
 
 #include "utilities/MathUtilities.h"
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 

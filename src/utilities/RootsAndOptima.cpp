@@ -14,7 +14,7 @@
 #include <cmath>
 
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/Transcendental.h"
+#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 

@@ -7,7 +7,7 @@
 #include <string>
 
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/Transcendental.h"
+#include "utilities/CheckedFunctions.h"
 
 namespace {
 

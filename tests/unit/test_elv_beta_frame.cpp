@@ -11,7 +11,7 @@
 #include <stdexcept>
 #include <string>
 
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/wrappers.h"
 
 namespace {
 

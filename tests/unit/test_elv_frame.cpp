@@ -10,7 +10,7 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/wrappers.h"
 
 namespace {
 

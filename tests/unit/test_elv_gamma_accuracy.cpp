@@ -19,7 +19,7 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/wrappers.h"
 
 namespace {
 

@@ -9,7 +9,7 @@
 #include <cmath>
 #include <limits>
 
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/wrappers.h"
 
 namespace {
 

@@ -7,7 +7,7 @@
 
 #include <cmath>
 
-#include "utilities/ELVmixture.h"
+#include "utilities/elv/mixture.h"
 
 namespace {
 

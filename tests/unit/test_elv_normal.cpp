@@ -11,7 +11,7 @@
 #include <cstring>
 
 #include "reference_data.h"
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/wrappers.h"
 
 namespace {
 

@@ -8,7 +8,7 @@
 #include <exception>
 #include <limits>
 
-#include "utilities/ELVtInternal.h"
+#include "utilities/elv/t_internal.h"
 
 namespace {
 

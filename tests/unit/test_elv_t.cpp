@@ -13,8 +13,8 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/ELVtInternal.h"
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/t_internal.h"
+#include "utilities/elv/wrappers.h"
 
 namespace {
 

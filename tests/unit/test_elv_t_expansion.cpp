@@ -13,7 +13,7 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/wrappers.h"
 
 namespace {
 

@@ -14,7 +14,7 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/ELVtInternal.h"
+#include "utilities/elv/t_internal.h"
 
 namespace {
 

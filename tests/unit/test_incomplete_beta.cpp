@@ -8,9 +8,9 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/IncompleteBeta.h"
+#include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace {
 

@@ -12,7 +12,7 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/Distributions.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace {

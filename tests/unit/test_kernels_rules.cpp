@@ -6,7 +6,7 @@
 #include <cmath>
 #include <map>
 
-#include "utilities/Distributions.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace {

@@ -15,8 +15,8 @@
 #include <string>
 #include <vector>
 
-#include "utilities/DistributionClasses.h"
-#include "utilities/Distributions.h"
+#include "utilities/distributions/classes.h"
+#include "utilities/distributions/kernels.h"
 
 namespace {
 

@@ -17,8 +17,8 @@
 #include "fpu_state.h"
 #include "interfaces/math/rngs.h"
 #include "interfaces/math/rngs_sampling.h"
-#include "utilities/DistributionClasses.h"
-#include "utilities/Distributions.h"
+#include "utilities/distributions/classes.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace {

@@ -12,8 +12,8 @@
 #include <vector>
 
 #include "reference_data.h"
-#include "utilities/IncompleteBeta.h"
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/incomplete_beta.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace {
 

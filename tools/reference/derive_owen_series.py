@@ -1,5 +1,5 @@
 #!/usr/bin/python3
-"""Derivation check of the two series behind Tha_c (src/utilities/ELVowen.cpp).
+"""Derivation check of the two series behind Tha_c (src/utilities/elv/owen.cpp).
 
 Tha_c(h, a) = integral from h to infinity of phi(x) Q(a x) dx, h >= 0, a > 0.
 With T(h, inf) = Q(h)/2 and dT/da = exp(-h^2 (1 + a^2)/2) / (2 pi (1 + a^2)),

@@ -1,7 +1,7 @@
 #!/usr/bin/env python3
 """Derives the coefficient tables of the far-tail expansion of the noncentral
 t lower tail (t_expansion_approx) for integer degrees of freedom m = 1..12,
-writes them as src/utilities/ELVtExpansionTable.inc, and checks the truncated
+writes them as src/utilities/elv/t_expansion_table.inc, and checks the truncated
 expansion against the lower tail integrated by mpmath.
 
 Derivation. For T = (Z + delta)/sqrt(V/m) the density is
@@ -54,7 +54,7 @@ HERE = os.path.dirname(os.path.abspath(__file__))
 sys.path.insert(0, HERE)
 from gen_elv_t_noncentral import tail  # noqa: E402
 
-OUT = os.path.join(HERE, "..", "..", "src", "utilities", "ELVtExpansionTable.inc")
+OUT = os.path.join(HERE, "..", "..", "src", "utilities", "elv", "t_expansion_table.inc")
 TERMS = 4  # A(0) .. A(3)
 MAX_M = 12
 

@@ -5,7 +5,7 @@
 #include <qel/distributions.h>
 
 #include "interfaces/math/frames.h"
-#include "utilities/Distributions.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 

@@ -7,7 +7,7 @@
 
 #include <map>
 
-#include "utilities/Distributions.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 

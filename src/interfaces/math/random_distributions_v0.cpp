@@ -3,7 +3,7 @@
 #include <cmath>
 
 #include "interfaces/math/frames.h"
-#include "utilities/Distributions.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace qel {

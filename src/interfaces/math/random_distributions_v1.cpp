@@ -5,8 +5,8 @@
 #include <limits>
 
 #include "interfaces/math/transcendental_v1.h"
-#include "utilities/ELVwrappers.h"
-#include "utilities/IncompleteBeta.h"
+#include "utilities/elv/wrappers.h"
+#include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
 

@@ -10,7 +10,7 @@
 
 #include "interfaces/math/random_distributions_v1.h"
 #include "interfaces/math/rngs_sampling.h"
-#include "utilities/DistributionClasses.h"
+#include "utilities/distributions/classes.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace qel {

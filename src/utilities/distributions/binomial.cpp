@@ -12,13 +12,13 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/Distributions.h"
-#include "utilities/Distributions_discrete_rules.h"
-#include "utilities/ELVwrappers.h"
-#include "utilities/IncompleteBeta.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/elv/wrappers.h"
+#include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/Transcendental.h"
+#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 

@@ -1,6 +1,6 @@
 // Distribution objects: a family with its parameters held, a validity test,
 // bounds and support for graphs, density, tails and quantile forwarded to the
-// kernels of Distributions.h, and random variates drawn from a borrowed
+// kernels of kernels.h, and random variates drawn from a borrowed
 // CmUniformGenerator.
 //
 // The variate algorithm of each family is fixed (it decides which stream of

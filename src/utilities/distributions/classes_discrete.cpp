@@ -12,8 +12,8 @@
 #include <new>
 #include <stdexcept>
 
-#include "utilities/DistributionClasses.h"
-#include "utilities/Distributions.h"
+#include "utilities/distributions/classes.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
 

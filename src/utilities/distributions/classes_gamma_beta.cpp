@@ -13,12 +13,12 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/DistributionClasses.h"
-#include "utilities/Distributions.h"
-#include "utilities/IncompleteBeta.h"
+#include "utilities/distributions/classes.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 

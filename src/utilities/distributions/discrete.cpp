@@ -3,8 +3,8 @@
 #include <cmath>
 #include <map>
 
-#include "utilities/Distributions.h"
-#include "utilities/Distributions_discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/discrete_rules.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace qel {

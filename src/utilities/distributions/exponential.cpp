@@ -8,11 +8,11 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/Distributions.h"
-#include "utilities/ELVwrappers.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/Transcendental.h"
+#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 

@@ -8,11 +8,11 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/Distributions.h"
-#include "utilities/Distributions_pvalue.h"
-#include "utilities/ELVwrappers.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/pvalue.h"
+#include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 

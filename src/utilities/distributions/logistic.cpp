@@ -6,10 +6,10 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/Distributions.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/Transcendental.h"
+#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 

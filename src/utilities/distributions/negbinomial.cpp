@@ -10,11 +10,11 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/Distributions.h"
-#include "utilities/Distributions_discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/discrete_rules.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 

@@ -7,11 +7,11 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/Distributions.h"
-#include "utilities/Distributions_discrete_rules.h"
-#include "utilities/ELVwrappers.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 

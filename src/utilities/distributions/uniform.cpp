@@ -1,5 +1,5 @@
 // Continuous uniform distribution on [lower, upper].
-#include "utilities/Distributions.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 

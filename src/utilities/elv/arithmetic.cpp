@@ -11,7 +11,7 @@
 #include <cerrno>
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
+#include "utilities/elv/limits.h"
 
 namespace {
 

@@ -13,8 +13,8 @@
 #include <stdexcept>
 #include <utility>
 
-#include "utilities/ELVlimits.h"
-#include "utilities/ELVmixture.h"
+#include "utilities/elv/limits.h"
+#include "utilities/elv/mixture.h"
 
 namespace {
 

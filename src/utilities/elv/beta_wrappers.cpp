@@ -1,10 +1,10 @@
 // Forwarding wrappers of the beta, F and binomial ELV routines (see
-// ELVwrappers.h): each calls its routine and answers the routine's status.
+// wrappers.h): each calls its routine and answers the routine's status.
 #include <qel/elv.h>
 
 #include <climits>
 
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/wrappers.h"
 
 namespace qel {
 

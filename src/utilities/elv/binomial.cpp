@@ -13,7 +13,7 @@
 #include <cmath>
 #include <utility>
 
-#include "utilities/ELVlimits.h"
+#include "utilities/elv/limits.h"
 
 namespace {
 

@@ -8,8 +8,8 @@
 #include <cmath>
 #include <utility>
 
-#include "utilities/ELVlimits.h"
-#include "utilities/ELVmixture.h"
+#include "utilities/elv/limits.h"
+#include "utilities/elv/mixture.h"
 
 namespace {
 

@@ -13,7 +13,7 @@
 #include <algorithm>
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
+#include "utilities/elv/limits.h"
 
 namespace {
 

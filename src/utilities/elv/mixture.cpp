@@ -1,11 +1,11 @@
-// Two-stage Poisson-mixture sums (see ELVmixture.h).
-#include "utilities/ELVmixture.h"
+// Two-stage Poisson-mixture sums (see mixture.h).
+#include "utilities/elv/mixture.h"
 
 #include <qel/elv.h>
 
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
+#include "utilities/elv/limits.h"
 
 namespace qel {
 namespace elv {

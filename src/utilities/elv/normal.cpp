@@ -2,10 +2,10 @@
 // computed: the smaller one directly as erfc(|x|/sqrt 2)/2, where erfc(z) is
 // the upper tail of the gamma law of shape 1/2 at z^2, and the larger as its
 // complement. The inverse over the whole open interval rides on the upper
-// quantile of ELVnormalQuantile.cpp.
+// quantile of normal_quantile.cpp.
 #include <qel/elv.h>
 
-#include "utilities/ELVlimits.h"
+#include "utilities/elv/limits.h"
 
 namespace {
 

@@ -6,7 +6,7 @@
 #include <cerrno>
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
+#include "utilities/elv/limits.h"
 
 namespace {
 

@@ -37,8 +37,8 @@
 #include <array>
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
-#include "utilities/ELVtInternal.h"
+#include "utilities/elv/limits.h"
+#include "utilities/elv/t_internal.h"
 
 namespace {
 

@@ -9,7 +9,7 @@
 
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
+#include "utilities/elv/limits.h"
 
 namespace {
 

@@ -25,13 +25,13 @@
 
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
+#include "utilities/elv/limits.h"
 
 namespace {
 
 using namespace qel::elv;
 
-#include "utilities/ELVtExpansionTable.inc"
+#include "utilities/elv/t_expansion_table.inc"
 
 constexpr char kName[] = "t_ncdf";
 constexpr double kSqrtTwoPi = 2.5066282746310007;

@@ -20,9 +20,9 @@
 #include <cmath>
 #include <utility>
 
-#include "utilities/ELVlimits.h"
-#include "utilities/ELVmixture.h"
-#include "utilities/ELVtInternal.h"
+#include "utilities/elv/limits.h"
+#include "utilities/elv/mixture.h"
+#include "utilities/elv/t_internal.h"
 
 namespace {
 

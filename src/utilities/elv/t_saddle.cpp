@@ -20,8 +20,8 @@
 
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
-#include "utilities/ELVtInternal.h"
+#include "utilities/elv/limits.h"
+#include "utilities/elv/t_internal.h"
 
 namespace {
 

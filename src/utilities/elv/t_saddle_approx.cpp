@@ -24,8 +24,8 @@
 
 #include <cmath>
 
-#include "utilities/ELVlimits.h"
-#include "utilities/ELVtInternal.h"
+#include "utilities/elv/limits.h"
+#include "utilities/elv/t_internal.h"
 
 namespace {
 

@@ -1,5 +1,5 @@
-// Forwarding wrappers around the ELV routines (see ELVwrappers.h).
-#include "utilities/ELVwrappers.h"
+// Forwarding wrappers around the ELV routines (see wrappers.h).
+#include "utilities/elv/wrappers.h"
 
 #include <qel/elv.h>
 

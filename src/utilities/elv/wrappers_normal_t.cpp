@@ -1,8 +1,8 @@
 // Forwarding wrappers of the normal, t and hypergeometric ELV routines (see
-// ELVwrappers.h). Outputs are pointers to caller-owned values.
+// wrappers.h). Outputs are pointers to caller-owned values.
 #include <qel/elv.h>
 
-#include "utilities/ELVwrappers.h"
+#include "utilities/elv/wrappers.h"
 
 namespace qel {
 

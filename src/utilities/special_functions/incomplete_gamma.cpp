@@ -8,7 +8,7 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 

@@ -4,7 +4,7 @@
 #include <cmath>
 #include <limits>
 
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 

@@ -9,7 +9,7 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/Transcendental.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 
