@@ -94,32 +94,27 @@ TEST(ElvFrame, PerrorFormats) {
 
 // Helpers at their refused arguments: the C errno and the stated substitute.
 TEST(ElvArithmetic, RefusedArgumentsSetErrno) {
-  errno = 0;
-  EXPECT_EQ(logs(-1.5), -kHuge);
-  EXPECT_EQ(errno, 33);
-  errno = 0;
-  EXPECT_EQ(exps(710.0), -kHuge);
-  EXPECT_EQ(errno, 33);
-  errno = 0;
-  EXPECT_EQ(exps(-663.0), -kHuge);
-  EXPECT_EQ(errno, 33);
-  errno = 0;
-  EXPECT_EQ(ln_gamma(0.0), -kHuge);
-  EXPECT_EQ(errno, 33);
-  errno = 0;
-  EXPECT_EQ(ln_scaled_gamma(-1.0), kHuge);
-  EXPECT_EQ(errno, 33);
-  errno = 0;
-  EXPECT_EQ(Gamma(0.0), 0.0);  // not infinity
-  EXPECT_EQ(errno, 33);
-  errno = 0;
-  EXPECT_EQ(Gamma(172.0), kHuge);
-  EXPECT_EQ(errno, 34);
-  errno = 0;
-  EXPECT_EQ(gammod(1.5), kHuge);
-  EXPECT_EQ(errno, 33);
-  EXPECT_EQ(ln_scaled_gamma(0.0), 0.0);
-  EXPECT_EQ(Gamma(1e-17), 1e17);
+  struct Case {
+    double (*f)(double);
+    double x, result;
+    int error;
+  };
+  const Case cases[] = {{logs, -1.5, -kHuge, 33},
+                        {exps, 710.0, -kHuge, 33},
+                        {exps, -663.0, -kHuge, 33},
+                        {ln_gamma, 0.0, -kHuge, 33},
+                        {ln_scaled_gamma, -1.0, kHuge, 33},
+                        {Gamma, 0.0, 0.0, 33},
+                        {Gamma, 172.0, kHuge, 34},
+                        {gammod, 1.5, kHuge, 33},
+                        {inv_normal_df0, 1.0, -kHuge, 33},
+                        {ln_scaled_gamma, 0.0, 0.0, 0},
+                        {Gamma, 1e-17, 1e17, 0}};
+  for (const Case& c : cases) {
+    errno = 0;
+    EXPECT_EQ(c.f(c.x), c.result) << c.x;
+    EXPECT_EQ(errno, c.error) << c.x;
+  }
 }
 
 TEST(ElvArithmetic, LogsSwitchesToTheLibraryAboveOnePercent) {
