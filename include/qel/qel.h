@@ -6,6 +6,7 @@
 #include <qel/contingency_table.h>
 #include <qel/descriptive.h>
 #include <qel/distributions.h>
+#include <qel/interval.h>
 #include <qel/location_tests.h>
 #include <qel/sign_tests.h>
 #include <qel/fits.h>

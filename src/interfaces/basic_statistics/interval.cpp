@@ -38,12 +38,12 @@ int MakeTraditionalSymmetricCI(F const& inverseCdf, double confidence, IntervalT
   return qelFailBadEnumValue;
 }
 
-template int MakeTraditionalSymmetricCI<v0::NormalInvCdfFunc>(v0::NormalInvCdfFunc const&, double,
-                                                              IntervalType, double, double, double*,
-                                                              double*);
-template int MakeTraditionalSymmetricCI<v0::TInvCdfFunc>(v0::TInvCdfFunc const&, double,
-                                                         IntervalType, double, double, double*,
-                                                         double*);
+template QEL_API int MakeTraditionalSymmetricCI<v0::NormalInvCdfFunc>(v0::NormalInvCdfFunc const&,
+                                                                      double, IntervalType, double,
+                                                                      double, double*, double*);
+template QEL_API int MakeTraditionalSymmetricCI<v0::TInvCdfFunc>(v0::TInvCdfFunc const&, double,
+                                                                 IntervalType, double, double,
+                                                                 double*, double*);
 
 }  // namespace v1
 }  // namespace qel

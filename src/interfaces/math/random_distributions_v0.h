@@ -5,6 +5,7 @@
 #define QEL_SRC_INTERFACES_MATH_RANDOM_DISTRIBUTIONS_V0_H
 
 #include <qel/basic_types.h>
+#include <qel/interval.h>
 
 namespace qel {
 namespace v0 {
@@ -17,21 +18,6 @@ double TPValue(double t, double df, AlternativeHypothesis alternative);
 double NormalCritValue(double alpha, AlternativeHypothesis alternative);
 double TCritValue(double alpha, double df, AlternativeHypothesis alternative);
 double BinomialPValue(double x, unsigned n, double p, AlternativeHypothesis alternative);
-
-// Standard normal quantile as a function object, for interval makers.
-struct NormalInvCdfFunc {
-  double operator()(double p) const;
-};
-
-// Central t quantile on df degrees of freedom as a function object.
-class TInvCdfFunc {
- public:
-  explicit TInvCdfFunc(double df) : mDf(df) {}
-  double operator()(double p) const;
-
- private:
-  double mDf;
-};
 
 }  // namespace v0
 }  // namespace qel
