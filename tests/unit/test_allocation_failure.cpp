@@ -67,69 +67,88 @@ void operator delete[](void* p, std::size_t) noexcept {
 }
 #pragma GCC diagnostic pop
 
+#include <qel/summaries.h>
+
 namespace {
 
-TEST(AllocationFailure, RankAndSpearmanReportOutOfMemory) {
-  const double x[] = {3.0, 1.0, 2.0};
-  const double y[] = {1.0, 2.0, 3.0};
-  double rank[3] = {0.0, 0.0, 0.0};
+// Runs f with its first allocation failing; returns f's result.
+template <class F>
+auto failingFirstAllocation(F f) {
   failNextAllocation = true;
-  EXPECT_EQ(qel::v1::GetRank(x, 3, rank), qel::qelFailOutOfMemory);
+  const auto result = f();
   failNextAllocation = false;
-  for (double r : rank) EXPECT_TRUE(std::isnan(r));
-
-  int status = -1;
-  failNextAllocation = true;
-  EXPECT_TRUE(std::isnan(qel::v1::GetSpearmanCorrelation(x, y, 3, &status)));
-  failNextAllocation = false;
-  EXPECT_EQ(status, qel::qelFailOutOfMemory);
-
-  // With memory again, the same calls succeed.
-  EXPECT_EQ(qel::v1::GetRank(x, 3, rank), qel::qelOk);
-  EXPECT_EQ(rank[0], 3.0);
-  EXPECT_EQ(qel::v1::GetSpearmanCorrelation(x, y, 3, &status), -0.5);
-  EXPECT_EQ(status, qel::qelOk);
+  return result;
 }
 
-// The order statistics that sort a copy: the copy fails, the outputs are
-// NaN (or reset) and the code or status is 30001.
-TEST(AllocationFailure, OrderStatisticsReportOutOfMemory) {
-  const double x[] = {4.0, 1.0, 4.0, 2.0};
+bool nan(std::initializer_list<double> values) {
+  for (double v : values) {
+    if (!std::isnan(v)) return false;
+  }
+  return true;
+}
+
+constexpr int kOom = qel::qelFailOutOfMemory;
+
+// The functions that sort or rank a copy: the copy fails, the outputs are
+// NaN (or reset) and the code or status is 30001; with memory again the
+// same calls succeed.
+TEST(AllocationFailure, RanksOrderStatisticsAndSummariesReportOutOfMemory) {
+  const double x[] = {4.0, 1.0, 3.0, 3.0, 2.0}, y[] = {1.0, 2.0, 3.0, 4.0, 5.0};
   const double p[] = {0.25, 0.5};
-  double q[2] = {0.0, 0.0};
-  failNextAllocation = true;
-  EXPECT_EQ(qel::v1::GetSampleQuantiles(x, 4, 7, q, p, 2), qel::qelFailOutOfMemory);
-  failNextAllocation = false;
-  EXPECT_TRUE(std::isnan(q[0]) && std::isnan(q[1]));
-
+  double out[5] = {0, 0, 0, 0, 0};
   int status = -1;
-  failNextAllocation = true;
-  EXPECT_TRUE(std::isnan(qel::v1::GetLynTrimmedMean(x, 4, &status)));
-  failNextAllocation = false;
-  EXPECT_EQ(status, qel::qelFailOutOfMemory);
+  EXPECT_EQ(failingFirstAllocation([&] { return qel::v1::GetRank(x, 3, out); }), kOom);
+  EXPECT_TRUE(nan({out[0], out[1], out[2]}));
+  EXPECT_TRUE(std::isnan(
+      failingFirstAllocation([&] { return qel::v1::GetSpearmanCorrelation(x, y, 3, &status); })));
+  EXPECT_EQ(status, kOom);
+  EXPECT_EQ(failingFirstAllocation([&] { return qel::v1::GetSampleQuantiles(x, 4, 7, out, p, 2); }),
+            kOom);
+  EXPECT_TRUE(nan({out[0], out[1]}));
   status = -1;
-  failNextAllocation = true;
-  EXPECT_TRUE(std::isnan(qel::v1::GetTrimmedMean(x, 4, 0.25, &status)));
-  failNextAllocation = false;
-  EXPECT_EQ(status, qel::qelFailOutOfMemory);
-
-  double modes[2] = {0.0, 0.0};
+  EXPECT_TRUE(std::isnan(
+      failingFirstAllocation([&] { return qel::v1::GetLynTrimmedMean(x, 4, &status); })));
+  EXPECT_EQ(status, kOom);
+  status = -1;
+  EXPECT_TRUE(std::isnan(
+      failingFirstAllocation([&] { return qel::v1::GetTrimmedMean(x, 4, 0.25, &status); })));
+  EXPECT_EQ(status, kOom);
   unsigned count = 9, frequency = 9;
-  failNextAllocation = true;
-  EXPECT_EQ(qel::v1::GetMode(x, 4, modes, 2, &count, &frequency), qel::qelFailOutOfMemory);
-  failNextAllocation = false;
-  EXPECT_TRUE(std::isnan(modes[0]) && std::isnan(modes[1]));
-  EXPECT_EQ(count, 0u);
-  EXPECT_EQ(frequency, 0u);
+  EXPECT_EQ(
+      failingFirstAllocation([&] { return qel::v1::GetMode(x, 4, out, 2, &count, &frequency); }),
+      kOom);
+  EXPECT_TRUE(nan({out[0], out[1]}) && count == 0u && frequency == 0u);
 
-  // With memory again, the same calls succeed.
-  EXPECT_EQ(qel::v1::GetSampleQuantiles(x, 4, 7, q, p, 2), qel::qelOk);
-  EXPECT_EQ(q[1], 3.0);
+  qel::v1::LynBoxplotHelper box;
+  box.mean = 0.0;
+  EXPECT_EQ(failingFirstAllocation([&] { return qel::v1::RunLynBoxplotHelper(&box, 0.9, x, 5); }),
+            kOom);
+  EXPECT_TRUE(nan({box.minimum, box.maximum, box.firstQuartile, box.median, box.thirdQuartile,
+                   box.medianLowerLimit, box.medianUpperLimit, box.lowerHinge, box.upperHinge,
+                   box.mean, box.standardDeviation}));
+  qel::v1::SecondSampleMoments moments;
+  moments.n = 5;
+  qel::v1::FiveNumberSummary five;
+  EXPECT_EQ(failingFirstAllocation([&] {
+              return qel::v1::GetLyn2013ExtendedSummary(&moments, &five, out, &count, &frequency,
+                                                        x);
+            }),
+            kOom);
+  EXPECT_TRUE(nan({five.median, out[0]}) && count == 0u);
+  EXPECT_EQ(moments.mean, 2.6);  // the moments need no scratch
+  five.median = 0.0;
+  EXPECT_EQ(failingFirstAllocation([&] { return qel::v1::GetLynFiveNumberSummary(&five, x, 5); }),
+            kOom);
+  EXPECT_EQ(five.median, 0.0);  // written only on success
+
+  EXPECT_EQ(qel::v1::GetRank(x, 3, out), qel::qelOk);
+  EXPECT_EQ(out[0], 3.0);
+  EXPECT_EQ(qel::v1::GetSpearmanCorrelation(x, y, 3, &status), -0.5);
   EXPECT_EQ(qel::v1::GetTrimmedMean(x, 4, 0.25, &status), 3.0);
-  EXPECT_EQ(status, qel::qelOk);
-  EXPECT_EQ(qel::v1::GetMode(x, 4, modes, 2, &count, &frequency), qel::qelOk);
-  EXPECT_EQ(modes[0], 4.0);
-  EXPECT_EQ(count, 1u);
+  EXPECT_EQ(qel::v1::GetMode(x, 5, out, 2, &count, &frequency), qel::qelOk);
+  EXPECT_EQ(out[0], 3.0);
+  EXPECT_EQ(qel::v1::RunLynBoxplotHelper(&box, 0.9, x, 5), qel::qelOk);
+  EXPECT_EQ(box.median, 3.0);
 }
 
 TEST(AllocationFailure, PairedTStopsAfterTheColumnSummaries) {
@@ -137,17 +156,15 @@ TEST(AllocationFailure, PairedTStopsAfterTheColumnSummaries) {
   const double y[] = {1.0, 2.0, 2.0};
   qel::v0::PairedT record;
   record.n = 3;
-  failNextAllocation = true;
-  EXPECT_EQ(qel::v0::RunPairedT(&record, x, y, 0.95, qel::kIntervalTwoSided,
-                                qel::kAlternativeNotEqual, 0.0),
-            qel::qelFailOutOfMemory);
-  failNextAllocation = false;
+  EXPECT_EQ(failingFirstAllocation([&] {
+              return qel::v0::RunPairedT(&record, x, y, 0.95, qel::kIntervalTwoSided,
+                                         qel::kAlternativeNotEqual, 0.0);
+            }),
+            kOom);
   EXPECT_EQ(record.firstMean, 2.0);
   EXPECT_DOUBLE_EQ(record.secondStandardError, std::sqrt(1.0 / 3.0) / std::sqrt(3.0));
-  EXPECT_TRUE(std::isnan(record.meanDifference) && std::isnan(record.standardErrorOfDifferences) &&
-              std::isnan(record.lowerLimit) && std::isnan(record.upperLimit) &&
-              std::isnan(record.statistic) && std::isnan(record.pValue));
-
+  EXPECT_TRUE(nan({record.meanDifference, record.standardErrorOfDifferences, record.lowerLimit,
+                   record.upperLimit, record.statistic, record.pValue}));
   EXPECT_EQ(qel::v0::RunPairedT(&record, x, y, 0.95, qel::kIntervalTwoSided), qel::qelOk);
   EXPECT_DOUBLE_EQ(record.meanDifference, 1.0 / 3.0);
 }
@@ -155,70 +172,24 @@ TEST(AllocationFailure, PairedTStopsAfterTheColumnSummaries) {
 TEST(AllocationFailure, FitsAndPlotsReportOutOfMemory) {
   const double x[4] = {0.5, 1.0, 2.0, 3.5};
   double par[2] = {0, 0}, cov[3] = {0, 0, 0}, scores[4], a2 = 0, p = 0;
-  failNextAllocation = true;
-  EXPECT_EQ(qel::v2::FitWeibull(x, par, 4), qel::qelFailOutOfMemory);
-  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(par[1]));
-  failNextAllocation = true;
-  EXPECT_EQ(qel::v2::FitLynLogNormal(x, par, 4), qel::qelFailOutOfMemory);
-  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(par[1]));
-  failNextAllocation = true;
-  EXPECT_EQ(
-      qel::v1::RunLynLogNormalPPlot(x, scores, nullptr, par, cov, &a2, &p, 4, qel::kPlotMedianRank),
-      qel::qelFailOutOfMemory);
-  EXPECT_TRUE(std::isnan(par[0]) && std::isnan(cov[2]) && std::isnan(a2) && std::isnan(p));
-  failNextAllocation = true;
-  EXPECT_EQ(
-      qel::v0::RunLynWeibullPPlot(x, scores, nullptr, par, cov, &a2, &p, 4, qel::kPlotMedianRank),
-      qel::qelFailOutOfMemory);
-  EXPECT_TRUE(std::isnan(par[1]) && std::isnan(cov[0]) && std::isnan(a2) && std::isnan(p));
-
-  // With memory again, the same calls succeed.
+  EXPECT_EQ(failingFirstAllocation([&] { return qel::v2::FitWeibull(x, par, 4); }), kOom);
+  EXPECT_TRUE(nan({par[0], par[1]}));
+  EXPECT_EQ(failingFirstAllocation([&] { return qel::v2::FitLynLogNormal(x, par, 4); }), kOom);
+  EXPECT_TRUE(nan({par[0], par[1]}));
+  EXPECT_EQ(failingFirstAllocation([&] {
+              return qel::v1::RunLynLogNormalPPlot(x, scores, nullptr, par, cov, &a2, &p, 4,
+                                                   qel::kPlotMedianRank);
+            }),
+            kOom);
+  EXPECT_TRUE(nan({par[0], cov[2], a2, p}));
+  EXPECT_EQ(failingFirstAllocation([&] {
+              return qel::v0::RunLynWeibullPPlot(x, scores, nullptr, par, cov, &a2, &p, 4,
+                                                 qel::kPlotMedianRank);
+            }),
+            kOom);
+  EXPECT_TRUE(nan({par[1], cov[0], a2, p}));
   EXPECT_EQ(qel::v2::FitWeibull(x, par, 4), qel::qelOk);
   EXPECT_TRUE(std::isfinite(par[0]) && std::isfinite(par[1]));
-}
-
-}  // namespace
-
-#include <qel/summaries.h>
-
-namespace {
-
-TEST(AllocationFailure, SummariesReportOutOfMemory) {
-  const double x[] = {4.0, 1.0, 3.0, 3.0, 2.0};
-  qel::v1::LynBoxplotHelper box;
-  box.mean = 0.0;
-  failNextAllocation = true;
-  EXPECT_EQ(qel::v1::RunLynBoxplotHelper(&box, 0.9, x, 5), qel::qelFailOutOfMemory);
-  failNextAllocation = false;
-  for (double v : {box.minimum, box.maximum, box.firstQuartile, box.median, box.thirdQuartile,
-                   box.medianLowerLimit, box.medianUpperLimit, box.lowerHinge, box.upperHinge,
-                   box.mean, box.standardDeviation}) {
-    EXPECT_TRUE(std::isnan(v));
-  }
-
-  qel::v1::SecondSampleMoments moments;
-  moments.n = 5;
-  qel::v1::FiveNumberSummary five;
-  double modes[5] = {0, 0, 0, 0, 0};
-  unsigned modeCount = 9, frequency = 9;
-  failNextAllocation = true;
-  EXPECT_EQ(qel::v1::GetLyn2013ExtendedSummary(&moments, &five, modes, &modeCount, &frequency, x),
-            qel::qelFailOutOfMemory);
-  failNextAllocation = false;
-  EXPECT_TRUE(std::isnan(five.median));
-  EXPECT_TRUE(std::isnan(modes[0]));
-  EXPECT_EQ(modeCount, 0u);
-  EXPECT_EQ(moments.mean, 2.6);  // the moments need no scratch
-
-  five.median = 0.0;
-  failNextAllocation = true;
-  EXPECT_EQ(qel::v1::GetLynFiveNumberSummary(&five, x, 5), qel::qelFailOutOfMemory);
-  failNextAllocation = false;
-  EXPECT_EQ(five.median, 0.0);  // written only on success
-
-  // With memory again the helper succeeds.
-  EXPECT_EQ(qel::v1::RunLynBoxplotHelper(&box, 0.9, x, 5), qel::qelOk);
-  EXPECT_EQ(box.median, 3.0);
 }
 
 }  // namespace
@@ -258,13 +229,6 @@ const std::vector<double> kFirst = {1.83, 0.50, 1.62, 2.48, 1.68, 1.88, 1.55, 3.
 const std::vector<double> kSecond = {0.878, 0.647, 0.598, 2.05, 1.06, 1.29, 1.06, 3.14, 1.29};
 const std::vector<double> kThird = {2.1, 3.3, 2.9, 4.0, 1.9, 3.6};
 
-bool allNaN(std::initializer_list<double> values) {
-  for (double v : values) {
-    if (!std::isnan(v)) return false;
-  }
-  return true;
-}
-
 TEST(AllocationFailure, MannWhitneyResetsTheRecord) {
   qel::v0::MannWhitney record;
   record.firstN = static_cast<int>(kFirst.size());
@@ -274,9 +238,9 @@ TEST(AllocationFailure, MannWhitneyResetsTheRecord) {
                                       qel::kIntervalTwoSided, qel::kAlternativeNotEqual);
   };
   const int allocations = failEachAllocation(run, [&](int k) {
-    EXPECT_TRUE(allNaN({record.firstMedian, record.secondMedian, record.estimate, record.lowerLimit,
-                        record.upperLimit, record.achievedConfidence, record.statistic,
-                        record.pValue, record.adjustedPValue}))
+    EXPECT_TRUE(nan({record.firstMedian, record.secondMedian, record.estimate, record.lowerLimit,
+                     record.upperLimit, record.achievedConfidence, record.statistic, record.pValue,
+                     record.adjustedPValue}))
         << "allocation " << k;
   });
   EXPECT_GT(allocations, 2);
