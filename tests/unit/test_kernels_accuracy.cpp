@@ -11,8 +11,8 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/kernels.h"
 
 namespace {
 
@@ -124,11 +124,18 @@ const std::map<std::string, Kernels>& kernels() {
                                        static_cast<int>(p[2]));
         },
         1e-11, kElv, 0.0}},
+      {"intuniform",
+       {[](double x, P p) { return mIntegerUniformPdf(x, int(p[0]), int(p[1])); },
+        [](double x, P p, bool u) { return mIntegerUniformCdf(x, int(p[0]), int(p[1]), u); },
+        [](double x, P p) { return mIntegerUniformInvCdf(x, int(p[0]), int(p[1])); }, kClosed,
+        kClosed, 0.0}},
   };
   return table;
 }
 
-void checkAgainst(const char* file) {
+// edges: the rows are edge cases, held to 1e-13 (exactly where 0), with
+// "nan" for the missing value.
+void checkAgainst(const char* file, bool edges = false) {
   const auto rows = qeltest::loadReferenceData(file, 2);
   ASSERT_FALSE(rows.empty());
   std::map<std::string, double> worst;
@@ -154,6 +161,15 @@ void checkAgainst(const char* file) {
       actual = k.cdf(x, params, function == "upper");
       tolerance = k.cdfTolerance;
     }
+    if (edges) {
+      tolerance = 1e-13;
+      if (std::isnan(expected) || expected == 0.0) {
+        EXPECT_TRUE(std::isnan(expected) ? qel::mIsNumericMissing(actual) : actual == 0.0)
+            << family << " " << function << " x=" << x << ": " << actual << " (line " << row.line
+            << ")";
+        continue;
+      }
+    }
     ASSERT_FALSE(qel::mIsNumericMissing(actual))
         << family << " " << function << " x=" << x << " line " << row.line;
     const double error = qeltest::relativeError(actual, expected);
@@ -176,6 +192,12 @@ TEST(KernelAccuracy, MatchHighPrecisionReferenceValues) {
 
 TEST(KernelAccuracy, BetaFamilyAndTMatchHighPrecisionReferenceValues) {
   checkAgainst("kernels_beta_t.csv");
+}
+
+// The ends of the support, thresholds, integer rules, catches and the
+// quantiles at 0 and 1 (tools/reference/gen_kernel_edges.py).
+TEST(KernelAccuracy, EdgeCasesOfEveryFamily) {
+  checkAgainst("kernel_edges.csv", true);
 }
 
 }  // namespace
