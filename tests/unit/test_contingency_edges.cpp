@@ -64,6 +64,17 @@ TEST(ContingencyEdges, PerfectAgreementTable) {
 }
 
 
+TEST(ContingencyEdges, PercentagesOfUnequalMargins) {
+  // Columns (12, 3) and (5, 9): totals 15 and 14, rows 17 and 12, N 29.
+  TableHost host(2, 2, {12, 3, 5, 9});
+  host.run();
+  EXPECT_DOUBLE_EQ(host.cell(5, 1, 0), 500.0 / 14.0);
+  EXPECT_DOUBLE_EQ(host.cell(6, 0, 0), 1200.0 / 17.0);
+  EXPECT_DOUBLE_EQ(host.cell(7, 1, 1), 900.0 / 29.0);
+  EXPECT_DOUBLE_EQ(host.rowTotalPercentages[1], 1200.0 / 29.0);
+  EXPECT_DOUBLE_EQ(host.columnTotalPercentages[1], 1400.0 / 29.0);
+}
+
 TEST(ContingencyEdges, OnlyRequestedResultsAreWritten) {
   std::mt19937 rng(7);
   std::uniform_int_distribution<int> count(0, 9);
