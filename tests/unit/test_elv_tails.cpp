@@ -54,7 +54,7 @@ double run(const std::string& call, double* a, double* o, const std::string& whe
 }
 
 // Identities with a second routine, checked on every row: the chi-square
-// law is the gamma law at twice the argument and shape; the F law at L = 0
+// law is the gamma law at twice the argument and shape (density halved); the F law at L = 0
 // is the central one.
 void checkSecondForm(const std::string& call, const double* a, const double* o, int status,
                      const std::string& where) {
@@ -63,6 +63,8 @@ void checkSecondForm(const std::string& call, const double* a, const double* o, 
     b[0] = 2 * a[0], b[1] = 2 * a[1];
     if (run("chi2_df", b, p, where) == 0 && status == 0) {
       EXPECT_LE(std::max(relativeError(p[0], o[0]), relativeError(p[1], o[1])), 1e-12) << where;
+      // Its density at 2x is half the gamma density at x.
+      EXPECT_LE(relativeError(p[2], 0.5 * o[2]), 1e-12) << where;
     }
   } else if (call == "chi2_ncdf") {
     b[0] = a[0] / 2, b[1] = a[1] / 2, b[2] = a[2] / 2;
