@@ -70,6 +70,8 @@ TEST(ContingencyEdges, PercentagesOfUnequalMargins) {
   host.run();
   EXPECT_DOUBLE_EQ(host.cell(5, 1, 0), 500.0 / 14.0);
   EXPECT_DOUBLE_EQ(host.cell(6, 0, 0), 1200.0 / 17.0);
+  EXPECT_DOUBLE_EQ(host.cell(6, 1, 0), 500.0 / 17.0);
+  EXPECT_DOUBLE_EQ(host.cell(5, 0, 1), 20.0);
   EXPECT_DOUBLE_EQ(host.cell(7, 1, 1), 900.0 / 29.0);
   EXPECT_DOUBLE_EQ(host.rowTotalPercentages[1], 1200.0 / 29.0);
   EXPECT_DOUBLE_EQ(host.columnTotalPercentages[1], 1400.0 / 29.0);

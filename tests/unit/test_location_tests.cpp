@@ -357,17 +357,6 @@ TEST(LocationTests, PairedDataFormsRecordEachColumn) {
   EXPECT_EQ(p.meanDifference, 4.0);
 }
 
-TEST(LocationTests, OneSampleZRecordsTheSampleDeviationButUsesSigma) {
-  const std::vector<double> x = {1.0, 2.0, 3.0, 6.0};  // mean 3, s = sqrt(14/3)
-  qel::v0::OneSampleZ z;
-  z.n = 4;
-  ASSERT_EQ(qel::v0::RunOneSampleZ(&z, x.data(), 10.0, 0.95, qel::kIntervalTwoSided,
-                                   qel::kAlternativeGreater, 0.0),
-            0);
-  EXPECT_NEAR(z.standardDeviation, std::sqrt(14.0 / 3.0), 1e-15);
-  EXPECT_EQ(z.standardError, 5.0);
-  EXPECT_EQ(z.statistic, 0.6);
-}
 
 
 
