@@ -101,17 +101,6 @@ TEST(SignTest, EdgeCases) {
   EXPECT_TRUE(std::isnan(r.pValue));
 }
 
-TEST(SignTest, OneSidedUsesTwoSidedMachinery) {
-  const double x[] = {6.5, 1.25, 3, 9, 2.5, 4, 8, 11, -2, 5.5, 7, 0.5, 3.25, 10, 4.75};
-  qel::v0::OneSampleSign one, two;
-  one.n = two.n = 15;
-  qel::v0::RunOneSampleSign(&one, x, 0.95, qel::kIntervalLowerBound);
-  qel::v0::RunOneSampleSign(&two, x, 0.90, qel::kIntervalTwoSided);
-  EXPECT_NEAR(one.interpolatedLowerLimit, two.interpolatedLowerLimit, 1e-12);
-  EXPECT_EQ(one.widerLowerLimit, two.widerLowerLimit);
-  EXPECT_TRUE(std::isinf(one.interpolatedUpperLimit));
-  EXPECT_DOUBLE_EQ(1.0 - one.widerConfidence, 0.5 * (1.0 - two.widerConfidence));
-}
 
 TEST(WilcoxonTest, MatchesR) {
   const auto samples = loadSamples();
