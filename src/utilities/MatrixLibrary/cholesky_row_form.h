@@ -1,0 +1,81 @@
+// The row form of the Cholesky factorisation, shared by the value matrices
+// and the legacy polymorphic ones. Both keep the factor U (A = U'U) packed
+// by upper rows; the work runs on the transposed factor L = U' held as a
+// dense row-major lower triangle, where the dot product of columns i and j
+// of U is a dot product of two contiguous rows of L.
+#ifndef QEL_SRC_UTILITIES_MATRIXLIBRARY_CHOLESKY_ROW_FORM_H
+#define QEL_SRC_UTILITIES_MATRIXLIBRARY_CHOLESKY_ROW_FORM_H
+
+#include <cmath>
+#include <cstddef>
+#include <vector>
+
+namespace qel {
+namespace cholesky_detail {
+
+// Sum of x[k] y[k] for k below count, in four interleaved partial sums (a
+// fixed order, so results do not depend on the caller).
+template <class T>
+T rowDot(const T* x, const T* y, int count) {
+  T s0 = T(), s1 = T(), s2 = T(), s3 = T();
+  int k = 0;
+  for (; k + 3 < count; k += 4) {
+    s0 += x[k] * y[k];
+    s1 += x[k + 1] * y[k + 1];
+    s2 += x[k + 2] * y[k + 2];
+    s3 += x[k + 3] * y[k + 3];
+  }
+  for (; k < count; ++k) s0 += x[k] * y[k];
+  return (s0 + s1) + (s2 + s3);
+}
+
+// Factors the columns j >= start of the m by m lower triangle l (row j of l
+// is column j of U). Rows below start of every column are taken as already
+// factored. For each column j, with a residual starting at 0: for i below j,
+// l(j,i) = (l(j,i) - dot of rows i and j over the first i entries) / l(i,i)
+// when i >= start, and the residual gains l(j,i)^2; then d = l(j,j) -
+// residual. d <= 0 (not NaN) stops: the result is j and *residual = |d|.
+// Otherwise l(j,j) = sqrt(d). Success returns -1, *residual holding the last
+// column's sum of squares.
+template <class T>
+int choleskyRowForm(T* l, int m, int start, T* residual) {
+  T sumOfSquares = T();
+  for (int j = start; j < m; ++j) {
+    T* lj = l + static_cast<std::size_t>(j) * m;
+    sumOfSquares = T();
+    for (int i = 0; i < j; ++i) {
+      const T* li = l + static_cast<std::size_t>(i) * m;
+      if (i >= start) lj[i] = (lj[i] - rowDot(li, lj, i)) / li[i];
+      sumOfSquares += lj[i] * lj[i];
+    }
+    const T d = lj[j] - sumOfSquares;
+    if (d <= T()) {
+      *residual = std::fabs(d);
+      return j;
+    }
+    lj[j] = std::sqrt(d);
+  }
+  *residual = sumOfSquares;
+  return -1;
+}
+
+// The same on the packed upper triangle (i m - i(i+1)/2 + j for i <= j).
+template <class T>
+int choleskyPackedUpper(std::vector<T>& packed, int m, int start, T* residual) {
+  std::vector<T> l(static_cast<std::size_t>(m) * m, T());
+  std::size_t k = 0;
+  for (int i = 0; i < m; ++i) {
+    for (int j = i; j < m; ++j) l[static_cast<std::size_t>(j) * m + i] = packed[k++];
+  }
+  const int failed = choleskyRowForm(l.data(), m, start, residual);
+  k = 0;
+  for (int i = 0; i < m; ++i) {
+    for (int j = i; j < m; ++j) packed[k++] = l[static_cast<std::size_t>(j) * m + i];
+  }
+  return failed;
+}
+
+}  // namespace cholesky_detail
+}  // namespace qel
+
+#endif
