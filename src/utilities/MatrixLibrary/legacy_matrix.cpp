@@ -2,11 +2,11 @@
 // and the packed symmetric and upper triangular layouts.
 #include "utilities/MatrixLibrary/legacy_matrix.h"
 
-#include "utilities/MatrixLibrary/cholesky_row_form.h"
-
 #include <cmath>
 #include <stdexcept>
 #include <utility>
+
+#include "utilities/MatrixLibrary/cholesky_row_form.h"
 
 namespace qel {
 

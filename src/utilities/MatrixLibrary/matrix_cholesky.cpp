@@ -15,7 +15,8 @@ UMat CholeskyDecomp(const UMat& u, int start, int* failedRow, double* residual) 
   if (start < 0) start = 0;
   UMat factor(u);
   double sumOfSquares = 0.0;
-  const int failed = cholesky_detail::choleskyPackedUpper(factor.storage(), m, start, &sumOfSquares);
+  const int failed =
+      cholesky_detail::choleskyPackedUpper(factor.storage(), m, start, &sumOfSquares);
   if (failedRow) *failedRow = failed;
   if (residual) *residual = sumOfSquares;
   return factor;

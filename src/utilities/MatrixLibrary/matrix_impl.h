@@ -142,7 +142,9 @@ class Smatrix {
   static std::size_t calculate_size(int order) {
     return order <= 0 ? 0 : static_cast<std::size_t>(order) * (order + 1) / 2;
   }
-  T& operator()(int i, int j) { return i >= j ? v_[packedIndexLower(i, j)] : v_[packedIndexLower(j, i)]; }
+  T& operator()(int i, int j) {
+    return i >= j ? v_[packedIndexLower(i, j)] : v_[packedIndexLower(j, i)];
+  }
   const T& operator()(int i, int j) const {
     return i >= j ? v_[packedIndexLower(i, j)] : v_[packedIndexLower(j, i)];
   }

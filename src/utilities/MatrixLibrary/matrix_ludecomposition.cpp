@@ -11,7 +11,6 @@
 #include <utility>
 
 #include "utilities/LYNExceptions.h"
-
 #include "utilities/MathUtilities.h"
 
 namespace qel {

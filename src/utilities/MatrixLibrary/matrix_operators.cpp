@@ -162,9 +162,13 @@ Mat timesVector(const A& a, const Vec& x) {
 }  // namespace
 
 // ---- sums and differences --------------------------------------------------
-#define QEL_FULL_ELEMENTWISE(A, B)                                                     \
-  Mat operator+(const A& a, const B& b) { return elementwiseFull(a, b, 1.0); }         \
-  Mat operator-(const A& a, const B& b) { return elementwiseFull(a, b, -1.0); }
+#define QEL_FULL_ELEMENTWISE(A, B)        \
+  Mat operator+(const A& a, const B& b) { \
+    return elementwiseFull(a, b, 1.0);    \
+  }                                       \
+  Mat operator-(const A& a, const B& b) { \
+    return elementwiseFull(a, b, -1.0);   \
+  }
 QEL_FULL_ELEMENTWISE(Mat, DMat)
 QEL_FULL_ELEMENTWISE(DMat, Mat)
 QEL_FULL_ELEMENTWISE(Mat, SMat)
@@ -175,11 +179,13 @@ QEL_FULL_ELEMENTWISE(SMat, UMat)
 QEL_FULL_ELEMENTWISE(UMat, SMat)
 #undef QEL_FULL_ELEMENTWISE
 
-#define QEL_PACKED_ELEMENTWISE(R, A, B, label, lower)                                  \
-  R operator+(const A& a, const B& b) {                                                \
-    return elementwisePacked<R>(label, a, b, 1.0, lower);                              \
-  }                                                                                    \
-  R operator-(const A& a, const B& b) { return elementwisePacked<R>(label, a, b, -1.0, lower); }
+#define QEL_PACKED_ELEMENTWISE(R, A, B, label, lower)      \
+  R operator+(const A& a, const B& b) {                    \
+    return elementwisePacked<R>(label, a, b, 1.0, lower);  \
+  }                                                        \
+  R operator-(const A& a, const B& b) {                    \
+    return elementwisePacked<R>(label, a, b, -1.0, lower); \
+  }
 QEL_PACKED_ELEMENTWISE(SMat, DMat, SMat, kAddition, true)
 QEL_PACKED_ELEMENTWISE(SMat, SMat, DMat, kAddition, true)
 QEL_PACKED_ELEMENTWISE(SMat, SMat, SMat, kAddition, true)
