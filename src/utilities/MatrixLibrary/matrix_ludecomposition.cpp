@@ -1,13 +1,14 @@
 // Crout's LU factorisation with implicit scaling (Press et al., Numerical
 // Recipes, ludcmp/lubksb), arranged so that every inner loop runs along a
-// contiguous row: after the pivot of column j is fixed, its multipliers
-// update the rows below at once. Each element receives the same products as
-// in the column-by-column order, and the pivot of every column is chosen from
-// the same fully reduced candidates.
+// contiguous row and in panels (see factorPanel). The pivot of every column
+// is chosen from the same fully reduced candidates as in the
+// column-by-column order.
 #include "utilities/MatrixLibrary/matrix_ludecomposition.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstddef>
+#include <cstring>
 #include <utility>
 
 #include "utilities/LYNExceptions.h"
@@ -61,6 +62,127 @@ void singularResult(matrix<double>& a) {
   a.ResizeStorage(0, 0, 0.0);
 }
 
+// Columns are factored in panels of kPanel. Within a panel each column is
+// pivoted and its multipliers update the rest of the panel; the panel's rows
+// then update the block row to its right and, once, the trailing matrix.
+// Every element receives its products in the same order as in the plain
+// column-by-column elimination; only the order of the loops changes, so that
+// a trailing row is read once a panel instead of once a column.
+constexpr int kPanel = 32;
+constexpr int kChunk = 8;
+
+std::size_t at(int i, int j, int n) {
+  return static_cast<std::size_t>(i) * n + j;
+}
+
+bool factorPanel(double* v, int n, int j0, int j1, std::vector<double>& scale,
+                 std::vector<int>& perm, double& parity) {
+  for (int j = j0; j < j1; ++j) {
+    const int pivot = choosePivot(v, n, j, scale);
+    double* rowJ = v + at(j, 0, n);
+    if (pivot != j) {
+      std::swap_ranges(rowJ, rowJ + n, v + at(pivot, 0, n));
+      parity = -parity;
+      scale[static_cast<std::size_t>(pivot)] = scale[static_cast<std::size_t>(j)];
+    }
+    perm[static_cast<std::size_t>(j)] = pivot;
+    if (negligible(rowJ[j])) return false;
+    if (j == n - 1) break;
+    const double reciprocal = 1.0 / rowJ[j];
+    for (int i = j + 1; i < n; ++i) {
+      double* rowI = v + at(i, 0, n);
+      const double multiplier = rowI[j] * reciprocal;
+      rowI[j] = multiplier;
+      for (int k = j + 1; k < j1; ++k) rowI[k] -= multiplier * rowJ[k];
+    }
+  }
+  return true;
+}
+
+// Rows j0..j1-1, columns from j1: the unit lower panel block applied.
+void solveBlockRow(double* v, int n, int j0, int j1) {
+  for (int j = j0; j < j1; ++j) {
+    const double* rowJ = v + at(j, 0, n);
+    for (int r = j + 1; r < j1; ++r) {
+      double* rowR = v + at(r, 0, n);
+      const double multiplier = rowR[j];
+      for (int c = j1; c < n; ++c) rowR[c] -= multiplier * rowJ[c];
+    }
+  }
+}
+
+// Two doubles in one SSE2 register (GCC vector extension); each lane rounds
+// exactly as the scalar operation would.
+typedef double Pair __attribute__((vector_size(16)));
+
+Pair load(const double* p) {
+  Pair x;
+  std::memcpy(&x, p, sizeof x);
+  return x;
+}
+
+void store(double* p, Pair x) {
+  std::memcpy(p, &x, sizeof x);
+}
+
+// Columns c..c+7 of rows i and i+1 (rows ends at i + 1 < n or not).
+void updateChunk(double* v, int n, int j0, int width, int i, bool twoRows, int c) {
+  double* row0 = v + at(i, 0, n);
+  double* row1 = twoRows ? row0 + n : row0;
+  Pair a0 = load(row0 + c), a1 = load(row0 + c + 2), a2 = load(row0 + c + 4),
+       a3 = load(row0 + c + 6);
+  Pair b0 = load(row1 + c), b1 = load(row1 + c + 2), b2 = load(row1 + c + 4),
+       b3 = load(row1 + c + 6);
+  for (int k = 0; k < width; ++k) {
+    const double* u = v + at(j0 + k, c, n);
+    const Pair u0 = load(u), u1 = load(u + 2), u2 = load(u + 4), u3 = load(u + 6);
+    const Pair m0 = {row0[j0 + k], row0[j0 + k]};
+    const Pair m1 = {row1[j0 + k], row1[j0 + k]};
+    a0 -= m0 * u0;
+    a1 -= m0 * u1;
+    a2 -= m0 * u2;
+    a3 -= m0 * u3;
+    b0 -= m1 * u0;
+    b1 -= m1 * u1;
+    b2 -= m1 * u2;
+    b3 -= m1 * u3;
+  }
+  if (twoRows) {
+    store(row1 + c, b0);
+    store(row1 + c + 2, b1);
+    store(row1 + c + 4, b2);
+    store(row1 + c + 6, b3);
+  }
+  store(row0 + c, a0);
+  store(row0 + c + 2, a1);
+  store(row0 + c + 4, a2);
+  store(row0 + c + 6, a3);
+}
+
+// a(i, c) -= sum over k in the panel of a(i, k) a(k, c), for i, c >= j1, in
+// the order of k; two rows by eight columns a step are held in registers,
+// over column blocks whose panel rows stay in the first-level cache.
+void updateTrailing(double* v, int n, int j0, int j1) {
+  const int width = j1 - j0;
+  constexpr int kBlock = 128;
+  for (int c0 = j1; c0 < n; c0 += kBlock) {
+    const int c1 = std::min(n, c0 + kBlock);
+    for (int i = j1; i < n; i += 2) {
+      const bool twoRows = i + 1 < n;
+      int c = c0;
+      for (; c + kChunk <= c1; c += kChunk) updateChunk(v, n, j0, width, i, twoRows, c);
+      for (int r = i; r <= (twoRows ? i + 1 : i); ++r) {
+        double* rowR = v + at(r, 0, n);
+        for (int cc = c; cc < c1; ++cc) {
+          double acc = rowR[cc];
+          for (int k = 0; k < width; ++k) acc -= rowR[j0 + k] * v[at(j0 + k, cc, n)];
+          rowR[cc] = acc;
+        }
+      }
+    }
+  }
+}
+
 }  // namespace
 
 bool LUDecompSafeIterator(matrix<double>& a, std::vector<int>* row_perm, double* parity) {
@@ -84,28 +206,14 @@ bool LUDecompSafeIterator(matrix<double>& a, std::vector<int>* row_perm, double*
     singularResult(a);
     return false;
   }
-  for (int j = 0; j < n; ++j) {
-    const int pivot = choosePivot(v, n, j, scale);
-    double* rowJ = v + static_cast<std::size_t>(j) * n;
-    if (pivot != j) {
-      std::swap_ranges(rowJ, rowJ + n, v + static_cast<std::size_t>(pivot) * n);
-      *parity = -*parity;
-      scale[static_cast<std::size_t>(pivot)] = scale[static_cast<std::size_t>(j)];
-    }
-    (*row_perm)[static_cast<std::size_t>(j)] = pivot;
-    if (negligible(rowJ[j])) {
+  for (int j0 = 0; j0 < n; j0 += kPanel) {
+    const int j1 = std::min(n, j0 + kPanel);
+    if (!factorPanel(v, n, j0, j1, scale, *row_perm, *parity)) {
       singularResult(a);
       return false;
     }
-    if (j == n - 1) break;
-    const double reciprocal = 1.0 / rowJ[j];
-    for (int i = j + 1; i < n; ++i) {
-      double* rowI = v + static_cast<std::size_t>(i) * n;
-      const double multiplier = rowI[j] * reciprocal;
-      rowI[j] = multiplier;
-      if (multiplier == 0.0) continue;
-      for (int k = j + 1; k < n; ++k) rowI[k] -= multiplier * rowJ[k];
-    }
+    solveBlockRow(v, n, j0, j1);
+    updateTrailing(v, n, j0, j1);
   }
   return true;
 }
