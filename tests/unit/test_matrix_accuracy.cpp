@@ -157,4 +157,61 @@ TEST(MatrixReference, EigenSystems) {
   }
 }
 
+// The matrices of tools/reference/gen_matrix_r.R, rebuilt from their
+// integer formulas.
+Mat rGeneral(int n) {
+  Mat g(n, n, 0.0);
+  for (int i = 0; i < n; ++i)
+    for (int j = 0; j < n; ++j)
+      g(i, j) = ((3 * i + 7 * j + i * j) % 29 - 14) / 14.0 + (i == j) * 2.0;
+  return g;
+}
+
+Mat rSymmetric(int n) {
+  Mat s(n, n, 0.0);
+  for (int i = 0; i < n; ++i)
+    for (int j = 0; j < n; ++j) s(i, j) = ((i + 1) * (j + 1) % 23 - 11) / 11.0 + (i == j) * (n + i);
+  return s;
+}
+
+TEST(MatrixReference, AgainstLapackThroughR) {
+  int seen = 0;
+  for (const auto& row : qeltest::loadReferenceData("matrix_r_lapack.csv", 1)) {
+    const std::string& kind = row.text[0];
+    const int n = static_cast<int>(row.numbers[0]);
+    const double* r = row.numbers.data() + 1;
+    SCOPED_TRACE(kind + " " + std::to_string(n));
+    ++seen;
+    if (kind == "solve") {
+      Vec b(static_cast<std::size_t>(n)), x;
+      for (int i = 0; i < n; ++i) b[static_cast<std::size_t>(i)] = i % 5 - 2;
+      ASSERT_TRUE(LUDecomposition(rGeneral(n)).Solve(b, &x));
+      const Vec xR(r + 1, r + 1 + n);
+      EXPECT_LE(normInf(difference(x, xR)) / normInf(xR), 4.0 * n * r[0] * kEps);
+    } else if (kind == "det") {
+      double det = 0.0;
+      ASSERT_TRUE(determinant(rGeneral(n), &det));
+      EXPECT_NEAR(std::log(std::fabs(det)), r[0], 4.0 * n * kEps * r[0]);
+      EXPECT_EQ(det < 0 ? -1.0 : 1.0, r[1]);
+    } else if (kind == "chol") {
+      const UMat u = CholeskyDecompWithThrow(rSymmetric(n).ConvertToSmatrix());
+      for (int i = 0; i < n; ++i) EXPECT_NEAR(u(i, i), r[1 + i], 4.0 * n * r[0] * kEps * r[1 + i]);
+    } else {
+      Vec values;
+      Mat vectors;
+      ASSERT_EQ(EigenSystems(rSymmetric(n), values, vectors), 0);
+      const double tolerance = 10.0 * n * kEps * r[0];
+      for (int k = 0; k < n; ++k) {
+        EXPECT_NEAR(values[static_cast<std::size_t>(k)], r[1 + k], tolerance);
+        // An eigenvector is as accurate as its value is separated.
+        double gap = r[0];
+        if (k > 0) gap = std::min(gap, r[1 + k] - r[k]);
+        if (k + 1 < n) gap = std::min(gap, r[2 + k] - r[1 + k]);
+        EXPECT_NEAR(std::fabs(vectors(n - 1, k)), r[1 + n + k], tolerance / gap);
+      }
+    }
+  }
+  EXPECT_EQ(seen, 8);
+}
+
 }  // namespace

@@ -166,9 +166,14 @@ TEST(MatrixDecompositions, SingularityEdgesAndBadInput) {
   EXPECT_THROW(zero.DeterminantWithThrow(), MatrixSingular);
   EXPECT_EQ(failureText([] { LUDecomposition(Mat(2, 3, 1.0)); }),
             "LU Decomp is defined for only square matrices");
-  EXPECT_NE(
-      failureText([] { LUDecomposition(Mat(2, 2, 1.0)).Determinant(nullptr); }).find("(result) "),
-      std::string::npos);
+  const std::string nullResult =
+      failureText([] { LUDecomposition(Mat(2, 2, 1.0)).Determinant(nullptr); });
+  EXPECT_EQ(nullResult.find("assertion failed: (result) "), 0u) << nullResult;
+  EXPECT_NE(nullResult.find("matrix_ludecomposition.cpp: "), std::string::npos) << nullResult;
+  EXPECT_NE(failureText([] { inverse(DMat(2), static_cast<DMat*>(nullptr)); }).find("(result)"),
+            std::string::npos);
+  EXPECT_NE(failureText([] { LUDecomposition(Mat(2, 2, 1.0)).Solve(Vec(2), nullptr); }).find("(x)"),
+            std::string::npos);
   const Mat B(2, 2, 1.0);
   Mat X = B;
   LUDecomposition lu(Mat(DMat(2, 2.0)));

@@ -20,6 +20,10 @@
 namespace qel {
 namespace matrix_library {
 
+// Appends "text : value" to trace.txt (diagnostics; nothing calls it in
+// normal runs).
+using qel::matrix_trace;
+
 class MatrixException : public std::runtime_error {
  public:
   explicit MatrixException(const std::string& what) : std::runtime_error(what) {}
