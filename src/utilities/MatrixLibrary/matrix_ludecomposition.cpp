@@ -13,6 +13,7 @@
 
 #include "utilities/LYNExceptions.h"
 #include "utilities/MathUtilities.h"
+#include "utilities/MatrixLibrary/simd_pair.h"
 
 namespace qel {
 namespace matrix_library {
@@ -106,24 +107,14 @@ void solveBlockRow(double* v, int n, int j0, int j1) {
     for (int r = j + 1; r < j1; ++r) {
       double* rowR = v + at(r, 0, n);
       const double multiplier = rowR[j];
-      for (int c = j1; c < n; ++c) rowR[c] -= multiplier * rowJ[c];
+      simd::subtractMultiple(rowR + j1, multiplier, rowJ + j1, n - j1);
     }
   }
 }
 
-// Two doubles in one SSE2 register (GCC vector extension); each lane rounds
-// exactly as the scalar operation would.
-typedef double Pair __attribute__((vector_size(16)));
-
-Pair load(const double* p) {
-  Pair x;
-  std::memcpy(&x, p, sizeof x);
-  return x;
-}
-
-void store(double* p, Pair x) {
-  std::memcpy(p, &x, sizeof x);
-}
+using simd::load;
+using simd::Pair;
+using simd::store;
 
 // Columns c..c+7 of rows i and i+1 (rows ends at i + 1 < n or not).
 void updateChunk(double* v, int n, int j0, int width, int i, bool twoRows, int c) {
@@ -287,6 +278,9 @@ bool LUDecomposition::Solve(const std::vector<double>& b, std::vector<double>* x
   return true;
 }
 
+// All columns at once, by rows: the exchanges applied to the rows of X,
+// then the forward and back substitutions as row updates, each element
+// receiving its products in the same order as in the one-column solve.
 bool LUDecomposition::Solve(const matrix<double>& B, matrix<double>* X) const {
   QEL_ALLEGE(X);
   QEL_ALLEGE(&B != X);
@@ -296,14 +290,24 @@ bool LUDecomposition::Solve(const matrix<double>& B, matrix<double>* X) const {
   }
   if (B.rowCount() != lu_.rowCount())
     throw MatrixException("LU solve: matrix and vector have incompatible dimensions");
+  const matrix<double>& lhs = lu_;
   const int n = B.rowCount();
   const int columns = B.colCount();
-  X->ResizeStorage(n, columns, 0.0);
-  std::vector<double> column(static_cast<std::size_t>(n));
-  for (int j = 0; j < columns; ++j) {
-    for (int i = 0; i < n; ++i) column[static_cast<std::size_t>(i)] = B(i, j);
-    backSubstitute(column);
-    for (int i = 0; i < n; ++i) (*X)(i, j) = column[static_cast<std::size_t>(i)];
+  *X = B;
+  double* x = X->data();
+  const auto row = [&](int i) { return x + static_cast<std::size_t>(i) * columns; };
+  for (int i = 0; i < n; ++i) {
+    const int ip = perm_[static_cast<std::size_t>(i)];
+    if (ip != i) std::swap_ranges(row(i), row(i) + columns, row(ip));
+    const double* l = lhs.data() + static_cast<std::size_t>(i) * n;
+    for (int j = 0; j < i; ++j) simd::subtractMultiple(row(i), l[j], row(j), columns);
+  }
+  for (int i = n - 1; i >= 0; --i) {
+    const double* u = lhs.data() + static_cast<std::size_t>(i) * n;
+    for (int j = i + 1; j < n; ++j) simd::subtractMultiple(row(i), u[j], row(j), columns);
+    if (lhs(i, i) == 0.0) allege::AllegeFailure("lhs(i,i)", __FILE__, __LINE__);
+    double* xi = row(i);
+    for (int c = 0; c < columns; ++c) xi[c] /= u[i];
   }
   return true;
 }

@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "utilities/MatrixLibrary/matrix_functions.h"
+#include "utilities/MatrixLibrary/simd_pair.h"
 
 namespace qel {
 namespace matrix_library {
@@ -66,19 +67,39 @@ void multiplyHelper(int i0, int i1, int k0, int k1, int j0, int j1, const A& a, 
   }
 }
 
-// Two full matrices: the same tile on the row-major arrays, so that the
-// innermost loop runs along contiguous rows of b and c.
+// Two full matrices: the same tile on the row-major arrays, a full tile row
+// of c held in four register pairs while the inner index runs.
 void multiplyHelper(int i0, int i1, int k0, int k1, int j0, int j1, const Mat& a, const Mat& b,
                     Mat& c) {
+  using simd::broadcast;
+  using simd::load;
+  using simd::Pair;
+  using simd::store;
   const int n = b.colCount();
   const int inner = a.colCount();
-  const double* av = a.data();
   const double* bv = b.data();
-  double* cv = c.data();
   for (int i = i0; i < i1; ++i) {
-    double* crow = cv + static_cast<std::size_t>(i) * n;
+    double* crow = c.data() + static_cast<std::size_t>(i) * n;
+    const double* arow = a.data() + static_cast<std::size_t>(i) * inner;
+    if (j1 - j0 == 8) {
+      Pair c0 = load(crow + j0), c1 = load(crow + j0 + 2), c2 = load(crow + j0 + 4),
+           c3 = load(crow + j0 + 6);
+      for (int k = k0; k < k1; ++k) {
+        const Pair aik = broadcast(arow[k]);
+        const double* brow = bv + static_cast<std::size_t>(k) * n + j0;
+        c0 += aik * load(brow);
+        c1 += aik * load(brow + 2);
+        c2 += aik * load(brow + 4);
+        c3 += aik * load(brow + 6);
+      }
+      store(crow + j0, c0);
+      store(crow + j0 + 2, c1);
+      store(crow + j0 + 4, c2);
+      store(crow + j0 + 6, c3);
+      continue;
+    }
     for (int k = k0; k < k1; ++k) {
-      const double aik = av[static_cast<std::size_t>(i) * inner + k];
+      const double aik = arow[k];
       const double* brow = bv + static_cast<std::size_t>(k) * n;
       for (int j = j0; j < j1; ++j) crow[j] += aik * brow[j];
     }
