@@ -10,11 +10,14 @@
 #include <cstddef>
 #include <vector>
 
+#include "utilities/MatrixLibrary/simd_pair.h"
+
 namespace qel {
 namespace cholesky_detail {
 
 // Sum of x[k] y[k] for k below count, in four interleaved partial sums (a
-// fixed order, so results do not depend on the caller).
+// fixed order, so results do not depend on the caller): sums 0 and 1 share
+// one register pair, sums 2 and 3 the other.
 template <class T>
 T rowDot(const T* x, const T* y, int count) {
   T s0 = T(), s1 = T(), s2 = T(), s3 = T();
@@ -27,6 +30,19 @@ T rowDot(const T* x, const T* y, int count) {
   }
   for (; k < count; ++k) s0 += x[k] * y[k];
   return (s0 + s1) + (s2 + s3);
+}
+
+inline double rowDot(const double* x, const double* y, int count) {
+  simd::Pair low = simd::broadcast(0.0);
+  simd::Pair high = low;
+  int k = 0;
+  for (; k + 3 < count; k += 4) {
+    low += simd::load(x + k) * simd::load(y + k);
+    high += simd::load(x + k + 2) * simd::load(y + k + 2);
+  }
+  double s0 = low[0];
+  for (; k < count; ++k) s0 += x[k] * y[k];
+  return (s0 + low[1]) + (high[0] + high[1]);
 }
 
 // Factors the columns j >= start of the m by m lower triangle l (row j of l
