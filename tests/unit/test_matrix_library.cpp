@@ -230,6 +230,13 @@ TEST(MatrixDecompositions, CholeskyResumesAndReportsItsRow) {
   CholeskyDecomp(SmatrixToUTmatrix(indefinite), 0, &failed, &residual);
   EXPECT_EQ(failed, 2);
   EXPECT_NEAR(residual, 0.28, 1e-15);
+  // A failure leaves the later columns as they came in.
+  SMat wider(4, 0.5);
+  wider(0, 0) = wider(1, 1) = wider(3, 3) = 1.0;
+  wider(2, 2) = 0.3;
+  const UMat stopped = CholeskyDecomp(SmatrixToUTmatrix(wider), 0, &failed, &residual);
+  EXPECT_EQ(failed, 2);
+  for (int i = 0; i < 3; ++i) EXPECT_EQ(stopped(i, 3), 0.5) << i;
   SMat result(2);
   EXPECT_FALSE(inverse(indefinite, &result));
   EXPECT_EQ(result.size(), 0);

@@ -6,6 +6,7 @@
 #ifndef QEL_SRC_UTILITIES_MATRIXLIBRARY_CHOLESKY_ROW_FORM_H
 #define QEL_SRC_UTILITIES_MATRIXLIBRARY_CHOLESKY_ROW_FORM_H
 
+#include <algorithm>
 #include <cmath>
 #include <cstddef>
 #include <vector>
@@ -45,6 +46,34 @@ inline double rowDot(const double* x, const double* y, int count) {
   return (s0 + low[1]) + (high[0] + high[1]);
 }
 
+// rowDot(x, y, count) and rowDot(x, z, count) in one pass over x, each with
+// exactly the arithmetic of rowDot.
+template <class T>
+void rowDot2(const T* x, const T* y, const T* z, int count, T* dy, T* dz) {
+  *dy = rowDot(x, y, count);
+  *dz = rowDot(x, z, count);
+}
+
+inline void rowDot2(const double* x, const double* y, const double* z, int count, double* dy,
+                    double* dz) {
+  simd::Pair yLow = simd::broadcast(0.0), yHigh = yLow, zLow = yLow, zHigh = yLow;
+  int k = 0;
+  for (; k + 3 < count; k += 4) {
+    const simd::Pair xLow = simd::load(x + k), xHigh = simd::load(x + k + 2);
+    yLow += xLow * simd::load(y + k);
+    yHigh += xHigh * simd::load(y + k + 2);
+    zLow += xLow * simd::load(z + k);
+    zHigh += xHigh * simd::load(z + k + 2);
+  }
+  double y0 = yLow[0], z0 = zLow[0];
+  for (; k < count; ++k) {
+    y0 += x[k] * y[k];
+    z0 += x[k] * z[k];
+  }
+  *dy = (y0 + yLow[1]) + (yHigh[0] + yHigh[1]);
+  *dz = (z0 + zLow[1]) + (zHigh[0] + zHigh[1]);
+}
+
 // Factors the columns j >= start of the m by m lower triangle l (row j of l
 // is column j of U). Rows below start of every column are taken as already
 // factored. For each column j, with a residual starting at 0: for i below j,
@@ -53,25 +82,56 @@ inline double rowDot(const double* x, const double* y, int count) {
 // residual. d <= 0 (not NaN) stops: the result is j and *residual = |d|.
 // Otherwise l(j,j) = sqrt(d). Success returns -1, *residual holding the last
 // column's sum of squares.
+//
+// Columns go two at a time (j and k = j + 1), so that each earlier row is
+// read once for both; every element gets exactly the arithmetic of the
+// one-column order, and a failure at j restores column k as it was.
 template <class T>
 int choleskyRowForm(T* l, int m, int start, T* residual) {
-  T sumOfSquares = T();
+  T sumJ = T();
+  std::vector<T> saved;
   for (int j = start; j < m; ++j) {
     T* lj = l + static_cast<std::size_t>(j) * m;
-    sumOfSquares = T();
+    T* lk = j + 1 < m ? lj + m : nullptr;
+    if (lk) saved.assign(lk, lk + j);
+    sumJ = T();
+    T sumK = T();
     for (int i = 0; i < j; ++i) {
       const T* li = l + static_cast<std::size_t>(i) * m;
-      if (i >= start) lj[i] = (lj[i] - rowDot(li, lj, i)) / li[i];
-      sumOfSquares += lj[i] * lj[i];
+      if (i >= start) {
+        T dj = T(), dk = T();
+        if (lk) {
+          rowDot2(li, lj, lk, i, &dj, &dk);
+          lk[i] = (lk[i] - dk) / li[i];
+        } else {
+          dj = rowDot(li, lj, i);
+        }
+        lj[i] = (lj[i] - dj) / li[i];
+      }
+      sumJ += lj[i] * lj[i];
+      if (lk) sumK += lk[i] * lk[i];
     }
-    const T d = lj[j] - sumOfSquares;
+    const T d = lj[j] - sumJ;
     if (d <= T()) {
+      if (lk) std::copy(saved.begin(), saved.end(), lk);
       *residual = std::fabs(d);
       return j;
     }
     lj[j] = std::sqrt(d);
+    if (!lk) break;
+    // Column k: its last off-diagonal element, then its pivot.
+    ++j;
+    lk[j - 1] = (lk[j - 1] - rowDot(lj, lk, j - 1)) / lj[j - 1];
+    sumK += lk[j - 1] * lk[j - 1];
+    const T dk = lk[j] - sumK;
+    sumJ = sumK;
+    if (dk <= T()) {
+      *residual = std::fabs(dk);
+      return j;
+    }
+    lk[j] = std::sqrt(dk);
   }
-  *residual = sumOfSquares;
+  *residual = sumJ;
   return -1;
 }
 
