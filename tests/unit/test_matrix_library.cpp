@@ -72,6 +72,16 @@ TEST(MatrixStorage, LayoutsAndZeroSlots) {
   EXPECT_EQ(failureText([&] { sym.ConvertToSmatrix(); }),
             "Smatrix cast: result not a symmetric matrix");
   EXPECT_EQ(mUTmatrixToSmatrix(SmatrixToUTmatrix(s)).storage(), s.storage());
+  std::ostringstream text;
+  text << Vec{1, 2.5};
+  show(text, 3.0);
+  show(text, Mat(Vec{1, 2, 3, 4}, 2));
+  EXPECT_EQ(text.str(), "[1, 2.5]<Value: 3>[1, 2]\n[3, 4]\n");
+  Vec flat(1, -1.0);
+  EXPECT_EQ(mFlattenmatrix(Mat(Vec{1, 2, 3, 4}, 2), flat, 1, false), 5);
+  EXPECT_EQ(flat, (Vec{-1, 1, 3, 2, 4}));
+  EXPECT_EQ(mFlattenmatrix(mUTmatrixToSmatrix(u), flat, 0, true), 10);
+  EXPECT_EQ(flat[4], 5.0);  // (2, 1) after (0,0), (1,0), (1,1), (2,0)
 }
 
 TEST(MatrixOperators, ResultKindsAndWords) {
