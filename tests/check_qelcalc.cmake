@@ -259,3 +259,4 @@ run(0 "^not positive definite at row 1 \\(residual 0\\)\n$" matrix chol ${WORK}/
 run(2 "^$" matrix det ${WORK}/qelcalc_matrix_ragged.txt)
 run(2 "^$" matrix lu ${WORK}/qelcalc_describe.txt)
 run(2 "^$" matrix solve ${WORK}/qelcalc_matrix.txt)
+run(0 "qelcalc matrix lu" matrix --help)

@@ -109,6 +109,10 @@ void printMatrixUsage(std::ostream& out) {
 }
 
 int runMatrixMode(int argc, char** argv, std::ostream& out) {
+  if (argc == 3 && (std::string(argv[2]) == "--help" || std::string(argv[2]) == "-h")) {
+    printMatrixUsage(out);
+    return 0;
+  }
   const Arguments args = parseArguments(argc, argv, 2, {});
   if (!args.options.empty() || !args.flags.empty())
     throw UsageError("matrix takes no options (see qelcalc --help)");
