@@ -6,6 +6,8 @@
 #include <stdexcept>
 #include <utility>
 
+#include "utilities/MatrixLibrary/cholesky_row_form.h"
+
 namespace qel {
 
 namespace {
@@ -377,24 +379,9 @@ UTmatrix<T> UTmatrix<T>::CholeskyDecomp(int start, int* failedRow, T* residual) 
   const int m = this->m_;
   if (start > m) throw std::domain_error("UTmatrix: starting row greater than dimension");
   if (start < 0) start = 0;
-  int failed = -1;
-  T sumOfSquares = T();
   UTmatrix u(*this);
-  for (int j = start; j < m; ++j) {
-    failed = j;
-    sumOfSquares = T();
-    for (int i = 0; i < j; ++i) {
-      if (i >= start) u(i, j) = (u(i, j) - u.DotProduct(i, j, i)) / u(i, i);
-      sumOfSquares += u(i, j) * u(i, j);
-    }
-    const T d = u(j, j) - sumOfSquares;
-    if (d <= T()) {
-      sumOfSquares = std::fabs(d);
-      break;
-    }
-    u(j, j) = std::sqrt(d);
-    failed = -1;
-  }
+  T sumOfSquares = T();
+  const int failed = cholesky_detail::choleskyPackedUpper(u.v_, m, start, &sumOfSquares);
   if (failedRow) *failedRow = failed;
   if (residual) *residual = sumOfSquares;
   return u;
