@@ -1,0 +1,116 @@
+// The chi-square and Bonett (2006) limits of one variance, and Bonett's
+// kurtosis estimate with its trimmed mean.
+#include "interfaces/basic_statistics/utilities_variance.h"
+
+#include <qel/distributions.h>
+#include <qel/order_statistics.h>
+
+#include <algorithm>
+#include <cmath>
+#include <limits>
+#include <new>
+#include <vector>
+
+#include "interfaces/math/random_distributions_v0.h"
+
+namespace qel {
+
+namespace v1 {
+
+double CalcTrimmedKurtosis(double const* x, double variance, unsigned int n, int* status) {
+  *status = qelOk;
+  const double nd = n;
+  const double trim = n > 5 ? 1.0 / (2.0 * std::sqrt(nd - 4.0)) : 0.0;
+  try {
+    std::vector<double> sorted(x, x + n);
+    std::sort(sorted.begin(), sorted.end());
+    const double m = LynTrimmedMeanOnSorted(sorted.data(), n, trim);
+    const double sd = variance >= 0.0 ? std::sqrt(variance) : std::numeric_limits<double>::quiet_NaN();
+    double sum = 0.0;
+    for (double v : sorted) {
+      const double u = (v - m) / sd;
+      const double u2 = u * u;
+      sum += u2 * u2;
+    }
+    return nd / ((nd - 1.0) * (nd - 1.0)) * sum;
+  } catch (const std::bad_alloc&) {
+    *status = qelFailOutOfMemory;
+    return std::numeric_limits<double>::quiet_NaN();
+  }
+}
+
+}  // namespace v1
+
+namespace v0 {
+
+namespace {
+const double kNaN = std::numeric_limits<double>::quiet_NaN();
+const double kInfinity = std::numeric_limits<double>::infinity();
+}  // namespace
+
+bool IsKnownAlternative(AlternativeHypothesis alternative) {
+  return alternative == kAlternativeLess || alternative == kAlternativeNotEqual ||
+         alternative == kAlternativeGreater;
+}
+
+bool IsKnownIntervalType(IntervalType type) {
+  return type == kIntervalUpperBound || type == kIntervalTwoSided || type == kIntervalLowerBound;
+}
+
+int PerformChiSquareMethod(double* lower, double* upper, double variance, double df,
+                           double confidence, IntervalType type) {
+  const double s = variance * df;
+  switch (type) {
+    case kIntervalTwoSided:
+      *lower = s / ChiSqInvCdf((confidence + 1.0) * 0.5, df, 0.0);
+      *upper = s / ChiSqInvCdf((1.0 - confidence) * 0.5, df, 0.0);
+      return qelOk;
+    case kIntervalLowerBound:
+      *lower = s / ChiSqInvCdf(confidence, df, 0.0);
+      *upper = kInfinity;
+      return qelOk;
+    case kIntervalUpperBound:
+      *lower = 0.0;
+      *upper = s / ChiSqInvCdf(1.0 - confidence, df, 0.0);
+      return qelOk;
+  }
+  *lower = kNaN;
+  *upper = kNaN;
+  return qelFailBadEnumValue;
+}
+
+// Bonett's interval exp(ln(f s^2) -/+ z f sqrt(c / (n - 1))) with
+// f = n / (n - z) and c = kurtosis - (n - 3) / n.
+int PerformBonettMethod(double* lower, double* upper, double* varianceThenKurtosis,
+                        double confidence, double const* x, unsigned int n, IntervalType type) {
+  *lower = kNaN;
+  *upper = kNaN;
+  if (!IsKnownIntervalType(type)) return qelFailBadEnumValue;
+  const double s2 = *varianceThenKurtosis;
+  double k = 1.0;
+  if (s2 > 0.0) {
+    int status = qelOk;
+    k = v1::CalcTrimmedKurtosis(x, s2, n, &status);
+    if (status != qelOk) {
+      *varianceThenKurtosis = kNaN;
+      return status;
+    }
+  }
+  *varianceThenKurtosis = k;
+  const double nd = n;
+  const double c = k + 3.0 / nd - 1.0;
+  if (!(c > 0.0 && c < kInfinity)) return qelOk;
+  const double p = type == kIntervalTwoSided ? (confidence + 1.0) * 0.5 : confidence;
+  const double z = NormalInvCdf(p, 0.0, 1.0);
+  if (!(z < nd)) return qelOk;
+  const double f = nd / (nd - z);
+  const double exponent = z * f * std::sqrt(c / (nd - 1.0));
+  // Beyond about 709 the factor is infinite: the limits go to 0 and infinity.
+  const double w = exponent > 709.0 ? kInfinity : std::exp(exponent);
+  *lower = type == kIntervalUpperBound ? 0.0 : f * s2 / w;
+  *upper = type == kIntervalLowerBound ? kInfinity : f * s2 * w;
+  return qelOk;
+}
+
+}  // namespace v0
+}  // namespace qel
