@@ -29,7 +29,7 @@ int chiSquareInterval(OneVariance* r, double confidence, IntervalType type) {
 void chiSquareTest(OneVariance* r, AlternativeHypothesis alternative, double variance0) {
   r->chiSquareStatistic = r->variance * r->degreesOfFreedom / variance0;
   r->chiSquarePValue = r->chiSquareStatistic < std::numeric_limits<double>::infinity()
-                           ? ChiSqPValue(r->chiSquareStatistic, r->degreesOfFreedom, alternative)
+                           ? ChiSqTailPValue(r->chiSquareStatistic, r->degreesOfFreedom, alternative)
                            : kNaN;
 }
 

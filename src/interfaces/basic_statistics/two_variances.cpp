@@ -174,7 +174,7 @@ int PerformFMethod(TwoVariance* r, double confidence, IntervalType type,
   r->fDenominatorDegreesOfFreedom = df2;
   const double ratio = r->firstVariance / r->secondVariance;
   // The quantile of F(df2, df1) scales the variance ratio into its limit.
-  auto limit = [&](double p) { return RootOrNaN(ratio * FInvCdf(p, df2, df1, 0.0)); };
+  auto limit = [&](double p) { return RootOrNaN(ratio * FQuantile(p, df2, df1)); };
   switch (type) {
     case kIntervalTwoSided:
       r->fLowerLimit = limit((1.0 - confidence) * 0.5);
@@ -202,7 +202,7 @@ int PerformFMethod(TwoVariance* r, double confidence, IntervalType type,
     // An infinite ratio: certain against "greater", no evidence for "less".
     r->fPValue = alternative == kAlternativeLess ? 1.0 : 0.0;
   } else {
-    r->fPValue = FPValue(f, df1, df2, alternative);
+    r->fPValue = FTailPValue(f, df1, df2, alternative);
   }
   return qelOk;
 }

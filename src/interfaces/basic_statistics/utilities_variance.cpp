@@ -48,6 +48,28 @@ const double kNaN = std::numeric_limits<double>::quiet_NaN();
 const double kInfinity = std::numeric_limits<double>::infinity();
 }  // namespace
 
+namespace {
+bool anyNaN(double a, double b, double c = 0.0) {
+  return std::isnan(a) || std::isnan(b) || std::isnan(c);
+}
+}  // namespace
+
+double ChiSqQuantile(double p, double df) {
+  return anyNaN(p, df) ? kNaN : ChiSqInvCdf(p, df, 0.0);
+}
+
+double FQuantile(double p, double df1, double df2) {
+  return anyNaN(p, df1, df2) ? kNaN : FInvCdf(p, df1, df2, 0.0);
+}
+
+double ChiSqTailPValue(double x, double df, AlternativeHypothesis alternative) {
+  return anyNaN(x, df) ? kNaN : ChiSqPValue(x, df, alternative);
+}
+
+double FTailPValue(double x, double df1, double df2, AlternativeHypothesis alternative) {
+  return anyNaN(x, df1, df2) ? kNaN : FPValue(x, df1, df2, alternative);
+}
+
 bool IsKnownAlternative(AlternativeHypothesis alternative) {
   return alternative == kAlternativeLess || alternative == kAlternativeNotEqual ||
          alternative == kAlternativeGreater;
@@ -62,16 +84,16 @@ int PerformChiSquareMethod(double* lower, double* upper, double variance, double
   const double s = variance * df;
   switch (type) {
     case kIntervalTwoSided:
-      *lower = s / ChiSqInvCdf((confidence + 1.0) * 0.5, df, 0.0);
-      *upper = s / ChiSqInvCdf((1.0 - confidence) * 0.5, df, 0.0);
+      *lower = s / ChiSqQuantile((confidence + 1.0) * 0.5, df);
+      *upper = s / ChiSqQuantile((1.0 - confidence) * 0.5, df);
       return qelOk;
     case kIntervalLowerBound:
-      *lower = s / ChiSqInvCdf(confidence, df, 0.0);
+      *lower = s / ChiSqQuantile(confidence, df);
       *upper = kInfinity;
       return qelOk;
     case kIntervalUpperBound:
       *lower = 0.0;
-      *upper = s / ChiSqInvCdf(1.0 - confidence, df, 0.0);
+      *upper = s / ChiSqQuantile(1.0 - confidence, df);
       return qelOk;
   }
   *lower = kNaN;

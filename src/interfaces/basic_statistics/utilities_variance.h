@@ -45,6 +45,13 @@ int PerformLeveneMethod(TwoVariance* record, double const* dx, double const* dy,
                         double confidence, IntervalType type, AlternativeHypothesis alternative,
                         double ratio0);
 
+// The exported chi-square and F functions with NaN for a NaN argument,
+// which those functions do not check before they arm the frame.
+double ChiSqQuantile(double p, double df);
+double FQuantile(double p, double df1, double df2);
+double ChiSqTailPValue(double x, double df, AlternativeHypothesis alternative);
+double FTailPValue(double x, double df1, double df2, AlternativeHypothesis alternative);
+
 bool IsKnownAlternative(AlternativeHypothesis alternative);
 bool IsKnownIntervalType(IntervalType type);
 
