@@ -10,6 +10,7 @@
 #include "describe_mode.h"
 #include "distribution_mode.h"
 #include "fit_mode.h"
+#include "proportion_variance_mode.h"
 #include "pvalue_mode.h"
 #include "rank_test_mode.h"
 #include "sample_mode.h"
@@ -28,6 +29,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printTTestUsage(out);
   qelcalc::printTestUsage(out);
   qelcalc::printRankTestUsage(out);
+  qelcalc::printProportionVarianceUsage(out);
   qelcalc::printFitUsage(out);
   qelcalc::printSummaryUsage(out);
   qelcalc::printTableUsage(out);

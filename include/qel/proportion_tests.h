@@ -99,8 +99,8 @@ QEL_API int RunOneProportionWilson(OneProportion* record, bool continuityCorrect
 // two-sided P-value twice the smaller tail (each tail holding x), at most 1.
 QEL_API int RunOneProportionClopperPearson(OneProportion* record, double confidence,
                                            IntervalType type);
-QEL_API int RunOneProportionClopperPearson(OneProportion* record,
-                                           AlternativeHypothesis alternative, double p0);
+QEL_API int RunOneProportionClopperPearson(OneProportion* record, AlternativeHypothesis alternative,
+                                           double p0);
 
 // Wald interval p -/+ q sqrt(p (1 - p) / n); the correction widens both
 // limits by 0.5 / n.
@@ -143,8 +143,8 @@ QEL_API int RunTwoProportionWaldCI(TwoProportion* record, bool continuityCorrect
                                    double confidence, IntervalType type);
 // Agresti-Caffo (2000): the Wald interval after adding one event and two
 // trials to each sample (addOneTwo), or z^2 / 4 events and z^2 / 2 trials.
-QEL_API int RunTwoProportionAgrestiCaffoCI(TwoProportion* record, bool addOneTwo,
-                                           double confidence, IntervalType type);
+QEL_API int RunTwoProportionAgrestiCaffoCI(TwoProportion* record, bool addOneTwo, double confidence,
+                                           IntervalType type);
 
 }  // namespace v0
 }  // namespace qel

@@ -80,9 +80,9 @@ QEL_API int RunOneVariance(OneVariance* record, double confidence, IntervalType 
 // of mean absolute deviations from the median), whose two samples are
 // handled in parallel. Summary form: chi-square limits of each standard
 // deviation, the F interval of the ratio and the F test.
-QEL_API int RunTwoVariance(TwoVariance* record, double const* x, double const* y,
-                           double confidence, IntervalType type, AlternativeHypothesis alternative,
-                           double ratio0, bool useLevene);
+QEL_API int RunTwoVariance(TwoVariance* record, double const* x, double const* y, double confidence,
+                           IntervalType type, AlternativeHypothesis alternative, double ratio0,
+                           bool useLevene);
 QEL_API int RunTwoVariance(TwoVariance* record, double confidence, IntervalType type,
                            AlternativeHypothesis alternative, double ratio0);
 

@@ -82,14 +82,14 @@ bool mCalcStartValues(CmBonettPValueFunction& f, double* low, double* high) {
   return true;
 }
 
-double mCalcBonettPValue(EAlternative alternative, double n, double variance,
-                         double standardError, double variance0) {
+double mCalcBonettPValue(EAlternative alternative, double n, double variance, double standardError,
+                         double variance0) {
   const double missing = mGetMissingValueCode();
   if (alternative != kAlternativeLess && alternative != kAlternativeNotEqual &&
       alternative != kAlternativeGreater)
     return 0.0;
-  if (!(n > 1.0 && positiveFinite(n) && positiveFinite(variance) &&
-        positiveFinite(standardError) && positiveFinite(variance0)))
+  if (!(n > 1.0 && positiveFinite(n) && positiveFinite(variance) && positiveFinite(standardError) &&
+        positiveFinite(variance0)))
     return missing;
   // One side: true with *p set (missing when the search fails), false when
   // the limit never reaches variance0.
@@ -228,7 +228,7 @@ double mCalcConfLimitForRatioOfStDevs(bool upper, BonettCIForStdDevRatio const& 
 bool mCalcCIForRatios(double* lower, double* upper, BonettCIForStdDevRatio& first,
                       BonettCIForStdDevRatio& second, double alpha, EConfidenceType type) {
   const double missing = mGetMissingValueCode();
-  const EAlternative alternative = type == kConfidenceTwoSided   ? kAlternativeNotEqual
+  const EAlternative alternative = type == kConfidenceTwoSided    ? kAlternativeNotEqual
                                    : type == kConfidenceLowerSide ? kAlternativeGreater
                                                                   : kAlternativeLess;
   const double z = v0::NormalCritValue(alpha, alternative);

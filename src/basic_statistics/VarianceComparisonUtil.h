@@ -44,8 +44,8 @@ bool mCalcStartValues(CmBonettPValueFunction& function, double* low, double* hig
 // P-value of variance0 by Bonett's test: 1 - Phi(root); for "greater" 1
 // when no root exists, for "not equal" twice the smaller side; 0 for an
 // unknown alternative. The missing value when the root search fails.
-double mCalcBonettPValue(EAlternative alternative, double n, double variance,
-                         double standardError, double variance0);
+double mCalcBonettPValue(EAlternative alternative, double n, double variance, double standardError,
+                         double variance0);
 
 // Two-sample P-value equation in z, r = v1/v2 and q the hypothesised
 // variance ratio:

@@ -53,7 +53,9 @@ TwoProportion two(std::vector<double> const& v) {
   return r;
 }
 
-IntervalType typeOf(double t) { return static_cast<IntervalType>(static_cast<int>(t)); }
+IntervalType typeOf(double t) {
+  return static_cast<IntervalType>(static_cast<int>(t));
+}
 AlternativeHypothesis altOf(double a) {
   return static_cast<AlternativeHypothesis>(static_cast<int>(a));
 }
@@ -147,7 +149,8 @@ TEST(ProportionsReference, AgreeWithMpmath) {
     } else if (l.kind == "agresti" || l.kind == "waldcc" || l.kind == "wilson") {
       OneProportion r = one(v[0], v[1]);
       const bool flag = v[4] != 0.0;
-      const int code = l.kind == "agresti" ? RunOneProportionAgrestiCoullCI(&r, flag, v[2], typeOf(v[3]))
+      const int code = l.kind == "agresti"
+                           ? RunOneProportionAgrestiCoullCI(&r, flag, v[2], typeOf(v[3]))
                        : l.kind == "waldcc" ? RunOneProportionWaldCI(&r, flag, v[2], typeOf(v[3]))
                                             : RunOneProportionWilson(&r, flag, v[2], typeOf(v[3]));
       ASSERT_EQ(code, 0);
@@ -161,9 +164,9 @@ TEST(ProportionsReference, AgreeWithMpmath) {
       NEAR_REL(r.pValue, v[6], 5e-10, l);
     } else if (l.kind == "caffo" || l.kind == "wald2cc") {
       TwoProportion r = two(v);
-      const int code =
-          l.kind == "caffo" ? RunTwoProportionAgrestiCaffoCI(&r, v[6] != 0.0, v[4], typeOf(v[5]))
-                            : RunTwoProportionWaldCI(&r, true, v[4], typeOf(v[5]));
+      const int code = l.kind == "caffo"
+                           ? RunTwoProportionAgrestiCaffoCI(&r, v[6] != 0.0, v[4], typeOf(v[5]))
+                           : RunTwoProportionWaldCI(&r, true, v[4], typeOf(v[5]));
       ASSERT_EQ(code, 0);
       NEAR_LIMIT(r.lowerLimit, v[7], l);
       NEAR_LIMIT(r.upperLimit, v[8], l);
@@ -227,12 +230,12 @@ TEST(OneProportionRules, EdgeCases) {
 
 TEST(TwoProportionRules, NonZeroDeltaIsUnpooledWithoutFisher) {
   TwoProportion a = two({30, 100, 15, 100}), b = two({30, 100, 15, 100});
-  ASSERT_EQ(RunLynTwoProportion(&a, true, 0.95, qel::kIntervalTwoSided, qel::kAlternativeGreater,
-                                0.1),
-            0);
-  ASSERT_EQ(RunLynTwoProportion(&b, false, 0.95, qel::kIntervalTwoSided, qel::kAlternativeGreater,
-                                0.1),
-            0);
+  ASSERT_EQ(
+      RunLynTwoProportion(&a, true, 0.95, qel::kIntervalTwoSided, qel::kAlternativeGreater, 0.1),
+      0);
+  ASSERT_EQ(
+      RunLynTwoProportion(&b, false, 0.95, qel::kIntervalTwoSided, qel::kAlternativeGreater, 0.1),
+      0);
   EXPECT_EQ(a.statistic, b.statistic);
   EXPECT_NEAR(a.statistic, 0.05 / std::sqrt(0.21 / 100 + 0.1275 / 100), 1e-14);
   EXPECT_TRUE(std::isnan(a.exactPValue));

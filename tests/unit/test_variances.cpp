@@ -34,7 +34,9 @@ const std::map<std::string, std::vector<double>>& samples() {
   return table;
 }
 
-IntervalType typeOf(double t) { return static_cast<IntervalType>(static_cast<int>(t)); }
+IntervalType typeOf(double t) {
+  return static_cast<IntervalType>(static_cast<int>(t));
+}
 AlternativeHypothesis altOf(double a) {
   return static_cast<AlternativeHypothesis>(static_cast<int>(a));
 }
@@ -105,9 +107,8 @@ TEST(BonettDuality, LimitMeetsHypothesisAtOneMinusP) {
   for (const char* name : {"a", "c", "e", "g"}) {
     const auto& x = samples().at(name);
     for (double scale : {0.6, 1.4}) {
-      const double variance0 = scale * runOne(x, 0.95, qel::kIntervalTwoSided,
-                                              qel::kAlternativeLess, 1.0)
-                                           .variance;
+      const double variance0 =
+          scale * runOne(x, 0.95, qel::kIntervalTwoSided, qel::kAlternativeLess, 1.0).variance;
       for (int a : {-1, 1}) {
         const double p = runOne(x, 0.95, qel::kIntervalTwoSided, altOf(a), variance0).bonettPValue;
         if (!(p > 1e-6 && p < 0.999)) continue;
@@ -118,8 +119,8 @@ TEST(BonettDuality, LimitMeetsHypothesisAtOneMinusP) {
       }
     }
   }
-  for (auto pair : {std::make_pair("a", "b"), std::make_pair("c", "d"),
-                    std::make_pair("e", "f"), std::make_pair("g", "h")}) {
+  for (auto pair : {std::make_pair("a", "b"), std::make_pair("c", "d"), std::make_pair("e", "f"),
+                    std::make_pair("g", "h")}) {
     const auto& x = samples().at(pair.first);
     const auto& y = samples().at(pair.second);
     for (double ratio0 : {0.8, 1.0, 1.5}) {
@@ -141,8 +142,8 @@ TEST(VarianceEdges, KurtosisTrimAndDegenerateSamples) {
   // n = 5: no trimming, the mean 4; n = 6: trim 1/(2 sqrt 2) leaves 3.5.
   const std::vector<double> five = {1, 2, 3, 4, 10}, six = {1, 2, 3, 4, 5, 100};
   int status = -1;
-  EXPECT_NEAR(qel::v1::CalcTrimmedKurtosis(five.data(), 12.5, 5, &status),
-              5.0 / 16 * 1394 / 156.25, 1e-13);
+  EXPECT_NEAR(qel::v1::CalcTrimmedKurtosis(five.data(), 12.5, 5, &status), 5.0 / 16 * 1394 / 156.25,
+              1e-13);
   EXPECT_EQ(status, 0);
   double sum = 0, mean = 115.0 / 6, ss = 0;
   for (double v : six) sum += std::pow(v - 3.5, 4), ss += (v - mean) * (v - mean);
@@ -150,13 +151,13 @@ TEST(VarianceEdges, KurtosisTrimAndDegenerateSamples) {
                   (6.0 / 25 * sum / (ss * ss / 25)),
               1.0, 1e-13);
   // A constant sample: kurtosis 1, Bonett limits 0.
-  const OneVariance flat = runOne({3, 3, 3, 3, 3, 3, 3}, 0.95, qel::kIntervalTwoSided,
-                                  qel::kAlternativeNotEqual, 1.0);
+  const OneVariance flat =
+      runOne({3, 3, 3, 3, 3, 3, 3}, 0.95, qel::kIntervalTwoSided, qel::kAlternativeNotEqual, 1.0);
   EXPECT_EQ(flat.bonettLowerLimit, 0.0);
   EXPECT_EQ(flat.bonettUpperLimit, 0.0);
   // A quantile not below n: no Bonett limits, code 0.
-  const OneVariance tiny = runOne({1.0, 2.5}, 0.99, qel::kIntervalTwoSided,
-                                  qel::kAlternativeNotEqual, 1.0);
+  const OneVariance tiny =
+      runOne({1.0, 2.5}, 0.99, qel::kIntervalTwoSided, qel::kAlternativeNotEqual, 1.0);
   EXPECT_TRUE(std::isnan(tiny.bonettLowerLimit) && std::isnan(tiny.bonettUpperLimit));
   // F: an infinite statistic gives 0 against "greater", 0/0 gives 1.
   TwoVariance inf, nan;
@@ -197,34 +198,37 @@ TEST(VarianceBadInput, CodesAndNaN) {
     TwoVariance two;
     two.firstN = static_cast<unsigned>(x.size());
     two.secondN = static_cast<unsigned>(y.size());
-    EXPECT_EQ(RunTwoVariance(&two, x.data(), y.data(), 0.95, badType, qel::kAlternativeLess, 1.0,
-                             levene),
-              30002);
+    EXPECT_EQ(
+        RunTwoVariance(&two, x.data(), y.data(), 0.95, badType, qel::kAlternativeLess, 1.0, levene),
+        30002);
     EXPECT_TRUE(std::isnan(two.fLowerLimit) && std::isnan(two.leveneLowerLimit));
   }
   // Hypothesised values of 0, tiny samples, NaN data, odd confidences:
   // code 0 and NaN where nothing can be formed, never a crash.
   one = runOne(x, 0.95, qel::kIntervalTwoSided, qel::kAlternativeNotEqual, 0.0);
   EXPECT_TRUE(std::isnan(one.bonettPValue) && std::isnan(one.chiSquarePValue));
-  const TwoVariance zero = runTwo(x, y, 0.95, qel::kIntervalTwoSided, qel::kAlternativeLess, 0.0, false);
+  const TwoVariance zero =
+      runTwo(x, y, 0.95, qel::kIntervalTwoSided, qel::kAlternativeLess, 0.0, false);
   EXPECT_TRUE(std::isnan(zero.bonettPValue));
   EXPECT_EQ(zero.fPValue, 1.0);
   std::vector<double> withNaN = x;
   withNaN[3] = kNaN;
   for (double confidence : {0.0, 1.0, kNaN, 0.95}) {
     for (bool levene : {false, true}) {
-      runTwo(withNaN, y, confidence, qel::kIntervalTwoSided, qel::kAlternativeNotEqual, 1.0, levene);
-      runTwo({1.0}, {2.0}, confidence, qel::kIntervalLowerBound, qel::kAlternativeGreater, 1.0, levene);
+      runTwo(withNaN, y, confidence, qel::kIntervalTwoSided, qel::kAlternativeNotEqual, 1.0,
+             levene);
+      runTwo({1.0}, {2.0}, confidence, qel::kIntervalLowerBound, qel::kAlternativeGreater, 1.0,
+             levene);
       runTwo({}, {}, confidence, qel::kIntervalUpperBound, qel::kAlternativeLess, 1.0, levene);
       runTwo({4, 4, 4}, {4, 4, 4, 4}, confidence, qel::kIntervalTwoSided, qel::kAlternativeLess,
              1.0, levene);
     }
-    const OneVariance single = runOne({2.0}, confidence, qel::kIntervalTwoSided,
-                                      qel::kAlternativeNotEqual, 1.0);
+    const OneVariance single =
+        runOne({2.0}, confidence, qel::kIntervalTwoSided, qel::kAlternativeNotEqual, 1.0);
     EXPECT_TRUE(std::isnan(single.bonettPValue));
-    EXPECT_TRUE(std::isnan(runOne(withNaN, confidence, qel::kIntervalTwoSided,
-                                  qel::kAlternativeLess, 1.0)
-                               .chiSquareLowerLimit));
+    EXPECT_TRUE(
+        std::isnan(runOne(withNaN, confidence, qel::kIntervalTwoSided, qel::kAlternativeLess, 1.0)
+                       .chiSquareLowerLimit));
   }
   EXPECT_TRUE(std::isnan(SolvePValueEquation(10, 20, 0.0, 1.0, 0.3)));
 }

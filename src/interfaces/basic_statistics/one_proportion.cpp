@@ -261,15 +261,14 @@ double GetSampleProportion(unsigned int events, unsigned int trials) {
   return static_cast<double>(events) / static_cast<double>(trials);
 }
 
-int RunLynOneProportion(OneProportion* record, int const* events, bool useNormal,
-                        double confidence, IntervalType type) {
+int RunLynOneProportion(OneProportion* record, int const* events, bool useNormal, double confidence,
+                        IntervalType type) {
   countEvents(record, events);
   return lynInterval(record, useNormal, confidence, type);
 }
 
-int RunLynOneProportion(OneProportion* record, int const* events, bool useNormal,
-                        double confidence, IntervalType type, AlternativeHypothesis alternative,
-                        double p0) {
+int RunLynOneProportion(OneProportion* record, int const* events, bool useNormal, double confidence,
+                        IntervalType type, AlternativeHypothesis alternative, double p0) {
   countEvents(record, events);
   return lynBoth(record, useNormal, confidence, type, alternative, p0);
 }
@@ -284,8 +283,8 @@ int RunLynOneProportion(OneProportion* record, bool useNormal, AlternativeHypoth
   return lynTest(record, useNormal, alternative, p0);
 }
 
-int RunLynOneProportion(OneProportion* record, bool useNormal, double confidence,
-                        IntervalType type, AlternativeHypothesis alternative, double p0) {
+int RunLynOneProportion(OneProportion* record, bool useNormal, double confidence, IntervalType type,
+                        AlternativeHypothesis alternative, double p0) {
   return lynBoth(record, useNormal, confidence, type, alternative, p0);
 }
 
@@ -349,8 +348,8 @@ int RunOneProportionWaldCI(OneProportion* record, bool continuityCorrection, dou
                            IntervalType type) {
   const double n = record->trials;
   const double p = GetSampleProportion(record->events, record->trials);
-  const int code =
-      NormalInterval(confidence, type, p, waldError(p, n), &record->lowerLimit, &record->upperLimit);
+  const int code = NormalInterval(confidence, type, p, waldError(p, n), &record->lowerLimit,
+                                  &record->upperLimit);
   if (code == qelOk && continuityCorrection) {
     record->lowerLimit -= 0.5 / n;
     record->upperLimit += 0.5 / n;

@@ -28,9 +28,10 @@ int chiSquareInterval(OneVariance* r, double confidence, IntervalType type) {
 
 void chiSquareTest(OneVariance* r, AlternativeHypothesis alternative, double variance0) {
   r->chiSquareStatistic = r->variance * r->degreesOfFreedom / variance0;
-  r->chiSquarePValue = r->chiSquareStatistic < std::numeric_limits<double>::infinity()
-                           ? ChiSqTailPValue(r->chiSquareStatistic, r->degreesOfFreedom, alternative)
-                           : kNaN;
+  r->chiSquarePValue =
+      r->chiSquareStatistic < std::numeric_limits<double>::infinity()
+          ? ChiSqTailPValue(r->chiSquareStatistic, r->degreesOfFreedom, alternative)
+          : kNaN;
 }
 
 void bonettTest(OneVariance* r, double kurtosis, AlternativeHypothesis alternative,

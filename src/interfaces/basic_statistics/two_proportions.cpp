@@ -2,9 +2,9 @@
 // pooled or unpooled z test, Fisher's exact test (through the
 // hypergeometric law of the first sample's events given both margins), and
 // the Agresti-Caffo (2000) interval.
-#include <limits>
-
 #include <qel/proportion_tests.h>
+
+#include <limits>
 
 #include "interfaces/basic_statistics/proportions.h"
 #include "interfaces/basic_statistics/utilities.h"
@@ -45,11 +45,11 @@ int runTest(TwoProportion* r, bool pooled, AlternativeHypothesis alternative, do
     const unsigned long events = static_cast<unsigned long>(r->firstEvents) + r->secondEvents;
     // The hypergeometric law counts in unsigned int; larger tables have none.
     const unsigned long most = std::numeric_limits<unsigned int>::max();
-    r->exactPValue = total > most || events > most
-                         ? kNaN
-                         : v1::HypergeometricPValue(r->firstEvents, static_cast<unsigned>(total),
-                                                    r->firstTrials, static_cast<unsigned>(events),
-                                                    alternative);
+    r->exactPValue =
+        total > most || events > most
+            ? kNaN
+            : v1::HypergeometricPValue(r->firstEvents, static_cast<unsigned>(total), r->firstTrials,
+                                       static_cast<unsigned>(events), alternative);
   }
   return qelOk;
 }

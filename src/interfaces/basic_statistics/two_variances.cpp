@@ -65,8 +65,7 @@ void bonettTest(TwoVariance* r, BonettCIForStdDevRatio const& first,
     return;
   }
   r->bonettStatistic = kNaN;
-  const double greater =
-      alternative != kAlternativeLess ? bonettSide(n1, n2, ratio, q, se) : 1.0;
+  const double greater = alternative != kAlternativeLess ? bonettSide(n1, n2, ratio, q, se) : 1.0;
   const double less =
       alternative != kAlternativeGreater ? bonettSide(n2, n1, 1.0 / ratio, 1.0 / q, se) : 1.0;
   const double p = std::min(greater, less);
@@ -123,7 +122,8 @@ int summaryForm(TwoVariance* r, double confidence, IntervalType type,
   double limits[4];
   const double df1 = static_cast<double>(r->firstN) - 1.0;
   const double df2 = static_cast<double>(r->secondN) - 1.0;
-  int code = PerformChiSquareMethod(&limits[0], &limits[1], r->firstVariance, df1, confidence, type);
+  int code =
+      PerformChiSquareMethod(&limits[0], &limits[1], r->firstVariance, df1, confidence, type);
   PerformChiSquareMethod(&limits[2], &limits[3], r->secondVariance, df2, confidence, type);
   r->firstStdDevLowerLimit = RootOrNaN(limits[0]);
   r->firstStdDevUpperLimit = RootOrNaN(limits[1]);
@@ -207,9 +207,8 @@ int PerformFMethod(TwoVariance* r, double confidence, IntervalType type,
   return qelOk;
 }
 
-int PerformBonettMethodForEach(TwoVariance* r, double const* x, double const* y,
-                               double confidence, IntervalType type, double* firstKurtosis,
-                               double* secondKurtosis) {
+int PerformBonettMethodForEach(TwoVariance* r, double const* x, double const* y, double confidence,
+                               IntervalType type, double* firstKurtosis, double* secondKurtosis) {
   double lower, upper;
   *firstKurtosis = r->firstVariance;
   *secondKurtosis = r->secondVariance;
@@ -270,14 +269,13 @@ int PerformLeveneMethod(TwoVariance* r, double const* dx, double const* dy, doub
   }
   const double var1 = v1 * s * (nd1 - 1.0) / df;
   const double var2 = v2 * s * (nd2 - 1.0) / df;
-  const double q = v0::TInvCdf(type == kIntervalTwoSided ? (confidence + 1.0) * 0.5 : confidence, df, 0.0);
+  const double q =
+      v0::TInvCdf(type == kIntervalTwoSided ? (confidence + 1.0) * 0.5 : confidence, df, 0.0);
   const double sdRatio = RootOrNaN(r->firstVariance / r->secondVariance);
-  r->leveneLowerLimit = type == kIntervalUpperBound
-                            ? 0.0
-                            : fiellerLimit(false, m1, m2, var1, var2, q, sdRatio);
-  r->leveneUpperLimit = type == kIntervalLowerBound
-                            ? kInfinity
-                            : fiellerLimit(true, m1, m2, var1, var2, q, sdRatio);
+  r->leveneLowerLimit =
+      type == kIntervalUpperBound ? 0.0 : fiellerLimit(false, m1, m2, var1, var2, q, sdRatio);
+  r->leveneUpperLimit =
+      type == kIntervalLowerBound ? kInfinity : fiellerLimit(true, m1, m2, var1, var2, q, sdRatio);
   if (!IsKnownAlternative(alternative)) return qelFailBadEnumValue;
   const double t = (m1 - ratio0 * m2) /
                    RootOrNaN(((nd1 - 1.0) * v1 + (nd2 - 1.0) * v2 * ratio0 * ratio0) / df * s);

@@ -25,7 +25,8 @@ double CalcTrimmedKurtosis(double const* x, double variance, unsigned int n, int
     std::vector<double> sorted(x, x + n);
     std::sort(sorted.begin(), sorted.end());
     const double m = LynTrimmedMeanOnSorted(sorted.data(), n, trim);
-    const double sd = variance >= 0.0 ? std::sqrt(variance) : std::numeric_limits<double>::quiet_NaN();
+    const double sd =
+        variance >= 0.0 ? std::sqrt(variance) : std::numeric_limits<double>::quiet_NaN();
     double sum = 0.0;
     for (double v : sorted) {
       const double u = (v - m) / sd;

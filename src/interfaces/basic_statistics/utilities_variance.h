@@ -41,9 +41,8 @@ void CalcAbsMedianDeviations(double* x, unsigned int n1, double* y, unsigned int
 // The t test of mean |x - median| = ratio0 * mean |y - median| on pooled
 // variances and Fieller's interval for the ratio of the two means; the
 // moments of the two samples in one parallel section each. 0 or 30002.
-int PerformLeveneMethod(TwoVariance* record, double const* dx, double const* dy,
-                        double confidence, IntervalType type, AlternativeHypothesis alternative,
-                        double ratio0);
+int PerformLeveneMethod(TwoVariance* record, double const* dx, double const* dy, double confidence,
+                        IntervalType type, AlternativeHypothesis alternative, double ratio0);
 
 // The exported chi-square and F functions with NaN for a NaN argument,
 // which those functions do not check before they arm the frame.
