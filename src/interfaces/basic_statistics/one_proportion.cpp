@@ -87,8 +87,15 @@ int exactTest(OneProportion* r, AlternativeHypothesis alternative, double p0) {
 double midPEquation(bool lowerBound, unsigned int x, unsigned int n, double p, double alpha,
                     double* slope) {
   const double f = v1::BinomialPdf(x, n, p);
-  const double g =
-      v1::BinomialPdf(x, n - 1, p) + (x > 0 ? v1::BinomialPdf(x - 1.0, n - 1, p) : 0.0);
+  // g = pdf(x; n-1, p) + pdf(x-1; n-1, p) = f ((n-x)/(n(1-p)) + x/(n p)),
+  // each term taken from f by the ratio of the masses; at p = 0 or 1 only
+  // the term that survives is formed directly.
+  double g;
+  if (p > 0.0 && p < 1.0) {
+    g = f * ((n - static_cast<double>(x)) / (n * (1.0 - p)) + x / (n * p));
+  } else {
+    g = v1::BinomialPdf(x, n - 1, p) + (x > 0 ? v1::BinomialPdf(x - 1.0, n - 1, p) : 0.0);
+  }
   const double tail = v1::BinomialCdf(x, n, p, lowerBound);
   *slope = (lowerBound ? 0.5 : -0.5) * n * g;
   return tail - 0.5 * f - alpha;

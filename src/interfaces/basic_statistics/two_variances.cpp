@@ -78,15 +78,18 @@ EConfidenceType confidenceTypeOf(IntervalType type) {
   return kConfidenceTwoSided;
 }
 
-// Median by the type 6 quantile at 0.5 of sorted data, then the absolute
-// deviations from it in place.
+// Median by the type 6 quantile at 0.5, then the absolute deviations from
+// it in place. The median's order statistics come from a selection
+// (std::nth_element) rather than a sort: the deviations are summed in any
+// order.
 void absDeviations(double* x, unsigned int n) {
   if (n == 0) return;
-  std::sort(x, x + n);
   const double h = 0.5 * (static_cast<double>(n) + 1.0);
   const unsigned int j = static_cast<unsigned int>(h);  // 1-based
   const double fraction = h - j;
-  const double median = fraction == 0.0 ? x[j - 1] : x[j - 1] + fraction * (x[j] - x[j - 1]);
+  std::nth_element(x, x + (j - 1), x + n);
+  double median = x[j - 1];
+  if (fraction != 0.0) median += fraction * (*std::min_element(x + j, x + n) - x[j - 1]);
   for (unsigned int i = 0; i < n; ++i) x[i] = std::fabs(x[i] - median);
 }
 

@@ -33,7 +33,7 @@ int PerformBonettMethod(TwoVariance* record, double const* x, double const* y, d
 int PerformFMethod(TwoVariance* record, double confidence, IntervalType type,
                    AlternativeHypothesis alternative, double ratio0);
 
-// Sorts x and y in place and replaces each value by its absolute deviation
+// Reorders x and y in place and replaces each value by its absolute deviation
 // from its sample's median (the type 6 quantile at 0.5); one parallel
 // section a sample.
 void CalcAbsMedianDeviations(double* x, unsigned int n1, double* y, unsigned int n2);
