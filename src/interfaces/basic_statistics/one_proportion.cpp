@@ -101,14 +101,29 @@ double midPEquation(bool lowerBound, unsigned int x, unsigned int n, double p, d
   return tail - 0.5 * f - alpha;
 }
 
-// Newton's method from p = x/n, at most 50 steps, ending when a step is
+// The Wilson score limit at level alpha: close to the mid-P bound (the
+// score interval approximates the mid-P one, Agresti and Gottard, 2007), so
+// that Newton's method needs two or three binomial tails instead of five or
+// six from x/n. x = 0 and x = n start from x/n, where the bound is exact.
+double midPStart(bool lowerBound, unsigned int x, unsigned int n, double alpha) {
+  const double p = static_cast<double>(x) / n;
+  if (x == 0 || x == n || !(alpha > 0.0 && alpha < 0.5)) return p;
+  const double z = NormalInvCdf(1.0 - alpha, 0.0, 1.0);
+  const double z2 = z * z, d = n + z2;
+  const double half = z * RootOrNaN((1.0 - p) * x + 0.25 * z2) / d;
+  const double centre = (x + 0.5 * z2) / d;
+  const double start = lowerBound ? centre - half : centre + half;
+  return start > 0.0 && start < 1.0 ? start : p;
+}
+
+// Newton's method from midPStart, at most 50 steps, ending when a step is
 // below 1e-12. The iterate stays in [0, 1] and in the bracket that the signs
 // seen so far leave: a step that would leave it halves the bracket instead
 // (a safeguarded Newton iteration, Press et al., Numerical Recipes, rtsafe),
 // so that a flat tail cannot throw the iteration out of the root's branch.
 double midPBound(bool lowerBound, unsigned int x, unsigned int n, double alpha) {
   if (n == 0 || x > n || !(alpha >= 0.0 && alpha <= 1.0)) return kNaN;
-  double p = static_cast<double>(x) / n;
+  double p = midPStart(lowerBound, x, n, alpha);
   double low = 0.0, high = 1.0;
   for (int step = 0; step < 50; ++step) {
     double slope = 0.0;
