@@ -246,3 +246,16 @@ run(2 "^$" test wilcoxon ${WORK}/qelcalc_groups.csv --column 1 --column2 3)
 run(2 "^$" test wilcoxon ${WORK}/qelcalc_groups.csv --approximate)
 run(2 "^$" test runs ${WORK}/qelcalc_ga.txt --mu 1)
 run(2 "^$" test runs)
+
+# Proportions and variances (R: 1 - 0.05^(1/10) and fisher.test).
+run(0 "events 0\ntrials 10\nproportion 0\nlower 0\nupper 0\\.2588655508930[0-9]*\n"
+    test proportion --events 0 --trials 10 --method lyn-exact)
+run(0 "exact_p 0\\.09324880049314[0-9]*\n$" test two-proportions --events 15,9 --trials 40,45)
+file(WRITE ${WORK}/qelcalc_events.txt "1\n0\n1\n1\n")
+run(0 "^events 3\ntrials 4\n" test proportion ${WORK}/qelcalc_events.txt --method wilson)
+run(0 "f_df1 8\nf_df2 5\n$" test two-variances ${WORK}/qelcalc_groups.csv --column 1 --column2 3 --levene)
+run(2 "^$" test proportion --events 7 --trials 3)
+run(2 "^$" test proportion --events 1 --trials 3 --method bogus)
+run(2 "^$" test proportion ${WORK}/qelcalc_input.txt)
+run(2 "^$" test two-variances --variances 2,3)
+run(2 "^$" test variance ${WORK}/qelcalc_events.txt --variance0 0)
