@@ -17,7 +17,8 @@
 //
 // Return codes: 0, or 30002 for an IntervalType outside -1, 0, 1 (both
 // limits NaN, test not run) or for an alternative outside -1, 0, 1 in an
-// exact or mid-P test (P-value left as it stands). Nothing else is checked:
+// exact or mid-P test (P-value left as it stands); the z tests answer such
+// an alternative with a NaN P-value and code 0. Nothing else is checked:
 // n = 0, events > trials or a confidence outside (0, 1) give NaN in the
 // concerned fields and code 0. The data forms count events as the plain sum
 // of their int entries.

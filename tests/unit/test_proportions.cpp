@@ -260,6 +260,8 @@ TEST(ProportionsBadInput, CodesAndNaN) {
   EXPECT_EQ(RunOneProportion(&r, false, 0.95, qel::kIntervalTwoSided, badAlt, 0.5),
             qel::qelFailBadEnumValue);
   EXPECT_EQ(r.pValue, 0.125);
+  EXPECT_EQ(RunOneProportionWilson(&r, false, badAlt, 0.5), 0);
+  EXPECT_TRUE(std::isnan(r.pValue));
   for (double confidence : {0.0, 1.0, kNaN}) {
     OneProportion c = one(3, 10);
     EXPECT_EQ(RunOneProportionMidP(&c, confidence, qel::kIntervalTwoSided), 0);

@@ -14,6 +14,9 @@ double RootOrNaN(double v) {
 }
 
 double ZPValue(double z, AlternativeHypothesis alternative) {
+  if (alternative != kAlternativeLess && alternative != kAlternativeNotEqual &&
+      alternative != kAlternativeGreater)
+    return std::numeric_limits<double>::quiet_NaN();
   if (std::isinf(z)) {
     if (alternative == kAlternativeLess) return z < 0.0 ? 0.0 : 1.0;
     if (alternative == kAlternativeGreater) return z > 0.0 ? 0.0 : 1.0;

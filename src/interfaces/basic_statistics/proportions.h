@@ -13,6 +13,7 @@ double RootOrNaN(double v);
 
 // Normal P-value of a z statistic. An infinite z (p0 of 0 or 1, or a zero
 // variance) gets the limit of each tail: 0 or 1 on one side, 0 two-sided.
+// NaN for an alternative outside -1, 0, 1 (the z tests return no code).
 double ZPValue(double z, AlternativeHypothesis alternative);
 
 // Wald-type interval estimate -/+ q * standardError with q the normal
