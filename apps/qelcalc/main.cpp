@@ -11,6 +11,7 @@
 #include "distribution_mode.h"
 #include "fit_mode.h"
 #include "matrix_mode.h"
+#include "proportion_variance_mode.h"
 #include "pvalue_mode.h"
 #include "rank_test_mode.h"
 #include "sample_mode.h"
@@ -29,6 +30,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printTTestUsage(out);
   qelcalc::printTestUsage(out);
   qelcalc::printRankTestUsage(out);
+  qelcalc::printProportionVarianceUsage(out);
   qelcalc::printFitUsage(out);
   qelcalc::printSummaryUsage(out);
   qelcalc::printTableUsage(out);

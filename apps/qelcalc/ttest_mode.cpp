@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "cli.h"
+#include "proportion_variance_mode.h"
 #include "rank_test_mode.h"
 #include "test_input.h"
 
@@ -160,10 +161,11 @@ void printTestUsage(std::ostream& out) {
 }
 
 int runTestMode(int argc, char** argv, std::ostream& out) {
-  const Arguments args = parseArguments(argc, argv, 2, {"pooled", "approximate"});
+  const Arguments args = parseArguments(argc, argv, 2, {"pooled", "approximate", "levene"});
   if (args.positional.empty()) throw UsageError("test takes a test name and a data file");
   const std::string& name = args.positional[0];
   if (isRankTest(name)) return runRankTest(args, out);
+  if (isProportionOrVarianceTest(name)) return runProportionOrVarianceTest(args, out);
   if (args.positional.size() != 2) throw UsageError("test takes a test name and a data file");
   Kind kind;
   if (name == "one-sample-t") {
