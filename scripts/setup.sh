@@ -3,7 +3,7 @@
 # when it is missing. Safe to run again.
 set -euo pipefail
 packages=(build-essential cmake git googletest libgtest-dev libbenchmark-dev
-          libboost-dev pkg-config binutils)
+          libboost-dev pkg-config binutils ccache)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")
