@@ -1,0 +1,259 @@
+// Solvers of the power formulas: the effect that reaches a power with a given
+// sample size, and the smallest whole sample size that reaches a power with a
+// given effect. Every search runs the bracket finder and the Illinois root
+// finder on a power function object; sample-size searches move on whole
+// numbers, so that the answer is the first n whose power reaches the target.
+#include <algorithm>
+#include <cmath>
+
+#include "basic_statistics/PowerUtilities.h"
+#include "utilities/LYNBasicTypes.h"
+
+namespace qel {
+
+namespace {
+
+const double kMissing = mGetMissingValueCode();
+
+// Coefficients of the quadratics that bound the noncentrality of the
+// noncentral t kernel (its limit on the Poisson mixture behind the
+// distribution: ncp^2 / 2 + 6.1738 ncp / sqrt(2) + df / 2 <= 94906265).
+constexpr double kElvWidth = 6.1738;
+constexpr double kElvShape = 94906265.0;
+constexpr double kHalfWidth = 4.365535845689506;  // 6.1738 / sqrt(2)
+constexpr double kSqrtTwo = 1.4142135623730951;
+constexpr double kZSampleSizeEnd = 999999.0;
+
+bool isProbability(double p) {
+  return p > 0.0 && p < 1.0;
+}
+
+// The largest effect the t kernel can take with n per sample: the positive
+// root of 0.5 x^2 + 6.1738 / sqrt(2) x + (df / 2 - 94906265), in units of
+// sigma / sqrt(n) (one sample) or sigma / sqrt(n / 2).
+double tEffectUpperEnd(int n, double sigma, bool oneSample) {
+  const double df = oneSample ? n - 1.0 : 2.0 * n - 2.0;
+  const double x = mRootOfQuadratic(0.5, kHalfWidth, df / 2.0 - kElvShape);
+  if (mIsNumericMissing(x) || !(x > 0.0)) return kMissing;
+  return mReduceUpperEnd(x * sigma / std::sqrt(oneSample ? n : n / 2.0));
+}
+
+// The largest sample size the t kernel can take for the standardised effect
+// r: x = sqrt(n) from the kernel's quadratic, then floor(x^2) - 1; 999999
+// when that leaves no room above 2.
+double tSampleSizeUpperEnd(double r, bool twoSampleQuadratic, bool fallback) {
+  double x;
+  if (twoSampleQuadratic) {
+    x = mRootOfQuadratic(r * r / 4.0 + 1.0, r * kElvWidth / 2.0, -(kElvShape + 1.0));
+  } else {
+    x = mRootOfQuadratic(r * r / 2.0 + 0.5, r * kElvWidth / kSqrtTwo, -(kElvShape + 0.5));
+  }
+  double u = mIsNumericMissing(x) ? 0.0 : std::floor(std::pow(mReduceUpperEnd(x), 2.0)) - 1.0;
+  if (fallback && u <= 2.0) u = kZSampleSizeEnd;
+  return u;
+}
+
+// Root of f on [lower, upper] after the bracket search; the missing value
+// when there is no bracket or no root.
+double bracketAndRoot(double x1, double x2, double lower, double upper, CmRealFunction& f) {
+  if (mBracketFinder(&x1, &x2, f, lower, upper) != 0) return kMissing;
+  int status = 0;
+  return mRootFinder(x1, x2, f, &status);
+}
+
+// Sample-size search shared by the t and Welch solvers: n = 2 if it already
+// reaches the target, else a bracket from [2, 100] within [2, top] and the
+// root; the top itself when no bracket is found.
+int sampleSizeSearch(CmRealFunction& f, double top) {
+  const double at2 = f(2.0);
+  if (mIsNumericMissing(at2)) return -1;
+  if (at2 >= 0.0) return 2;
+  double x1 = 2.0, x2 = 100.0;
+  if (mBracketFinder(&x1, &x2, f, 2.0, top) != 0) return mSampleSizeFromDouble(top);
+  int status = 0;
+  return mSampleSizeFromDouble(mRootFinder(x1, x2, f, &status));
+}
+
+// Effect search shared by the t and Welch solvers, on the upper side: 0 if
+// no effect is needed, else the root on [0, end].
+double effectSearch(CmRealFunction& f, double end) {
+  const double at0 = f(0.0);
+  if (mIsNumericMissing(at0)) return kMissing;
+  if (at0 >= 0.0) return 0.0;
+  if (mIsNumericMissing(end)) return kMissing;
+  return bracketAndRoot(0.0, end, 0.0, end, f);
+}
+
+double negateUnlessMissing(double x, bool negate) {
+  return negate && !mIsNumericMissing(x) ? -x : x;
+}
+
+}  // namespace
+
+bool mCalculateLowerUpperPos(double start, double step, double* lower, double* upper,
+                             bool* rootAtLower, CmRealFunction& f, bool forSampleSize,
+                             bool oneSample) {
+  *rootAtLower = false;
+  *lower = start;
+  *upper = start + step;
+  const double tolerance = forSampleSize ? 1.0 : 0.01;
+  const double atLower = f(*lower);
+  if (mIsNumericMissing(atLower)) return false;
+  if (atLower > 0.0) {
+    *rootAtLower = true;
+    return true;
+  }
+  double limit = mGetMaxDataValue();
+  if (forSampleSize) limit = oneSample ? mGetMaxInteger() : mGetMaxInteger() / 2.0;
+  while (mIsNumericMissing(f(*upper))) {
+    if (*upper - *lower <= tolerance) break;
+    *upper = (*lower + *upper) / 2.0;
+  }
+  while (*upper < limit) {
+    const double value = f(*upper);
+    if (mIsNumericMissing(value)) return false;
+    if (value > 0.0) return true;
+    *upper *= 2.0;
+  }
+  *upper = std::min(*upper, limit);
+  return false;
+}
+
+bool mCalculateLowerUpperNeg(double* lower, double* upper, CmRealFunction& f) {
+  *lower = 1e-12;
+  *upper = 1.0;
+  const double atLower = f(*lower);
+  const double atUpper = f(*upper);
+  if (mIsNumericMissing(atLower) || mIsNumericMissing(atUpper)) return false;
+  return atLower > 0.0 && atUpper < 0.0;
+}
+
+double mGetEffect(bool found, bool rootAtLower, double lower, double upper, CmRealFunction& f) {
+  if (!found) return kMissing;
+  if (rootAtLower) return lower;
+  int status = 0;
+  return mRootFinder(lower, upper, f, &status);
+}
+
+int mGetSampleSize(bool found, bool rootAtLower, double lower, double upper, CmRealFunction& f) {
+  if (!found) return mSampleSizeFromDouble(upper);
+  if (rootAtLower) return mSampleSizeFromDouble(std::ceil(lower));
+  int status = 0;
+  const double root = mRootFinder(lower, upper, f, &status);
+  return mIsNumericMissing(root) ? -1 : mSampleSizeFromDouble(std::ceil(root));
+}
+
+double mTComputeXForPowerAndSampleSize(double power, int n, double sigma, EAlternative alternative,
+                                       double level, bool oneSample, bool useT) {
+  if (n < 1 || !(sigma > 0.0) || !isProbability(power)) return kMissing;
+  const bool lower = alternative < 0;
+  CmTPower f(lower ? kAlternativeGreater : alternative, n, 0.0, sigma, level, oneSample, useT,
+             power, false);
+  const double end = useT ? tEffectUpperEnd(n, sigma, oneSample) : 20.0 * sigma;
+  return negateUnlessMissing(effectSearch(f, end), lower);
+}
+
+int mTCalcSampleSizeGivenPower(EAlternative alternative, double power, double effect,
+                               double sigma, double level, bool oneSample, bool useT,
+                               bool paired) {
+  if (!(sigma > 0.0) || !isProbability(power) || mIsNumericMissing(effect)) return -1;
+  CmTPower f(alternative, 0, effect, sigma, level, oneSample || paired, useT, power, true);
+  const double top =
+      useT ? tSampleSizeUpperEnd(effect / sigma, !oneSample || paired, true) : kZSampleSizeEnd;
+  return sampleSizeSearch(f, top);
+}
+
+double mCalcEffectForWelchTTestPower(EAlternative alternative, double power, int n1, int n2,
+                                     double s1, double s2, double level) {
+  if (n1 < 2 || n2 < 2 || !(s1 > 0.0) || !(s2 > 0.0) || !isProbability(power)) return kMissing;
+  const bool lower = alternative < 0;
+  CmWelchTPower f(lower ? kAlternativeGreater : alternative, n1, n2, 0.0, s1, s2, level, power,
+                  false);
+  const double pooled =
+      std::sqrt(((n1 - 1.0) * s1 * s1 + (n2 - 1.0) * s2 * s2) / (n1 + n2 - 2.0));
+  const double end = tEffectUpperEnd(std::max(n1, n2), pooled, false);
+  return negateUnlessMissing(effectSearch(f, end), lower);
+}
+
+int mCalcSampleSizeForWelchTTestPower(EAlternative alternative, double power, double difference,
+                                      double s1, double s2, double level) {
+  if (!(s1 > 0.0) || !(s2 > 0.0) || !isProbability(power) || mIsNumericMissing(difference)) {
+    return -1;
+  }
+  CmWelchTPower f(alternative, 0, 0, difference, s1, s2, level, power, true);
+  const double pooled = std::sqrt(s1 * s1 / 2.0 + s2 * s2 / 2.0);
+  const double top = tSampleSizeUpperEnd(difference / pooled, true, false);
+  return sampleSizeSearch(f, std::max(top, 2.0));
+}
+
+double mComputePOneXForPowerAndSampleSize(EAlternative alternative, double power, int n,
+                                          double critical, double null, bool oneSample) {
+  if (!isProbability(power) || !(null >= 0.0 && null <= 1.0)) return kMissing;
+  // The lower alternative is the upper one of the mirrored problem: the
+  // proportions p and 1 - p play the same part.
+  const bool mirrored = alternative < 0;
+  const double base = mirrored ? 1.0 - null : null;
+  CmPPower f(mirrored ? kAlternativeGreater : alternative, n, critical, 0.0, base, oneSample, power,
+             false);
+  const double top = oneSample ? 1.0 - mGetEps(false) : 1.0;
+  const double d = effectSearch(f, top - base);
+  if (mIsNumericMissing(d)) return kMissing;
+  return mirrored ? null - d : null + d;
+}
+
+double mComputePOneOtherXForPowerAndSampleSize(double power, int n, double critical, double null,
+                                               bool oneSample) {
+  if (!isProbability(power) || !(null >= 0.0 && null <= 1.0)) return kMissing;
+  const double base = 1.0 - null;
+  CmPPower f(kAlternativeNotEqual, n, critical, 0.0, base, oneSample, power, false);
+  const double top = oneSample ? 1.0 - mGetEps(false) : 1.0;
+  const double d = effectSearch(f, top - base);
+  return mIsNumericMissing(d) ? kMissing : null - d;
+}
+
+int mCalcPOneSampleSizeGivenPower(EAlternative alternative, double power, double effect,
+                                  double critical, double null, bool oneSample) {
+  if (!isProbability(power)) return -1;
+  CmPPower f(alternative, 0, critical, effect, null, oneSample, power, true);
+  const double top = std::floor(oneSample ? mGetMaxInteger() : mGetMaxInteger() / 2.0) - 1.0;
+  const double at2 = f(2.0);
+  if (mIsNumericMissing(at2)) return -1;
+  if (at2 >= 0.0) return 2;
+  const double atTop = f(top);
+  if (mIsNumericMissing(atTop)) return -1;
+  if (!(atTop > 0.0)) return mSampleSizeFromDouble(top);
+  int status = 0;
+  return mSampleSizeFromDouble(mRootFinder(2.0, top, f, &status));
+}
+
+int mCalcVarSampleSizeGivenPower(EAlternative alternative, double power, double ratio,
+                                 double level, bool oneSample, bool ratioOfSigmas,
+                                 ETestMethod method, double kurtosis) {
+  if (!isProbability(power)) return -1;
+  CmVariancePower f(alternative, 0, ratio, level, oneSample, ratioOfSigmas, method, kurtosis,
+                    power, true);
+  double lower = 0.0, upper = 0.0;
+  bool rootAtLower = false;
+  const bool found =
+      mCalculateLowerUpperPos(2.0, 30.0, &lower, &upper, &rootAtLower, f, true, oneSample);
+  return mGetSampleSize(found, rootAtLower, lower, upper, f);
+}
+
+double mCalcVarEffectGivenPower(EAlternative alternative, double power, int n, double level,
+                                bool oneSample, bool ratioOfSigmas, ETestMethod method,
+                                double kurtosis, bool positive) {
+  if (!isProbability(power)) return kMissing;
+  CmVariancePower f(alternative, n, 1.0, level, oneSample, ratioOfSigmas, method, kurtosis, power,
+                    false);
+  double lower = 0.0, upper = 0.0;
+  bool rootAtLower = false;
+  bool found;
+  if (positive) {
+    found = mCalculateLowerUpperPos(1.0, 2.0, &lower, &upper, &rootAtLower, f, false, oneSample);
+  } else {
+    found = mCalculateLowerUpperNeg(&lower, &upper, f);
+  }
+  return mGetEffect(found, rootAtLower, lower, upper, f);
+}
+
+}  // namespace qel
