@@ -64,13 +64,26 @@ double sumOfParts(EAlternative alternative, double upper, double lower) {
   return std::min(power, 1.0);
 }
 
+// P(T > t) (upper) or P(T < -t) for the noncentral t, t > 0. The tail on
+// the side away from the noncentrality is integrated in its own right when
+// it is the whole power (a one-sided test) or when df is fractional, where
+// the kernel loses its relative (and, for fractional df, absolute) accuracy;
+// otherwise the kernel gives it, in its own tail.
+double noncentralTTail(double t, double df, double ncp, bool upper, EAlternative alternative) {
+  const bool opposite = upper ? ncp < 0.0 : ncp > 0.0;
+  if (opposite && t > 0.0 && (alternative != 0 || df != std::floor(df))) {
+    return mNoncentralTOppositeTail(t, df, std::fabs(ncp));
+  }
+  return upper ? mTCdf(t, df, ncp, true) : mTCdf(-t, df, ncp, false);
+}
+
 // The t rule: tails of the noncentral t beyond the critical values +-t.
 double noncentralTPower(EAlternative alternative, double df, double ncp, double level) {
   if (!(df > 0.0) || !isFinite(ncp) || std::fabs(ncp) > maxNoncentrality()) return kMissing;
   const double t = mTCritValue(level, df, alternative, 1);
   if (!isFinite(t)) return kMissing;
-  const double upper = alternative >= 0 ? mTCdf(t, df, ncp, true) : 0.0;
-  const double lower = alternative <= 0 ? mTCdf(-t, df, ncp, false) : 0.0;
+  const double upper = alternative >= 0 ? noncentralTTail(t, df, ncp, true, alternative) : 0.0;
+  const double lower = alternative <= 0 ? noncentralTTail(t, df, ncp, false, alternative) : 0.0;
   return sumOfParts(alternative, upper, lower);
 }
 

@@ -65,6 +65,11 @@ double mCalcWelchDF(int n1, int n2, double s1, double s2);
 double mCalcWelchTTestPower(EAlternative alternative, int n1, int n2, double difference,
                             double s1, double s2, double level);
 
+// P(T < -t) for the noncentral t with df (fractional allowed) and
+// noncentrality d >= 0, t > 0: the tail away from the noncentrality, to
+// full relative accuracy however small it is.
+double mNoncentralTOppositeTail(double t, double df, double d);
+
 // x (1 - eps): an upper search end pulled just inside a limit.
 double mReduceUpperEnd(double x);
 

@@ -8,6 +8,7 @@
 
 #include "basic_statistics/PowerUtilities.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 
@@ -74,14 +75,27 @@ int sampleSizeSearch(CmRealFunction& f, double top) {
   return mSampleSizeFromDouble(mRootFinder(x1, x2, f, &status));
 }
 
-// Effect search shared by the t and Welch solvers, on the upper side: 0 if
-// no effect is needed, else the root on [0, end].
-double effectSearch(CmRealFunction& f, double end) {
+// Effect search shared by the t, z, Welch and proportion solvers, on the
+// upper side: 0 if no effect is needed, else the root on [0, end]. The
+// bracket search starts from [0, guess] within [0, end] rather than from the
+// whole range: the far end is where the noncentral t kernel is slowest (a
+// Poisson mixture with a mean near 1e8), and the root is the same.
+double effectSearch(CmRealFunction& f, double end, double guess) {
   const double at0 = f(0.0);
   if (mIsNumericMissing(at0)) return kMissing;
   if (at0 >= 0.0) return 0.0;
-  if (mIsNumericMissing(end)) return kMissing;
-  return bracketAndRoot(0.0, end, 0.0, end, f);
+  if (mIsNumericMissing(end) || !(end > 0.0)) return kMissing;
+  const double start = guess > 0.0 && guess < end ? guess : end;
+  return bracketAndRoot(0.0, start, 0.0, end, f);
+}
+
+// The effect of the z test with the same level and power: (z_a + z_b) times
+// the standard error, a starting point for the t searches.
+double normalEffectGuess(double power, double level, EAlternative alternative, double se) {
+  const double a = alternative == kAlternativeNotEqual ? level / 2.0 : level;
+  if (!(a > 0.0 && a < 1.0)) return kMissing;
+  const double z = mNormalInvCdf(1.0 - a, 0.0, 1.0) + mNormalInvCdf(power, 0.0, 1.0);
+  return z > 0.0 ? z * se : kMissing;
 }
 
 double negateUnlessMissing(double x, bool negate) {
@@ -150,7 +164,9 @@ double mTComputeXForPowerAndSampleSize(double power, int n, double sigma, EAlter
   CmTPower f(lower ? kAlternativeGreater : alternative, n, 0.0, sigma, level, oneSample, useT,
              power, false);
   const double end = useT ? tEffectUpperEnd(n, sigma, oneSample) : 20.0 * sigma;
-  return negateUnlessMissing(effectSearch(f, end), lower);
+  const double se = sigma / std::sqrt(oneSample ? n : n / 2.0);
+  const double guess = normalEffectGuess(power, level, alternative, se);
+  return negateUnlessMissing(effectSearch(f, end, guess), lower);
 }
 
 int mTCalcSampleSizeGivenPower(EAlternative alternative, double power, double effect,
@@ -172,7 +188,9 @@ double mCalcEffectForWelchTTestPower(EAlternative alternative, double power, int
   const double pooled =
       std::sqrt(((n1 - 1.0) * s1 * s1 + (n2 - 1.0) * s2 * s2) / (n1 + n2 - 2.0));
   const double end = tEffectUpperEnd(std::max(n1, n2), pooled, false);
-  return negateUnlessMissing(effectSearch(f, end), lower);
+  const double se = std::sqrt(s1 * s1 / n1 + s2 * s2 / n2);
+  const double guess = normalEffectGuess(power, level, alternative, se);
+  return negateUnlessMissing(effectSearch(f, end, guess), lower);
 }
 
 int mCalcSampleSizeForWelchTTestPower(EAlternative alternative, double power, double difference,
@@ -196,7 +214,7 @@ double mComputePOneXForPowerAndSampleSize(EAlternative alternative, double power
   CmPPower f(mirrored ? kAlternativeGreater : alternative, n, critical, 0.0, base, oneSample, power,
              false);
   const double top = oneSample ? 1.0 - mGetEps(false) : 1.0;
-  const double d = effectSearch(f, top - base);
+  const double d = effectSearch(f, top - base, kMissing);
   if (mIsNumericMissing(d)) return kMissing;
   return mirrored ? null - d : null + d;
 }
@@ -207,7 +225,7 @@ double mComputePOneOtherXForPowerAndSampleSize(double power, int n, double criti
   const double base = 1.0 - null;
   CmPPower f(kAlternativeNotEqual, n, critical, 0.0, base, oneSample, power, false);
   const double top = oneSample ? 1.0 - mGetEps(false) : 1.0;
-  const double d = effectSearch(f, top - base);
+  const double d = effectSearch(f, top - base, kMissing);
   return mIsNumericMissing(d) ? kMissing : null - d;
 }
 

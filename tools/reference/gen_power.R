@@ -8,10 +8,10 @@
 #   tpower,type,alternative,n,effect,sd,level,power
 #   tn,type,alternative,effect,sd,level,power,n (R's real n; the whole n is its ceiling)
 #   teffect,type,alternative,n,sd,level,power,effect
-#   ppower,alternative,n,p1,p2,level,power       (two samples, null p1, effect p2 - p1)
-#   pn,alternative,p1,p2,level,power,n
-#   peffect,alternative,n,p1,level,power,p2
-#   varpower,samples,alternative,n,ratio,level,power (ratio of variances)
+#   ppower,two.sample,alternative,n,p1,p2,level,power   (null p1, effect p2 - p1)
+#   pn,two.sample,alternative,p1,p2,level,power,n
+#   peffect,two.sample,alternative,n,p1,level,power,p2
+#   varpower,type,alternative,n,ratio,level,power       (ratio of variances)
 # Run: Rscript tools/reference/gen_power.R
 args <- commandArgs(trailingOnly = FALSE)
 here <- dirname(normalizePath(sub("--file=", "", args[grep("--file=", args)])))
@@ -60,7 +60,7 @@ for (alt in c(-1, 0, 1)) {
       if (alt != 0 && sign(p2 - p1) != alt) next
       p <- power.prop.test(n = n, p1 = p1, p2 = p2, sig.level = 0.05, alternative = side(alt),
                            strict = TRUE)$power
-      writeLines(fmt("ppower", alt, n, p1, p2, 0.05, p), out)
+      writeLines(fmt("ppower", "two.sample", alt, n, p1, p2, 0.05, p), out)
     }
   }
   for (pair in list(c(0.3, 0.5), c(0.5, 0.55), c(0.1, 0.02), c(0.6, 0.3))) {
@@ -69,7 +69,7 @@ for (alt in c(-1, 0, 1)) {
     for (power in c(0.6, 0.9)) {
       r <- power.prop.test(p1 = p1, p2 = p2, sig.level = 0.05, power = power,
                            alternative = side(alt), strict = TRUE, tol = tol)$n
-      writeLines(fmt("pn", alt, p1, p2, 0.05, power, r), out)
+      writeLines(fmt("pn", "two.sample", alt, p1, p2, 0.05, power, r), out)
     }
   }
   if (alt >= 0) {
@@ -78,7 +78,7 @@ for (alt in c(-1, 0, 1)) {
         for (power in c(0.5, 0.9)) {
           r <- power.prop.test(n = n, p1 = p1, p2 = NULL, sig.level = 0.05, power = power,
                                alternative = side(alt), strict = TRUE, tol = tol)$p2
-          writeLines(fmt("peffect", alt, n, p1, 0.05, power, r), out)
+          writeLines(fmt("peffect", "two.sample", alt, n, p1, 0.05, power, r), out)
         }
       }
     }
@@ -99,7 +99,7 @@ for (samples in c(1, 2)) {
         p <- 0
         if (alt >= 0) p <- p + G(Q(a, TRUE) / r, TRUE)
         if (alt <= 0) p <- p + G(Q(a, FALSE) / r, FALSE)
-        writeLines(fmt("varpower", samples, alt, n, r, 0.05, p), out)
+        writeLines(fmt("varpower", if (samples == 1) "one.sample" else "two.sample", alt, n, r, 0.05, p), out)
       }
     }
   }
