@@ -106,8 +106,14 @@ struct ReferenceDistribution {
   double quantile(double p) const {
     return chiSquare ? mChiSqInvCdf(p, d1, 0.0) : mFInvCdf(p, d1, d2, 0.0);
   }
+  // The F kernel has no answer far out (x near 1e9 and beyond); there the
+  // tails come from the beta distribution of z = d2 / (d2 + d1 x), whose
+  // lower tail is the F upper tail (computed without cancellation).
   double tail(double x, bool upper) const {
-    return chiSquare ? mChiSqCdf(x, d1, 0.0, upper) : mFCdf(x, d1, d2, 0.0, upper);
+    if (chiSquare) return mChiSqCdf(x, d1, 0.0, upper);
+    const double p = mFCdf(x, d1, d2, 0.0, upper);
+    if (!mIsNumericMissing(p) || !(x > 0.0)) return p;
+    return mBetaCdf(d2 / (d2 + d1 * x), d2 / 2.0, d1 / 2.0, !upper);
   }
 };
 
