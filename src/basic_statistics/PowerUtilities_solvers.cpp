@@ -54,48 +54,141 @@ double tSampleSizeUpperEnd(double r, bool twoSampleQuadratic, bool fallback) {
   return u;
 }
 
+// The root of f between x1 and x2 (f of opposite signs there) by the
+// Illinois method of Dowell and Jarratt (BIT 11 (1971) 168-174): a secant
+// step, and the stored value of the retained end halved only when the same
+// end is retained twice running, which keeps the order of convergence near
+// 1.44. (Halving it at every step, as mRootFinder does, converges only
+// linearly: 20 and more power evaluations where 5 or 6 suffice.) Ends with
+// the convergence tests of f.
+double illinoisRoot(CmRealFunction& f, double x1, double x2) {
+  double f1 = f(x1), f2 = f(x2);
+  if (mIsNumericMissing(f1) || mIsNumericMissing(f2)) return kMissing;
+  if (f.mIsConvergedForF(f1)) return x1;
+  if (f.mIsConvergedForF(f2)) return x2;
+  if ((f1 > 0.0) == (f2 > 0.0)) return kMissing;
+  for (int step = 0; step < 200; ++step) {
+    const double x = x2 - f2 * (x2 - x1) / (f2 - f1);
+    const double fx = f(x);
+    if (mIsNumericMissing(fx) || !std::isfinite(x)) return kMissing;
+    if (f.mIsConvergedForF(fx)) return x;
+    if ((fx > 0.0) != (f2 > 0.0)) {
+      x1 = x2;
+      f1 = f2;
+    } else {
+      f1 /= 2.0;
+    }
+    x2 = x;
+    f2 = fx;
+    if (f.mIsConvergedForX(x1, x2)) return x2;
+  }
+  return x2;
+}
+
 // Root of f on [lower, upper] after the bracket search; the missing value
-// when there is no bracket or no root.
+// when there is no bracket or no root. Sample-size searches (on whole
+// numbers) go to mRootFinder, whose integer rule returns the first whole
+// number at which f reaches zero.
 double bracketAndRoot(double x1, double x2, double lower, double upper, CmRealFunction& f) {
   if (mBracketFinder(&x1, &x2, f, lower, upper) != 0) return kMissing;
+  if (!f.mIntegerValued) return illinoisRoot(f, x1, x2);
   int status = 0;
   return mRootFinder(x1, x2, f, &status);
 }
 
 // Sample-size search shared by the t and Welch solvers: n = 2 if it already
-// reaches the target, else a bracket from [2, 100] within [2, top] and the
-// root; the top itself when no bracket is found.
-int sampleSizeSearch(CmRealFunction& f, double top) {
+// reaches the target, else the smallest whole n within [2, top] whose power
+// reaches it; the top itself when no n within it does. The power rises with
+// n, so the answer is found by bracketing on whole numbers, upward in
+// doubling steps from next to the guess (the normal-theory n) or from 2,
+// and bisecting; only the number of power evaluations (about five with a
+// good guess) depends on the start.
+int sampleSizeSearch(CmRealFunction& f, double top, double guess) {
+  top = std::floor(top);
   const double at2 = f(2.0);
   if (mIsNumericMissing(at2)) return -1;
   if (at2 >= 0.0) return 2;
-  double x1 = 2.0, x2 = 100.0;
-  if (mBracketFinder(&x1, &x2, f, 2.0, top) != 0) return mSampleSizeFromDouble(top);
-  int status = 0;
-  return mSampleSizeFromDouble(mRootFinder(x1, x2, f, &status));
+  double below = 2.0;  // f < 0 here
+  if (guess > 3.0 && guess < top) {
+    const double start = std::floor(guess) - 1.0;
+    const double value = f(start);
+    if (mIsNumericMissing(value)) return -1;
+    if (value < 0.0) {
+      below = start;
+    } else {
+      top = start;  // the answer lies in (2, start]
+    }
+  }
+  double above = below;
+  double step = 3.0;
+  for (;;) {
+    above = std::min(top, below + step);
+    const double value = f(above);
+    if (mIsNumericMissing(value)) return -1;
+    if (value >= 0.0) break;
+    if (above >= top) return mSampleSizeFromDouble(top);
+    below = above;
+    step *= 2.0;
+  }
+  while (above - below > 1.0) {
+    const double middle = std::floor((below + above) / 2.0);
+    const double value = f(middle);
+    if (mIsNumericMissing(value)) return -1;
+    (value >= 0.0 ? above : below) = middle;
+  }
+  return mSampleSizeFromDouble(above);
 }
 
 // Effect search shared by the t, z, Welch and proportion solvers, on the
 // upper side: 0 if no effect is needed, else the root on [0, end]. The
-// bracket search starts from [0, guess] within [0, end] rather than from the
-// whole range: the far end is where the noncentral t kernel is slowest (a
-// Poisson mixture with a mean near 1e8), and the root is the same.
+// bracket search starts from +-1% about a guess within [0, end] rather than
+// from the whole range: the far end is where the noncentral t kernel is
+// slowest (a Poisson mixture with a mean near 1e8), and the root is the
+// same.
 double effectSearch(CmRealFunction& f, double end, double guess) {
   const double at0 = f(0.0);
   if (mIsNumericMissing(at0)) return kMissing;
   if (at0 >= 0.0) return 0.0;
   if (mIsNumericMissing(end) || !(end > 0.0)) return kMissing;
-  const double start = guess > 0.0 && guess < end ? guess : end;
-  return bracketAndRoot(0.0, start, 0.0, end, f);
+  if (guess > 0.0 && guess < end) return bracketAndRoot(0.99 * guess, 1.01 * guess, 0.0, end, f);
+  return bracketAndRoot(0.0, end, 0.0, end, f);
 }
 
-// The effect of the z test with the same level and power: (z_a + z_b) times
-// the standard error, a starting point for the t searches.
-double normalEffectGuess(double power, double level, EAlternative alternative, double se) {
+// The one-sided quantile z_a of the test (a = level, or level / 2 for the
+// two-sided alternative) and z_b of the power, from the normal or from the
+// central t with df; their sum is the standardised effect of a test whose
+// noncentral distribution were the central one shifted (exact for z, close
+// for t: a starting point for the searches).
+double quantileSum(double power, double level, EAlternative alternative, double df, bool useT) {
   const double a = alternative == kAlternativeNotEqual ? level / 2.0 : level;
-  if (!(a > 0.0 && a < 1.0)) return kMissing;
-  const double z = mNormalInvCdf(1.0 - a, 0.0, 1.0) + mNormalInvCdf(power, 0.0, 1.0);
-  return z > 0.0 ? z * se : kMissing;
+  if (!(a > 0.0 && a < 1.0) || !isProbability(power)) return kMissing;
+  const double za = useT ? mTInvCdf(1.0 - a, df, 0.0) : mNormalInvCdf(1.0 - a, 0.0, 1.0);
+  const double zb = useT ? mTInvCdf(power, df, 0.0) : mNormalInvCdf(power, 0.0, 1.0);
+  if (mIsNumericMissing(za) || mIsNumericMissing(zb)) return kMissing;
+  return za + zb;
+}
+
+// The effect (standardised by se) that reaches the power: the quantile sum.
+double effectGuess(double power, double level, EAlternative alternative, double df, bool useT,
+                   double se) {
+  const double z = quantileSum(power, level, alternative, df, useT);
+  return mIsNumericMissing(z) || !(z > 0.0) ? kMissing : z * se;
+}
+
+// The normal-theory sample size per sample, (z_a + z_b)^2 / r^2 times 2 for
+// two samples, plus Guenther's correction z_a^2 / 4 (two samples) or
+// z_a^2 / 2 (one) for the t test (Guenther, J. Qual. Technol. 13 (1981)).
+double sampleSizeGuess(double power, double level, EAlternative alternative, double r,
+                       bool twoSamples, bool useT) {
+  const double z = quantileSum(power, level, alternative, 0.0, false);
+  if (mIsNumericMissing(z) || !(z > 0.0) || !(std::fabs(r) > 0.0)) return kMissing;
+  if (alternative != kAlternativeNotEqual && (alternative > 0) != (r > 0.0)) return kMissing;
+  const double a = alternative == kAlternativeNotEqual ? level / 2.0 : level;
+  const double za = mNormalInvCdf(1.0 - a, 0.0, 1.0);
+  const double n = (twoSamples ? 2.0 : 1.0) * z * z / (r * r);
+  const double correction = useT ? za * za / (twoSamples ? 4.0 : 2.0) : 0.0;
+  const double guess = n + correction;
+  return std::isfinite(guess) && guess < 1e9 ? guess : kMissing;
 }
 
 double negateUnlessMissing(double x, bool negate) {
@@ -165,7 +258,8 @@ double mTComputeXForPowerAndSampleSize(double power, int n, double sigma, EAlter
              power, false);
   const double end = useT ? tEffectUpperEnd(n, sigma, oneSample) : 20.0 * sigma;
   const double se = sigma / std::sqrt(oneSample ? n : n / 2.0);
-  const double guess = normalEffectGuess(power, level, alternative, se);
+  const double df = oneSample ? n - 1.0 : 2.0 * n - 2.0;
+  const double guess = effectGuess(power, level, alternative, df, useT && df > 0.0, se);
   return negateUnlessMissing(effectSearch(f, end, guess), lower);
 }
 
@@ -176,7 +270,9 @@ int mTCalcSampleSizeGivenPower(EAlternative alternative, double power, double ef
   CmTPower f(alternative, 0, effect, sigma, level, oneSample || paired, useT, power, true);
   const double top =
       useT ? tSampleSizeUpperEnd(effect / sigma, !oneSample || paired, true) : kZSampleSizeEnd;
-  return sampleSizeSearch(f, top);
+  const double guess =
+      sampleSizeGuess(power, level, alternative, effect / sigma, !(oneSample || paired), useT);
+  return sampleSizeSearch(f, top, guess);
 }
 
 double mCalcEffectForWelchTTestPower(EAlternative alternative, double power, int n1, int n2,
@@ -189,7 +285,7 @@ double mCalcEffectForWelchTTestPower(EAlternative alternative, double power, int
       std::sqrt(((n1 - 1.0) * s1 * s1 + (n2 - 1.0) * s2 * s2) / (n1 + n2 - 2.0));
   const double end = tEffectUpperEnd(std::max(n1, n2), pooled, false);
   const double se = std::sqrt(s1 * s1 / n1 + s2 * s2 / n2);
-  const double guess = normalEffectGuess(power, level, alternative, se);
+  const double guess = effectGuess(power, level, alternative, mCalcWelchDF(n1, n2, s1, s2), true, se);
   return negateUnlessMissing(effectSearch(f, end, guess), lower);
 }
 
@@ -201,7 +297,8 @@ int mCalcSampleSizeForWelchTTestPower(EAlternative alternative, double power, do
   CmWelchTPower f(alternative, 0, 0, difference, s1, s2, level, power, true);
   const double pooled = std::sqrt(s1 * s1 / 2.0 + s2 * s2 / 2.0);
   const double top = tSampleSizeUpperEnd(difference / pooled, true, false);
-  return sampleSizeSearch(f, std::max(top, 2.0));
+  const double guess = sampleSizeGuess(power, level, alternative, difference / pooled, true, true);
+  return sampleSizeSearch(f, std::max(top, 2.0), guess);
 }
 
 double mComputePOneXForPowerAndSampleSize(EAlternative alternative, double power, int n,
