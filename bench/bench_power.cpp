@@ -50,7 +50,8 @@ BENCHMARK(BM_TEffect)->Unit(benchmark::kMicrosecond);
 void BM_TwoProportionSampleSize(benchmark::State& state) {
   const double c = qel::mNormalCritValue(0.05, kTwoSided);
   for (auto _ : state) {
-    benchmark::DoNotOptimize(qel::mCalcPOneSampleSizeGivenPower(kTwoSided, 0.8, 0.2, c, 0.3, false));
+    benchmark::DoNotOptimize(
+        qel::mCalcPOneSampleSizeGivenPower(kTwoSided, 0.8, 0.2, c, 0.3, false));
   }
 }
 BENCHMARK(BM_TwoProportionSampleSize)->Unit(benchmark::kMicrosecond);

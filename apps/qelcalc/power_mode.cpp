@@ -227,8 +227,8 @@ int runPowerMode(int argc, char** argv, std::ostream& out) {
   if (args.positional.size() != 1) throw UsageError("power takes one design (see --help)");
   Request r;
   r.design = args.positional[0];
-  const std::vector<std::string> designs = {"t", "z", "paired", "prop", "variance", "poisson",
-                                            "welch"};
+  const std::vector<std::string> designs = {"t",        "z",       "paired", "prop",
+                                            "variance", "poisson", "welch"};
   bool known = false;
   for (const auto& d : designs) known = known || d == r.design;
   if (!known) throw UsageError("unknown power design '" + r.design + "'");

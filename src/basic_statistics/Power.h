@@ -96,8 +96,7 @@ class CmCmndPower {
   double mGetDefaultDiffForSigma(unsigned n) const;
 
   // Extents of a power curve.
-  void mGetSuggestedDataXMinXMax(const std::vector<double>& data, double* xMin,
-                                 double* xMax) const;
+  void mGetSuggestedDataXMinXMax(const std::vector<double>& data, double* xMin, double* xMax) const;
   void mAdjustForEqualSuggestedMinMax(double xMin, double* xMax) const;
   void mProcessXMinMax(double dataMin, double dataMax, double absoluteMin, double absoluteMax,
                        double& xMin, double& xMax) const;

@@ -153,8 +153,8 @@ int mSampleSizeFromDouble(double x) {
   return static_cast<int>(x);
 }
 
-double mTOneCalcOnePower(EAlternative alternative, int n, double effect, double sigma,
-                         double level, bool oneSample, bool useT, double noncentrality) {
+double mTOneCalcOnePower(EAlternative alternative, int n, double effect, double sigma, double level,
+                         bool oneSample, bool useT, double noncentrality) {
   try {
     if (n < 1 || !isLevel(level)) return kMissing;
     double ncp = noncentrality;
@@ -323,8 +323,8 @@ double mCalcWelchDF(int n1, int n2, double s1, double s2) {
   return isFinite(df) ? df : kMissing;
 }
 
-double mCalcWelchTTestPower(EAlternative alternative, int n1, int n2, double difference,
-                            double s1, double s2, double level) {
+double mCalcWelchTTestPower(EAlternative alternative, int n1, int n2, double difference, double s1,
+                            double s2, double level) {
   try {
     if (!isLevel(level) || !(s1 > 0.0) || !(s2 > 0.0) || !isFinite(s1) || !isFinite(s2) ||
         !isFinite(difference)) {
@@ -434,9 +434,8 @@ double CmPoissonPower::mPowerAt(double x) const {
   return mPoissonPower(mAlternative, mN, mRate, x, mLevel, mLengths, mOneSample);
 }
 
-CmWelchTPower::CmWelchTPower(EAlternative alternative, int n1, int n2, double difference,
-                             double s1, double s2, double level, double target,
-                             bool solveForSampleSize)
+CmWelchTPower::CmWelchTPower(EAlternative alternative, int n1, int n2, double difference, double s1,
+                             double s2, double level, double target, bool solveForSampleSize)
     : CmPowerFunction(target, solveForSampleSize),
       mAlternative(alternative),
       mN1(n1),

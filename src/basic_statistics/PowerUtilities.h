@@ -33,8 +33,8 @@ enum ETestMethod : int {
 // t or z test of a mean or of two means. The noncentrality is used as given
 // unless it is missing; otherwise effect sqrt(n) / sigma (one sample) or
 // effect sqrt(n / 2) / sigma (two samples). df = n - 1 or 2n - 2.
-double mTOneCalcOnePower(EAlternative alternative, int n, double effect, double sigma,
-                         double level, bool oneSample, bool useT, double noncentrality);
+double mTOneCalcOnePower(EAlternative alternative, int n, double effect, double sigma, double level,
+                         bool oneSample, bool useT, double noncentrality);
 
 // Normal approximation for one proportion against null, or two proportions
 // (null and null + effect); critical is the standard normal critical value.
@@ -62,8 +62,8 @@ double mBonettTestPower(EAlternative alternative, int n1, int n2, double ratio, 
 // Welch's approximate degrees of freedom, and the power of Welch's test of a
 // difference of means with standard deviations s1 and s2 (fractional df).
 double mCalcWelchDF(int n1, int n2, double s1, double s2);
-double mCalcWelchTTestPower(EAlternative alternative, int n1, int n2, double difference,
-                            double s1, double s2, double level);
+double mCalcWelchTTestPower(EAlternative alternative, int n1, int n2, double difference, double s1,
+                            double s2, double level);
 
 // P(T < -t) for the noncentral t with df (fractional allowed) and
 // noncentrality d >= 0, t > 0: the tail away from the noncentrality, to
@@ -192,9 +192,8 @@ int mGetSampleSize(bool found, bool rootAtLower, double lower, double upper, CmR
 // two-sample one.
 double mTComputeXForPowerAndSampleSize(double power, int n, double sigma, EAlternative alternative,
                                        double level, bool oneSample, bool useT);
-int mTCalcSampleSizeGivenPower(EAlternative alternative, double power, double effect,
-                               double sigma, double level, bool oneSample, bool useT,
-                               bool paired);
+int mTCalcSampleSizeGivenPower(EAlternative alternative, double power, double effect, double sigma,
+                               double level, bool oneSample, bool useT, bool paired);
 
 // Welch's test: equal sample sizes in the sample-size solver.
 double mCalcEffectForWelchTTestPower(EAlternative alternative, double power, int n1, int n2,
@@ -214,9 +213,9 @@ int mCalcPOneSampleSizeGivenPower(EAlternative alternative, double power, double
 
 // Variances: the sample size for a ratio, and the ratio above one (positive)
 // or below one that reaches power with n.
-int mCalcVarSampleSizeGivenPower(EAlternative alternative, double power, double ratio,
-                                 double level, bool oneSample, bool ratioOfSigmas,
-                                 ETestMethod method, double kurtosis);
+int mCalcVarSampleSizeGivenPower(EAlternative alternative, double power, double ratio, double level,
+                                 bool oneSample, bool ratioOfSigmas, ETestMethod method,
+                                 double kurtosis);
 double mCalcVarEffectGivenPower(EAlternative alternative, double power, int n, double level,
                                 bool oneSample, bool ratioOfSigmas, ETestMethod method,
                                 double kurtosis, bool positive);

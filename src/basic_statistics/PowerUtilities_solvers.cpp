@@ -263,9 +263,8 @@ double mTComputeXForPowerAndSampleSize(double power, int n, double sigma, EAlter
   return negateUnlessMissing(effectSearch(f, end, guess), lower);
 }
 
-int mTCalcSampleSizeGivenPower(EAlternative alternative, double power, double effect,
-                               double sigma, double level, bool oneSample, bool useT,
-                               bool paired) {
+int mTCalcSampleSizeGivenPower(EAlternative alternative, double power, double effect, double sigma,
+                               double level, bool oneSample, bool useT, bool paired) {
   if (!(sigma > 0.0) || !isProbability(power) || mIsNumericMissing(effect)) return -1;
   CmTPower f(alternative, 0, effect, sigma, level, oneSample || paired, useT, power, true);
   const double top =
@@ -281,11 +280,11 @@ double mCalcEffectForWelchTTestPower(EAlternative alternative, double power, int
   const bool lower = alternative < 0;
   CmWelchTPower f(lower ? kAlternativeGreater : alternative, n1, n2, 0.0, s1, s2, level, power,
                   false);
-  const double pooled =
-      std::sqrt(((n1 - 1.0) * s1 * s1 + (n2 - 1.0) * s2 * s2) / (n1 + n2 - 2.0));
+  const double pooled = std::sqrt(((n1 - 1.0) * s1 * s1 + (n2 - 1.0) * s2 * s2) / (n1 + n2 - 2.0));
   const double end = tEffectUpperEnd(std::max(n1, n2), pooled, false);
   const double se = std::sqrt(s1 * s1 / n1 + s2 * s2 / n2);
-  const double guess = effectGuess(power, level, alternative, mCalcWelchDF(n1, n2, s1, s2), true, se);
+  const double guess =
+      effectGuess(power, level, alternative, mCalcWelchDF(n1, n2, s1, s2), true, se);
   return negateUnlessMissing(effectSearch(f, end, guess), lower);
 }
 
@@ -341,12 +340,12 @@ int mCalcPOneSampleSizeGivenPower(EAlternative alternative, double power, double
   return mSampleSizeFromDouble(mRootFinder(2.0, top, f, &status));
 }
 
-int mCalcVarSampleSizeGivenPower(EAlternative alternative, double power, double ratio,
-                                 double level, bool oneSample, bool ratioOfSigmas,
-                                 ETestMethod method, double kurtosis) {
+int mCalcVarSampleSizeGivenPower(EAlternative alternative, double power, double ratio, double level,
+                                 bool oneSample, bool ratioOfSigmas, ETestMethod method,
+                                 double kurtosis) {
   if (!isProbability(power)) return -1;
-  CmVariancePower f(alternative, 0, ratio, level, oneSample, ratioOfSigmas, method, kurtosis,
-                    power, true);
+  CmVariancePower f(alternative, 0, ratio, level, oneSample, ratioOfSigmas, method, kurtosis, power,
+                    true);
   double lower = 0.0, upper = 0.0;
   bool rootAtLower = false;
   const bool found =

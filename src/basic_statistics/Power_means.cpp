@@ -93,8 +93,7 @@ double CmCmndPowerProportion::mCritical() const {
 }
 
 double CmCmndPowerProportion::mComputeXForPowerAndSampleSize(double power, int n) {
-  return mComputePOneXForPowerAndSampleSize(mAlternative, power, n, mCritical(), mNull,
-                                            mOneSample);
+  return mComputePOneXForPowerAndSampleSize(mAlternative, power, n, mCritical(), mNull, mOneSample);
 }
 
 double CmCmndPowerProportion::mComputeOtherXForPowerAndSampleSize(double power, int n) {
@@ -126,7 +125,8 @@ bool CmCmndPowerProportion::mComputeAndStore() {
     for (double e : mEffectList) {
       for (double p : mPowerList) {
         const int n = mCalcPOneSampleSizeGivenPower(mAlternative, p, e, c, mNull, mOneSample);
-        const double q = n > 0 ? mPOneCalcOnePower(mAlternative, n, c, e, mNull, mOneSample) : missing;
+        const double q =
+            n > 0 ? mPOneCalcOnePower(mAlternative, n, c, e, mNull, mOneSample) : missing;
         mStoreRow(row++, n, plusUnlessMissing(e, mNull), q, p);
       }
     }

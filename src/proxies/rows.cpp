@@ -207,7 +207,8 @@ int CbRows::mFilterRowsInternal(const CbRows& other, bool include) {
   CbRows kept;
   for (int i = 0; i < mRowCount; ++i) {
     const int row = mGetRow(i);
-    const bool present = other.mUseAll ? (row >= 1 && row <= other.mRowCount) : isMarked(marks, row);
+    const bool present =
+        other.mUseAll ? (row >= 1 && row <= other.mRowCount) : isMarked(marks, row);
     if (present == include) appendExactly(kept, row);
   }
   kept.mPendingReserve = mPendingReserve;

@@ -77,9 +77,8 @@ TEST(PowerCommands, SampleSizeSolvesAndFailures) {
   t.mSetPowers({0.8});
   t.mComputeAndStore();
   EXPECT_EQ(t.mGetResultSampleSizes(), (std::vector<int>{2, 64}));  // R: 63.77
-  EXPECT_EQ(t.mGetResultPowers()[0],
-            qel::mTOneCalcOnePower(qel::kAlternativeNotEqual, 2, 50.0, 1.0, 0.05, false, true,
-                                   kMissing));
+  EXPECT_EQ(t.mGetResultPowers()[0], qel::mTOneCalcOnePower(qel::kAlternativeNotEqual, 2, 50.0, 1.0,
+                                                            0.05, false, true, kMissing));
 
   qel::CmCmndPowerTAndZ z;
   EXPECT_EQ(z.mSetZTest(true), 1);
@@ -214,8 +213,9 @@ TEST(PowerCommands, SuggestedExtents) {
   double lo = 0.0, hi = 0.0;
   t.mGetSuggestedXMinXMax({}, &lo, &hi);
   EXPECT_EQ(hi, 0.0);
-  EXPECT_NEAR(qel::mTOneCalcOnePower(qel::kAlternativeLess, 25, lo, 1.0, 0.05, true, true, kMissing),
-              0.99, 1e-9);
+  EXPECT_NEAR(
+      qel::mTOneCalcOnePower(qel::kAlternativeLess, 25, lo, 1.0, 0.05, true, true, kMissing), 0.99,
+      1e-9);
   qel::CmCmndVariance v;
   v.mSetAlternative(qel::kAlternativeGreater);
   v.mSetSampleSizes({30});
