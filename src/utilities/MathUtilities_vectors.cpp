@@ -12,47 +12,51 @@ namespace qel {
 
 namespace {
 
-// Folds one value into the running range; the missing value (and NaN, which
-// fails both comparisons) leaves it alone.
-inline void widen(double v, double* min, double* max) {
-  if (mIsNumericMissing(v)) return;
-  if (v < *min) *min = v;
-  if (v > *max) *max = v;
-}
-
-void finish(double* min, double* max) {
-  if (*min == DBL_MAX) *min = *max = mGetMissingValueCode();
-}
+// The running range of a scan; the missing value (and NaN, which fails both
+// comparisons) leaves it alone. The missing value is compared inline: this
+// is the inner loop over up to millions of rows.
+struct Range {
+  double lo = DBL_MAX, hi = -DBL_MAX;
+  const double missing = mGetMissingValueCode();
+  void widen(double v) {
+    if (v == missing) return;
+    lo = v < lo ? v : lo;
+    hi = v > hi ? v : hi;
+  }
+  void store(double* min, double* max) const {
+    const bool none = lo == DBL_MAX;
+    *min = none ? missing : lo;
+    *max = none ? missing : hi;
+  }
+};
 
 }  // namespace
 
 void mMinMax(const std::vector<double>& x, const CbRows& rows, double* min, double* max) {
-  *min = DBL_MAX;
-  *max = -DBL_MAX;
+  Range range;
   const int n = rows.mGetRowCt();
   const std::size_t size = x.size();
   if (rows.mIsUseAllRows()) {
     const std::size_t m = std::min(size, static_cast<std::size_t>(std::max(n, 0)));
-    for (std::size_t i = 0; i < m; ++i) widen(x[i], min, max);
+    for (std::size_t i = 0; i < m; ++i) range.widen(x[i]);
   } else {
     for (int i = 0; i < n; ++i) {
       const int row = rows.mGetRow(i);
-      if (row >= 1 && static_cast<std::size_t>(row) <= size) widen(x[row - 1], min, max);
+      if (row >= 1 && static_cast<std::size_t>(row) <= size) range.widen(x[row - 1]);
     }
   }
-  finish(min, max);
+  range.store(min, max);
 }
 
 void mMinMax(const double* x, const CbRows& rows, double* min, double* max) {
-  *min = DBL_MAX;
-  *max = -DBL_MAX;
+  Range range;
   const int n = rows.mGetRowCt();
   if (rows.mIsUseAllRows()) {
-    for (int i = 0; i < n; ++i) widen(x[i], min, max);
+    for (int i = 0; i < n; ++i) range.widen(x[i]);
   } else {
-    for (int i = 0; i < n; ++i) widen(x[rows.mGetRow(i) - 1], min, max);
+    for (int i = 0; i < n; ++i) range.widen(x[rows.mGetRow(i) - 1]);
   }
-  finish(min, max);
+  range.store(min, max);
 }
 
 void mMinMax(const double* x, int count, double* min, double* max) {
