@@ -174,6 +174,11 @@ TEST(Rows, MissingValueFilters) {
   t.mUseAllRows(5);
   EXPECT_EQ(t.mFilterExcludeMissings(&x), 4);
   EXPECT_TRUE(t == s);
+  // A list is tested at each row's position, not at row - 1.
+  CmRows u;
+  u.mInitialize({3, 1});
+  EXPECT_EQ(u.mFilterExcludeMissings(&x), 1);
+  EXPECT_EQ(rowsOf(u), std::vector<int>{3});
 }
 
 TEST(Rows, RangesAndVectorHelpers) {
