@@ -32,6 +32,7 @@
 #include <vector>
 
 #include "basic_statistics/PowerUtilities.h"
+#include "utilities/LYNBasicTypes.h"
 
 namespace qel {
 
@@ -105,6 +106,8 @@ class CmCmndPower {
   // Appends a row to the result vectors (the target only when sample sizes
   // are solved) and writes it into the lent columns at index row - 1.
   void mStoreRow(int row, int sample, double effect, double power, double targetPower);
+  // x + base, or the missing value when x is missing: an effect as stored.
+  static double mAddBase(double x, double base) { return mIsNumericMissing(x) ? x : x + base; }
 
   bool mOneSample;
   EAlternative mAlternative;

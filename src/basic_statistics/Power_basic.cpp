@@ -8,14 +8,6 @@
 
 namespace qel {
 
-namespace {
-
-double plusUnlessMissing(double x, double base) {
-  return mIsNumericMissing(x) ? x : x + base;
-}
-
-}  // namespace
-
 // --- CmCmndPowerBasic --------------------------------------------------------
 
 CmCmndPowerBasic::CmCmndPowerBasic() : mBaseValue(0.0) {}
@@ -56,7 +48,7 @@ int CmCmndPowerBasic::mCalculatePower(int row) {
   for (double e : mEffectList) {
     for (int n : mSampleSizeList) {
       const double p = n > 0 ? mGetPower(static_cast<unsigned>(n), e) : mGetMissingValueCode();
-      mStoreRow(row++, n, plusUnlessMissing(e, mBaseValue), p, 0.0);
+      mStoreRow(row++, n, mAddBase(e, mBaseValue), p, 0.0);
     }
   }
   return row;
@@ -67,7 +59,7 @@ int CmCmndPowerBasic::mCalculateSampleSize(int row) {
     for (double p : mPowerList) {
       const int n = mComputeXForPowerAndEffect(p, e);
       const double q = n > 0 ? mGetPower(static_cast<unsigned>(n), e) : mGetMissingValueCode();
-      mStoreRow(row++, n, plusUnlessMissing(e, mBaseValue), q, p);
+      mStoreRow(row++, n, mAddBase(e, mBaseValue), q, p);
     }
   }
   return row;
@@ -175,7 +167,7 @@ double CmCmndPowerPoisson::mComputeXForPowerAndSampleSize(double power, int n,
     found = !mIsNumericMissing(atLower) && !mIsNumericMissing(atUpper) && atLower > 0.0 &&
             atUpper < 0.0;
   }
-  return plusUnlessMissing(qel::mGetEffect(found, rootAtLower, lower, upper, f), mRate);
+  return mAddBase(qel::mGetEffect(found, rootAtLower, lower, upper, f), mRate);
 }
 
 int CmCmndPowerPoisson::mComputeXForPowerAndEffect(double power, double effect) const {

@@ -9,14 +9,6 @@
 
 namespace qel {
 
-namespace {
-
-double plusUnlessMissing(double x, double base) {
-  return mIsNumericMissing(x) ? x : x + base;
-}
-
-}  // namespace
-
 // --- CmCmndPowerTAndZ --------------------------------------------------------
 
 CmCmndPowerTAndZ::CmCmndPowerTAndZ() : mUseT(true), mPaired(false) {}
@@ -118,7 +110,7 @@ bool CmCmndPowerProportion::mComputeAndStore() {
     for (double e : mEffectList) {
       for (int n : mSampleSizeList) {
         const double p = mPOneCalcOnePower(mAlternative, n, c, e, mNull, mOneSample);
-        mStoreRow(row++, n, plusUnlessMissing(e, mNull), p, 0.0);
+        mStoreRow(row++, n, mAddBase(e, mNull), p, 0.0);
       }
     }
   } else if (!mSampleSizesGiven) {
@@ -127,7 +119,7 @@ bool CmCmndPowerProportion::mComputeAndStore() {
         const int n = mCalcPOneSampleSizeGivenPower(mAlternative, p, e, c, mNull, mOneSample);
         const double q =
             n > 0 ? mPOneCalcOnePower(mAlternative, n, c, e, mNull, mOneSample) : missing;
-        mStoreRow(row++, n, plusUnlessMissing(e, mNull), q, p);
+        mStoreRow(row++, n, mAddBase(e, mNull), q, p);
       }
     }
   }
