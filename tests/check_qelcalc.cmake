@@ -272,3 +272,29 @@ run(2 "^$" test proportion --events 1 --trials 3 --method bogus)
 run(2 "^$" test proportion ${WORK}/qelcalc_input.txt)
 run(2 "^$" test two-variances --variances 2,3)
 run(2 "^$" test variance ${WORK}/qelcalc_events.txt --variance0 0)
+# power: a solve per design against R (tools/reference/gen_qelcalc_power.R
+# prints the values), and the one-line errors.
+set(hdr "^n effect power target\n")
+run(0 "${hdr}64 0\\.5 0\\.80[0-9]* 0\\.80*[0-9]*\n$" power t --effect 0.5 --power 0.8 --two-sample)
+run(0 "${hdr}10 0\\.5 0\\.3526080824[0-9]* NaN\n20 0\\.5 0\\.6087794846[0-9]* NaN\n$"
+    power z --n 10,20 --effect 0.5)
+run(0 "${hdr}10 -0\\.85283751[0-9]* 0\\.80*[0-9]* NaN\nextents -[0-9.]+ 0\n$"
+    power paired --n 10 --power 0.8 --alternative less --extents)
+run(0 "${hdr}50 0\\.6760661477[0-9]* [0-9.]+ NaN\n50 0\\.1524131624[0-9]* [0-9.]+ NaN\n$"
+    power prop --null 0.4 --n 50 --power 0.8 --two-sample)
+run(0 "${hdr}37 2 0\\.9[0-9]* 0\\.90*[0-9]*\n$"
+    power variance --method chisq --effect 2 --power 0.9 --alternative greater)
+run(0 "${hdr}76 2\\.5 0\\.9[0-9]* 0\\.90*[0-9]*\n$"
+    power poisson --rate 2 --effect 0.5 --power 0.9 --alternative greater)
+run(0 "${hdr}[0-9]+ 1 0\\.8[0-9]* 0\\.80*[0-9]*\n$" power welch --sd1 1 --sd2 3 --effect 1 --power 0.8)
+run(2 "^$" power t --n 10)
+run(2 "^$" power t --n 10 --effect 1 --power 0.9)
+run(2 "^$" power t --n 10 --power 0.05)
+run(2 "^$" power welch --n 10 --power 0.01 --alpha 0.01)
+run(2 "^$" power prop --n 10 --effect 0.7)
+run(2 "^$" power variance --n 10 --effect -1)
+run(2 "^$" power poisson --n 10 --effect -3 --rate 2)
+run(2 "^$" power variance --n 10 --power 0.9 --method anova)
+run(2 "^$" power t --n 0 --power 0.9)
+run(2 "^$" power anova --n 10 --power 0.9)
+run(2 "^$" power t --n 10 --power 0.9 --null 0.5)

@@ -12,6 +12,7 @@
 #include "fit_mode.h"
 #include "matrix_mode.h"
 #include "proportion_variance_mode.h"
+#include "power_mode.h"
 #include "pvalue_mode.h"
 #include "rank_test_mode.h"
 #include "sample_mode.h"
@@ -35,6 +36,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printSummaryUsage(out);
   qelcalc::printTableUsage(out);
   qelcalc::printMatrixUsage(out);
+  qelcalc::printPowerUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -63,6 +65,7 @@ int main(int argc, char** argv) {
     if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
     if (mode == "table") return qelcalc::runTableMode(argc, argv, std::cout);
     if (mode == "matrix") return qelcalc::runMatrixMode(argc, argv, std::cout);
+    if (mode == "power") return qelcalc::runPowerMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

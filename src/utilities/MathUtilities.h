@@ -10,6 +10,26 @@
 
 namespace qel {
 
+class CbRows;
+
+// The smallest and largest non-missing value of the selected rows (numbered
+// from 1) of x; both are the missing value when no row has a value. The
+// vector form skips rows beyond the vector; the pointer forms trust the rows.
+void mMinMax(const std::vector<double>& x, const CbRows& rows, double* min, double* max);
+void mMinMax(const double* x, const CbRows& rows, double* min, double* max);
+void mMinMax(const double* x, int count, double* min, double* max);
+
+// Element-wise work; each empties out, appends to it and returns the count.
+// The product runs over the shorter of a and b. The exponential is the
+// checked one that throws on overflow; the logarithm of x <= 0 is 0.
+int mHadamardProduct(const std::vector<double>& a, const std::vector<double>& b,
+                     std::vector<double>& out);
+int mExponentiateVector(const std::vector<double>& x, std::vector<double>& out);
+int mLogVector(const std::vector<double>& x, std::vector<double>& out);
+
+// The values of a (in a's order, repeats kept) that also occur in b.
+std::vector<int> mGetINTGVectorIntersection(const std::vector<int>& a, const std::vector<int>& b);
+
 double mGetFuzzMax(double x);
 int mCompareWithFuzz(double a, double b, double f);
 bool mEqualWithinFuzz(double a, double b, double f);

@@ -388,3 +388,34 @@ TEST(AllocationFailure, ContingencyTableReportsOutOfMemory) {
 }
 
 }  // namespace
+
+#include "proxies/rows.h"
+#include "utilities/MathUtilities.h"
+
+namespace {
+
+// The all-rows form of a row set holds no list: building it, reading it and
+// taking a range over it allocate nothing (any allocation would throw here).
+TEST(AllocationFailure, AllRowsFormNeverAllocates) {
+  const std::vector<double> x(100, 1.5);
+  qel::CbRows rows;
+  double lo = 0.0, hi = 0.0;
+  long sum = 0;
+  allocationsBeforeFailure = 0;
+  EXPECT_NO_THROW({
+    rows.mUseAllRows(2000000000);
+    for (int i = 0; i < 1000; ++i) sum += rows.mGetRow(i * 1999999);
+    qel::CbRows copy(rows);
+    sum += copy.mGetRowCt() + (copy == rows ? 1 : 0);
+    rows.mFilterRowsInclude(100);
+    qel::mMinMax(x, rows, &lo, &hi);
+    qel::mMinMax(x.data(), 100, &lo, &hi);
+  });
+  const bool allocated = allocationsBeforeFailure.load() < 0;
+  allocationsBeforeFailure = -1;
+  EXPECT_FALSE(allocated);
+  EXPECT_EQ(sum, 1000L + 1999999L * 999L * 1000L / 2 + 2000000001L);
+  EXPECT_EQ(lo, 1.5);
+}
+
+}  // namespace
