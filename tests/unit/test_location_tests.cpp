@@ -71,8 +71,12 @@ std::vector<Case> cases(const char* file = "location_tests.csv") {
 }
 
 // Runs the data form with test (or, when summary is set, the data form and
-// then the summary form on a fresh record holding the data form's inputs).
-Outcome run(const Case& c, bool summary) {
+// then the summary form on a fresh record holding the data form's inputs);
+// intervalOnly takes the forms without alternative and hypothesised value.
+Outcome run(const Case& c, bool summary, bool intervalOnly = false) {
+  const double level = c.confidence, mu = c.hypothesised;
+  const IntervalType type = c.type;
+  const AlternativeHypothesis alt = c.alternative;
   const std::vector<double>& x = samples().at(c.first);
   const std::vector<double>* y = c.second == "-" ? nullptr : &samples().at(c.second);
   const auto n = static_cast<unsigned int>(x.size());
@@ -80,14 +84,15 @@ Outcome run(const Case& c, bool summary) {
   if (c.test == "t1") {
     qel::v0::OneSampleT r;
     r.n = n;
-    o.code =
-        qel::v0::RunOneSampleT(&r, x.data(), c.confidence, c.type, c.alternative, c.hypothesised);
+    o.code = intervalOnly ? qel::v0::RunOneSampleT(&r, x.data(), level, type)
+                          : qel::v0::RunOneSampleT(&r, x.data(), level, type, alt, mu);
     if (summary) {
       qel::v0::OneSampleT s;
       s.n = n;
       s.mean = r.mean;
       s.standardDeviation = r.standardDeviation;
-      o.code = qel::v0::RunOneSampleT(&s, c.confidence, c.type, c.alternative, c.hypothesised);
+      o.code = intervalOnly ? qel::v0::RunOneSampleT(&s, level, type)
+                            : qel::v0::RunOneSampleT(&s, level, type, alt, mu);
       r = s;
     }
     o = {o.code,       r.mean,       r.standardDeviation, r.standardError, n - 1.0,
@@ -95,14 +100,14 @@ Outcome run(const Case& c, bool summary) {
   } else if (c.test == "z1") {
     qel::v0::OneSampleZ r;
     r.n = n;
-    o.code = qel::v0::RunOneSampleZ(&r, x.data(), c.sigma, c.confidence, c.type, c.alternative,
-                                    c.hypothesised);
+    o.code = intervalOnly ? qel::v0::RunOneSampleZ(&r, x.data(), c.sigma, level, type)
+                          : qel::v0::RunOneSampleZ(&r, x.data(), c.sigma, level, type, alt, mu);
     if (summary) {
       qel::v0::OneSampleZ s;
       s.n = n;
       s.mean = r.mean;
-      o.code =
-          qel::v0::RunOneSampleZ(&s, c.sigma, c.confidence, c.type, c.alternative, c.hypothesised);
+      o.code = intervalOnly ? qel::v0::RunOneSampleZ(&s, c.sigma, level, type)
+                            : qel::v0::RunOneSampleZ(&s, c.sigma, level, type, alt, mu);
       EXPECT_TRUE(std::isnan(s.standardDeviation)) << "summary z wrote the deviation";
       s.standardDeviation = r.standardDeviation;
       r = s;
@@ -112,14 +117,15 @@ Outcome run(const Case& c, bool summary) {
   } else if (c.test == "paired") {
     qel::v0::PairedT r;
     r.n = n;
-    o.code = qel::v0::RunPairedT(&r, x.data(), y->data(), c.confidence, c.type, c.alternative,
-                                 c.hypothesised);
+    o.code = intervalOnly ? qel::v0::RunPairedT(&r, x.data(), y->data(), level, type)
+                          : qel::v0::RunPairedT(&r, x.data(), y->data(), level, type, alt, mu);
     if (summary) {
       qel::v0::PairedT s;
       s.n = n;
       s.meanDifference = r.meanDifference;
       s.standardDeviationOfDifferences = r.standardDeviationOfDifferences;
-      o.code = qel::v0::RunPairedT(&s, c.confidence, c.type, c.alternative, c.hypothesised);
+      o.code = intervalOnly ? qel::v0::RunPairedT(&s, level, type)
+                            : qel::v0::RunPairedT(&s, level, type, alt, mu);
       EXPECT_TRUE(std::isnan(s.firstMean) && std::isnan(s.secondMean) &&
                   std::isnan(s.firstStandardError))
           << "summary paired t wrote a per-column field";
@@ -139,8 +145,9 @@ Outcome run(const Case& c, bool summary) {
     qel::v0::TwoSampleT r;
     r.firstN = n;
     r.secondN = static_cast<unsigned int>(y->size());
-    o.code = qel::v0::RunTwoSampleT(&r, x.data(), y->data(), pooled, c.confidence, c.type,
-                                    c.alternative, c.hypothesised);
+    o.code = intervalOnly
+                 ? qel::v0::RunTwoSampleT(&r, x.data(), y->data(), pooled, level, type)
+                 : qel::v0::RunTwoSampleT(&r, x.data(), y->data(), pooled, level, type, alt, mu);
     if (summary) {
       qel::v0::TwoSampleT s;
       s.firstN = r.firstN;
@@ -149,8 +156,8 @@ Outcome run(const Case& c, bool summary) {
       s.secondMean = r.secondMean;
       s.firstStandardDeviation = r.firstStandardDeviation;
       s.secondStandardDeviation = r.secondStandardDeviation;
-      o.code =
-          qel::v0::RunTwoSampleT(&s, pooled, c.confidence, c.type, c.alternative, c.hypothesised);
+      o.code = intervalOnly ? qel::v0::RunTwoSampleT(&s, pooled, level, type)
+                            : qel::v0::RunTwoSampleT(&s, pooled, level, type, alt, mu);
       r = s;
     }
     // The standard error of the difference is no field: recover it from
@@ -243,101 +250,18 @@ TEST(LocationTests, SummaryFormsEqualDataForms) {
   }
 }
 
-TEST(LocationTests, IntervalOnlyFormsLeaveTheTestFieldsAlone) {
-  const std::vector<double>& x = samples().at("a10");
-  const std::vector<double>& y = samples().at("b10");
-  qel::v0::OneSampleT t;
-  t.n = 10;
-  EXPECT_EQ(qel::v0::RunOneSampleT(&t, x.data(), 0.95, qel::kIntervalTwoSided), 0);
-  EXPECT_TRUE(std::isfinite(t.lowerLimit) && std::isfinite(t.upperLimit));
-  EXPECT_TRUE(std::isnan(t.statistic) && std::isnan(t.pValue));
-  qel::v0::OneSampleZ z;
-  z.n = 10;
-  EXPECT_EQ(qel::v0::RunOneSampleZ(&z, x.data(), 1.0, 0.95, qel::kIntervalLowerBound), 0);
-  EXPECT_TRUE(std::isfinite(z.lowerLimit) && z.upperLimit == kInf);
-  EXPECT_TRUE(std::isnan(z.statistic) && std::isnan(z.pValue));
-  qel::v0::PairedT p;
-  p.n = 10;
-  EXPECT_EQ(qel::v0::RunPairedT(&p, x.data(), y.data(), 0.95, qel::kIntervalUpperBound), 0);
-  EXPECT_TRUE(p.lowerLimit == -kInf && std::isfinite(p.upperLimit));
-  EXPECT_TRUE(std::isnan(p.statistic) && std::isnan(p.pValue));
-  qel::v0::TwoSampleT w;
-  w.firstN = w.secondN = 10;
-  EXPECT_EQ(qel::v0::RunTwoSampleT(&w, x.data(), y.data(), false, 0.95, qel::kIntervalTwoSided), 0);
-  EXPECT_TRUE(std::isfinite(w.lowerLimit) && std::isfinite(w.upperLimit));
-  EXPECT_TRUE(std::isnan(w.statistic) && std::isnan(w.pValue));
-}
-
-TEST(LocationTests, SummaryIntervalFormsMatchTheTestForms) {
-  const qel::IntervalType type = qel::kIntervalTwoSided;
-  qel::v0::OneSampleT t, tt;
-  t.n = tt.n = 12;
-  t.mean = tt.mean = 4.5;
-  t.standardDeviation = tt.standardDeviation = 1.25;
-  EXPECT_EQ(qel::v0::RunOneSampleT(&t, 0.9, type), 0);
-  EXPECT_EQ(qel::v0::RunOneSampleT(&tt, 0.9, type, qel::kAlternativeLess, 4.0), 0);
-  EXPECT_EQ(t.lowerLimit, tt.lowerLimit);
-  EXPECT_EQ(t.upperLimit, tt.upperLimit);
-  EXPECT_TRUE(std::isnan(t.statistic) && std::isnan(t.pValue));
-
-  qel::v0::OneSampleZ z, zz;
-  z.n = zz.n = 12;
-  z.mean = zz.mean = 4.5;
-  EXPECT_EQ(qel::v0::RunOneSampleZ(&z, 2.0, 0.9, type), 0);
-  EXPECT_EQ(qel::v0::RunOneSampleZ(&zz, 2.0, 0.9, type, qel::kAlternativeGreater, 4.0), 0);
-  EXPECT_EQ(z.lowerLimit, zz.lowerLimit);
-  EXPECT_EQ(z.standardError, 2.0 / std::sqrt(12.0));
-  EXPECT_TRUE(std::isnan(z.standardDeviation) && std::isnan(z.pValue));
-
-  qel::v0::PairedT p, pp;
-  p.n = pp.n = 12;
-  p.meanDifference = pp.meanDifference = -0.5;
-  p.standardDeviationOfDifferences = pp.standardDeviationOfDifferences = 0.75;
-  EXPECT_EQ(qel::v0::RunPairedT(&p, 0.9, type), 0);
-  EXPECT_EQ(qel::v0::RunPairedT(&pp, 0.9, type, qel::kAlternativeNotEqual, 0.0), 0);
-  EXPECT_EQ(p.upperLimit, pp.upperLimit);
-  EXPECT_TRUE(std::isnan(p.statistic) && std::isnan(p.firstMean) && std::isnan(p.secondMean));
-
-  for (bool pooled : {false, true}) {
-    qel::v0::TwoSampleT w, ww;
-    w.firstN = ww.firstN = 12;
-    w.secondN = ww.secondN = 7;
-    w.firstMean = ww.firstMean = 3.0;
-    w.secondMean = ww.secondMean = 2.0;
-    w.firstStandardDeviation = ww.firstStandardDeviation = 1.0;
-    w.secondStandardDeviation = ww.secondStandardDeviation = 3.0;
-    EXPECT_EQ(qel::v0::RunTwoSampleT(&w, pooled, 0.9, type), 0);
-    EXPECT_EQ(qel::v0::RunTwoSampleT(&ww, pooled, 0.9, type, qel::kAlternativeLess, 0.0), 0);
-    EXPECT_EQ(w.lowerLimit, ww.lowerLimit);
-    EXPECT_EQ(w.degreesOfFreedom, ww.degreesOfFreedom);
-    EXPECT_EQ(w.difference, 1.0);
-    // Pooled: 17 degrees; Welch: floor(1.87429 / 0.276142) = floor(6.787) = 6.
-    EXPECT_EQ(w.degreesOfFreedom, pooled ? 17.0 : 6.0);
-    EXPECT_EQ(std::isnan(w.pooledStandardDeviation), !pooled);
-    EXPECT_TRUE(std::isnan(w.statistic));
+// The interval-only forms, data and summary, give the limits of the full
+// forms (which depend on level and type alone) and leave the test fields NaN.
+TEST(LocationTests, IntervalOnlyFormsGiveTheLimitsAndNoTest) {
+  for (const Case& c : cases()) {
+    for (bool summary : {false, true}) {
+      const Outcome full = run(c, summary), limits = run(c, summary, true);
+      EXPECT_EQ(limits.code, 0) << "line " << c.line;
+      EXPECT_EQ(limits.lower, full.lower) << "line " << c.line;
+      EXPECT_EQ(limits.upper, full.upper) << "line " << c.line;
+      EXPECT_TRUE(std::isnan(limits.statistic) && std::isnan(limits.pValue)) << "line " << c.line;
+    }
   }
-}
-
-TEST(LocationTests, RecordsStartWithNaNAndZeroCounts) {
-  qel::v0::OneSampleT t;
-  qel::v0::OneSampleZ z;
-  qel::v0::PairedT p;
-  qel::v0::TwoSampleT w;
-  for (double v : {t.mean, t.standardDeviation, t.standardError, t.lowerLimit, t.upperLimit,
-                   t.statistic, t.pValue, z.mean, z.standardDeviation, z.standardError,
-                   z.lowerLimit, z.upperLimit, z.statistic, z.pValue})
-    EXPECT_TRUE(std::isnan(v));
-  for (double v : {p.firstMean, p.secondMean, p.firstStandardDeviation, p.secondStandardDeviation,
-                   p.firstStandardError, p.secondStandardError, p.meanDifference,
-                   p.standardDeviationOfDifferences, p.standardErrorOfDifferences, p.lowerLimit,
-                   p.upperLimit, p.statistic, p.pValue})
-    EXPECT_TRUE(std::isnan(v));
-  for (double v :
-       {w.firstMean, w.secondMean, w.firstStandardDeviation, w.secondStandardDeviation,
-        w.firstStandardError, w.secondStandardError, w.difference, w.pooledStandardDeviation,
-        w.degreesOfFreedom, w.lowerLimit, w.upperLimit, w.statistic, w.pValue})
-    EXPECT_TRUE(std::isnan(v));
-  EXPECT_EQ(t.n + z.n + p.n + w.firstN + w.secondN, 0u);
 }
 
 TEST(LocationTests, PairedDataFormsRecordEachColumn) {
@@ -357,46 +281,22 @@ TEST(LocationTests, PairedDataFormsRecordEachColumn) {
   EXPECT_EQ(p.meanDifference, 4.0);
 }
 
-
-
-
+// Every row, data and summary form, with and without a test, under two
+// interval types that do not exist.
 TEST(LocationTests, BadIntervalTypeGives30002AndNaN) {
-  const auto bad = static_cast<IntervalType>(2);
-  const auto worse = static_cast<IntervalType>(-7);
-  const std::vector<double>& x = samples().at("a10");
-  const std::vector<double>& y = samples().at("b10");
-  for (IntervalType type : {bad, worse}) {
-    qel::v0::OneSampleT t;
-    t.n = 10;
-    EXPECT_EQ(qel::v0::RunOneSampleT(&t, x.data(), 0.95, type, qel::kAlternativeLess, 0.0), 30002);
-    EXPECT_TRUE(std::isnan(t.lowerLimit) && std::isnan(t.upperLimit));
-    EXPECT_TRUE(std::isnan(t.statistic) && std::isnan(t.pValue));
-    EXPECT_TRUE(std::isfinite(t.mean) && std::isfinite(t.standardError));
-
-    qel::v0::OneSampleZ z;
-    z.n = 10;
-    z.mean = 1.0;
-    EXPECT_EQ(qel::v0::RunOneSampleZ(&z, 1.0, 0.95, type, qel::kAlternativeGreater, 0.0), 30002);
-    EXPECT_TRUE(std::isnan(z.lowerLimit) && std::isnan(z.upperLimit));
-    EXPECT_TRUE(std::isnan(z.statistic) && std::isnan(z.pValue));
-
-    qel::v0::PairedT p;
-    p.n = 10;
-    EXPECT_EQ(
-        qel::v0::RunPairedT(&p, x.data(), y.data(), 0.95, type, qel::kAlternativeNotEqual, 0.0),
-        30002);
-    EXPECT_TRUE(std::isnan(p.lowerLimit) && std::isnan(p.upperLimit));
-    EXPECT_TRUE(std::isnan(p.statistic) && std::isnan(p.pValue));
-
-    qel::v0::TwoSampleT w;
-    w.firstN = w.secondN = 10;
-    EXPECT_EQ(qel::v0::RunTwoSampleT(&w, x.data(), y.data(), true, 0.95, type), 30002);
-    EXPECT_TRUE(std::isnan(w.lowerLimit) && std::isnan(w.upperLimit));
-    EXPECT_TRUE(std::isnan(w.statistic) && std::isnan(w.pValue));
-
+  for (Case c : cases()) {
+    for (int bad : {2, -7}) {
+      c.type = static_cast<IntervalType>(bad);
+      for (int form = 0; form < 4; ++form) {
+        const Outcome o = run(c, form & 1, form & 2);
+        EXPECT_EQ(o.code, 30002) << "line " << c.line;
+        EXPECT_TRUE(std::isnan(o.lower) && std::isnan(o.upper)) << "line " << c.line;
+        EXPECT_TRUE(std::isnan(o.statistic) && std::isnan(o.pValue)) << "line " << c.line;
+        EXPECT_TRUE(std::isfinite(o.estimate)) << "line " << c.line;
+      }
+    }
   }
 }
-
 
 TEST(LocationTests, EmptyAndSingleSamples) {
   const double one[] = {3.5};
