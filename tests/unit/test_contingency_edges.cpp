@@ -265,14 +265,8 @@ std::vector<double> stratified(unsigned C, unsigned R, std::vector<std::vector<d
 }
 
 TEST(ContingencyEdges, MantelHaenszelStrata) {
-  // Two strata by hand. ((3, 1), (2, 4)): N 10, a - E = 3 - 4 * 5 / 10 = 1,
-  // V = 6 * 5 / 10 * 2 / 9 = 2/3, ad/N = 1.2, bc/N = 0.2. ((5, 5), (1, 9)):
-  // a - E = 5 - 6 * 10 / 20 = 2, V = 14 * 10 / 20 * 3 / 19 = 21/19,
-  // ad/N = 2.25, bc/N = 0.25. Sum of a - E = 3, so s = 2.5.
+  // The values of ordinary strata are R's rows (contingency_r.csv).
   const std::vector<double> two = stratified(2, 2, {{3, 1, 2, 4}, {5, 5, 1, 9}});
-  EXPECT_DOUBLE_EQ(two[0], 3.45 / 0.45);
-  EXPECT_DOUBLE_EQ(two[1], 6.25 / (2.0 / 3.0 + 21.0 / 19.0));
-  EXPECT_EQ(two[3], 1.0);
   // |sum of a - E| below 1/2: the correction is still 1/2 (R's
   // mantelhaen.test would take |sum| itself), s = 0.2 - 0.5 and s^2 = 0.09.
   // ((4, 2), (3, 1)): T = (6, 4), U = (7, 3), a - E = 4 - 7 * 6 / 10 = -0.2,
