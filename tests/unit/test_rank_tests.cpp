@@ -144,18 +144,37 @@ TEST(MannWhitney, DegenerateAndBadInput) {
 
 namespace {
 
-int runKruskalWallis(qel::v0::KruskalWallis& r, std::vector<std::vector<double>> const& data,
-                     std::vector<qel::v0::KruskalWallisGroup>& groups) {
-  groups.clear();
-  for (auto const& d : data) {
-    qel::v0::KruskalWallisGroup g{};
-    g.data = d.data();
-    g.n = static_cast<unsigned int>(d.size());
-    groups.push_back(g);
+// Lends each sample to a group record and runs the test.
+template <class Record, class Group>
+int runGroups(Record& r, std::vector<std::vector<double>> const& data, std::vector<Group>& groups,
+              int (*run)(Record*)) {
+  groups.assign(data.size(), Group{});
+  for (std::size_t g = 0; g < data.size(); ++g) {
+    groups[g].data = data[g].data();
+    groups[g].n = static_cast<unsigned int>(data[g].size());
   }
   r.groups = groups.data();
   r.groupCount = static_cast<unsigned int>(groups.size());
-  return qel::v0::RunLynKruskalWallis(&r);
+  return run(&r);
+}
+
+int runKruskalWallis(qel::v0::KruskalWallis& r, std::vector<std::vector<double>> const& data,
+                     std::vector<qel::v0::KruskalWallisGroup>& groups) {
+  return runGroups(r, data, groups, qel::v0::RunLynKruskalWallis);
+}
+
+int runMood(qel::v0::Mood& r, std::vector<std::vector<double>> const& data,
+            std::vector<qel::v0::MoodGroup>& groups) {
+  return runGroups(r, data, groups, qel::v0::RunLynMood);
+}
+
+// The samples prefix1, prefix2, ... of a case.
+std::vector<std::vector<double>> numbered(std::map<std::string, std::vector<double>> const& rows,
+                                          std::string const& prefix) {
+  std::vector<std::vector<double>> data;
+  for (int i = 1; rows.count(prefix + std::to_string(i)); ++i)
+    data.push_back(rows.at(prefix + std::to_string(i)));
+  return data;
 }
 
 }  // namespace
@@ -165,10 +184,7 @@ TEST(KruskalWallis, MatchesR) {
   int checked = 0;
   for (auto const& [name, rows] : cases.byCase) {
     if (!rows.count("kw")) continue;
-    std::vector<std::vector<double>> data;
-    for (int i = 1; rows.count("kw_g" + std::to_string(i)); ++i) {
-      data.push_back(rows.at("kw_g" + std::to_string(i)));
-    }
+    std::vector<std::vector<double>> data = numbered(rows, "kw_g");
     std::vector<double> const& ref = rows.at("kw");
     qel::v0::KruskalWallis r;
     std::vector<qel::v0::KruskalWallisGroup> groups;
@@ -210,33 +226,12 @@ TEST(KruskalWallis, OneGroupHasNoDegreesOfFreedom) {
   EXPECT_EQ(groups[0].meanRank, 2.5);
 }
 
-namespace {
-
-int runMood(qel::v0::Mood& r, std::vector<std::vector<double>> const& data,
-            std::vector<qel::v0::MoodGroup>& groups) {
-  groups.clear();
-  for (auto const& d : data) {
-    qel::v0::MoodGroup g{};
-    g.data = d.data();
-    g.n = static_cast<unsigned int>(d.size());
-    groups.push_back(g);
-  }
-  r.groups = groups.data();
-  r.groupCount = static_cast<unsigned int>(groups.size());
-  return qel::v0::RunLynMood(&r);
-}
-
-}  // namespace
-
 TEST(Mood, MatchesR) {
   Cases cases = loadCases();
   int checked = 0;
   for (auto const& [name, rows] : cases.byCase) {
     if (!rows.count("md")) continue;
-    std::vector<std::vector<double>> data;
-    for (int i = 1; rows.count("md_g" + std::to_string(i)); ++i) {
-      data.push_back(rows.at("md_g" + std::to_string(i)));
-    }
+    std::vector<std::vector<double>> data = numbered(rows, "md_g");
     std::vector<double> const& ref = rows.at("md");
     qel::v0::Mood r;
     std::vector<qel::v0::MoodGroup> groups;
@@ -331,10 +326,7 @@ TEST(Friedman, MatchesR) {
   int checked = 0;
   for (auto const& [name, rows] : cases.byCase) {
     if (!rows.count("fr")) continue;
-    std::vector<std::vector<double>> columns;
-    for (int i = 1; rows.count("fr_t" + std::to_string(i)); ++i) {
-      columns.push_back(rows.at("fr_t" + std::to_string(i)));
-    }
+    std::vector<std::vector<double>> columns = numbered(rows, "fr_t");
     std::vector<double> const& ref = rows.at("fr");
     qel::v0::Friedman r;
     std::vector<qel::v0::FriedmanTreatment> treatments;
