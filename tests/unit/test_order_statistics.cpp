@@ -266,10 +266,8 @@ TEST(TrimmedMeans, FractionalEndWeights) {
               qel::v1::TrimmedMeanOnSorted(sorted.data(), n, 0.2), 1e-15);
   // Half trimmed: the middle one of an odd count, nothing of an even one.
   EXPECT_EQ(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), 9, 0.5), 2.0);
-  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.5)));
-  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.75)));
-  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, -0.2)));
-  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, kNaN)));
+  for (double trim : {0.5, 0.75, -0.2, kNaN})
+    EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, trim))) << trim;
   EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), 0, 0.1)));
 
   // A large common offset: the compensated update keeps the small spread.

@@ -151,18 +151,16 @@ TEST(Transcendental, ScaledDigammaAndDigammaLimits) {
 TEST(Transcendental, PolygammaErrorCodes) {
   double ans[4] = {7, 7, 7, 7};
   int nz = -1, ierr = -1;
-  qel::XDPSIFN(-1.0, 0, 1, 1, ans, &nz, &ierr);
-  EXPECT_EQ(ierr, 1);
-  qel::XDPSIFN(1.0, -1, 1, 1, ans, &nz, &ierr);
-  EXPECT_EQ(ierr, 1);
-  qel::XDPSIFN(1.0, 0, 3, 1, ans, &nz, &ierr);
-  EXPECT_EQ(ierr, 1);
-  qel::XDPSIFN(1.0, 0, 1, 0, ans, &nz, &ierr);
-  EXPECT_EQ(ierr, 1);
-  qel::XDPSIFN(1.0, 99, 1, 3, ans, &nz, &ierr);  // order 101
-  EXPECT_EQ(ierr, 3);
-  qel::XDPSIFN(1e-300, 2, 1, 1, ans, &nz, &ierr);  // x^-3 overflows
-  EXPECT_EQ(ierr, 2);
+  // Bad x, order, kode or count: 1; order 101: 3; x^-3 overflowing: 2.
+  const struct {
+    double x;
+    int n, kode, m, ierr;
+  } cases[] = {{-1.0, 0, 1, 1, 1}, {1.0, -1, 1, 1, 1}, {1.0, 0, 3, 1, 1},
+               {1.0, 0, 1, 0, 1},  {1.0, 99, 1, 3, 3}, {1e-300, 2, 1, 1, 2}};
+  for (const auto& c : cases) {
+    qel::XDPSIFN(c.x, c.n, c.kode, c.m, ans, &nz, &ierr);
+    EXPECT_EQ(ierr, c.ierr) << c.x << " " << c.n << " " << c.kode << " " << c.m;
+  }
   // Large x: the high orders underflow to 0 and are counted.
   qel::XDPSIFN(1e200, 2, 1, 3, ans, &nz, &ierr);
   EXPECT_EQ(ierr, 0);
