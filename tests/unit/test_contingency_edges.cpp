@@ -1,4 +1,4 @@
-// The contingency table object on hand-worked tables, on bad input and
+// The contingency table object on hand-worked edge tables, on bad input and
 // around its lifecycle: which buffers Analyze writes, the marks of the
 // impossible cases, threads, strata, and the calls a careless host makes.
 #include <gtest/gtest.h>
@@ -32,49 +32,6 @@ std::vector<bool> untouched(TableHost const& host) {
   std::vector<bool> marks;
   for (double x : host.everything()) marks.push_back(x == kSentinel);
   return marks;
-}
-
-TEST(ContingencyEdges, PerfectAgreementTable) {
-  // Column-wise ((10, 0), (0, 10)): all pairs off the diagonal concordant.
-  TableHost host(2, 2, {10, 0, 0, 10});
-  host.run();
-  ASSERT_EQ(host.code, 0);
-  EXPECT_DOUBLE_EQ(host.concordance[6], 1.0);  // gamma
-  EXPECT_DOUBLE_EQ(host.concordance[7], 1.0);  // tau-b
-  EXPECT_DOUBLE_EQ(host.goodmanKruskal[0], 1.0);
-  EXPECT_DOUBLE_EQ(host.goodmanKruskal[1], 1.0);
-  EXPECT_DOUBLE_EQ(host.kappa[0], 1.0);
-  EXPECT_DOUBLE_EQ(host.pearsonR[0], 1.0);
-  EXPECT_DOUBLE_EQ(host.spearman[0], 1.0);
-  EXPECT_EQ(host.concordance[0], 100.0);  // 10 x 10 concordant pairs
-  EXPECT_EQ(host.concordance[1], 0.0);
-  EXPECT_EQ(host.concordance[3], 190.0);  // 20 x 19 / 2
-  EXPECT_EQ(host.grandTotal[0], 20.0);
-  EXPECT_EQ(host.columnTotals[1], 10.0);
-  EXPECT_EQ(host.rowTotals[0], 10.0);
-  // Percentages by hand.
-  EXPECT_EQ(host.cell(5, 0, 0), 100.0);
-  EXPECT_EQ(host.cell(6, 1, 1), 100.0);
-  EXPECT_EQ(host.cell(7, 0, 0), 50.0);
-  EXPECT_EQ(host.columnTotalPercentages[1], 50.0);
-  EXPECT_EQ(host.rowTotalPercentages[0], 50.0);
-  // X^2 = N for a perfect 2 x 2 association, so V^2 = 1.
-  EXPECT_DOUBLE_EQ(host.pearson[0], 20.0);
-  EXPECT_DOUBLE_EQ(host.cramer[0], 1.0);
-}
-
-
-TEST(ContingencyEdges, PercentagesOfUnequalMargins) {
-  // Columns (12, 3) and (5, 9): totals 15 and 14, rows 17 and 12, N 29.
-  TableHost host(2, 2, {12, 3, 5, 9});
-  host.run();
-  EXPECT_DOUBLE_EQ(host.cell(5, 1, 0), 500.0 / 14.0);
-  EXPECT_DOUBLE_EQ(host.cell(6, 0, 0), 1200.0 / 17.0);
-  EXPECT_DOUBLE_EQ(host.cell(6, 1, 0), 500.0 / 17.0);
-  EXPECT_DOUBLE_EQ(host.cell(5, 0, 1), 20.0);
-  EXPECT_DOUBLE_EQ(host.cell(7, 1, 1), 900.0 / 29.0);
-  EXPECT_DOUBLE_EQ(host.rowTotalPercentages[1], 1200.0 / 29.0);
-  EXPECT_DOUBLE_EQ(host.columnTotalPercentages[1], 1400.0 / 29.0);
 }
 
 TEST(ContingencyEdges, OnlyRequestedResultsAreWritten) {
@@ -151,7 +108,6 @@ TEST(ContingencyEdges, SameResultsWithOneAndFourThreads) {
   EXPECT_FALSE(std::isnan(one.concordance[7]));
 }
 
-
 TEST(ContingencyEdges, AllZeroTableGivesNaN) {
   TableHost host(2, 2, {0, 0, 0, 0});
   host.run();
@@ -213,12 +169,8 @@ TEST(ContingencyEdges, FisherAndMcNemarMarks) {
 }
 
 TEST(ContingencyEdges, KappaMarks) {
-  // Square table, all marks 0: Cohen's kappa. ((8, 2), (1, 9)): p = 17/20,
-  // q = (10 * 9 + 10 * 11) / 400 = 0.5, kappa = 0.7.
-  TableHost square(2, 2, {8, 2, 1, 9});
-  square.run(0x40000);
-  EXPECT_DOUBLE_EQ(square.kappa[0], 0.7);
-  // Marks longer than the table stop at its edge; null marks give NaN.
+  // Marks longer than the table stop at its edge (Cohen's kappa of
+  // ((8, 2), (1, 9)) is 0.7); null marks give NaN.
   TableHost longMarks(2, 2, {8, 2, 1, 9});
   longMarks.marks.assign(6, 0.0);
   longMarks.run(0x40000);
@@ -309,14 +261,8 @@ std::vector<double> stratified(unsigned C, unsigned R, std::vector<std::vector<d
 }
 
 TEST(ContingencyEdges, MantelHaenszelStrata) {
-  // Two strata by hand. ((3, 1), (2, 4)): N 10, a - E = 3 - 4 * 5 / 10 = 1,
-  // V = 6 * 5 / 10 * 2 / 9 = 2/3, ad/N = 1.2, bc/N = 0.2. ((5, 5), (1, 9)):
-  // a - E = 5 - 6 * 10 / 20 = 2, V = 14 * 10 / 20 * 3 / 19 = 21/19,
-  // ad/N = 2.25, bc/N = 0.25. Sum of a - E = 3, so s = 2.5.
+  // The values of ordinary strata are R's rows (contingency_r.csv).
   const std::vector<double> two = stratified(2, 2, {{3, 1, 2, 4}, {5, 5, 1, 9}});
-  EXPECT_DOUBLE_EQ(two[0], 3.45 / 0.45);
-  EXPECT_DOUBLE_EQ(two[1], 6.25 / (2.0 / 3.0 + 21.0 / 19.0));
-  EXPECT_EQ(two[3], 1.0);
   // |sum of a - E| below 1/2: the correction is still 1/2 (R's
   // mantelhaen.test would take |sum| itself), s = 0.2 - 0.5 and s^2 = 0.09.
   // ((4, 2), (3, 1)): T = (6, 4), U = (7, 3), a - E = 4 - 7 * 6 / 10 = -0.2,

@@ -174,7 +174,33 @@ TEST(ContingencyReference, TwoByTwoTestsAndKappa) {
     }
   }
   EXPECT_GE(fisher, 3);
-  EXPECT_EQ(kappa, 2);
+  EXPECT_EQ(kappa, 3);
+}
+
+TEST(ContingencyReference, TotalsAndPercentagesMatchR) {
+  int checked = 0;
+  for (auto const& [name, ref] : loadCases()) {
+    if (!ref.count("pct")) continue;
+    TableHost host = runCase(ref);
+    std::vector<double> const& pct = ref.at("pct");
+    const std::size_t n = host.counts.size();
+    for (std::size_t k = 0; k < 3; ++k) {
+      expectCells(host, 5 + static_cast<int>(k),
+                  std::vector<double>(pct.begin() + k * n, pct.begin() + (k + 1) * n), 1e-14,
+                  name + " percentages " + std::to_string(k));
+    }
+    std::vector<double> got = host.columnTotals;
+    got.insert(got.end(), host.rowTotals.begin(), host.rowTotals.end());
+    got.push_back(host.grandTotal[0]);
+    for (auto const* v : {&host.columnTotalPercentages, &host.rowTotalPercentages})
+      got.insert(got.end(), v->begin(), v->end());
+    std::vector<double> const& margins = ref.at("margins");
+    ASSERT_EQ(got.size(), margins.size()) << name;
+    for (std::size_t i = 0; i < got.size(); ++i)
+      EXPECT_LT(error(got[i], margins[i]), 1e-14) << name << " margin " << i;
+    ++checked;
+  }
+  EXPECT_GE(checked, 12);
 }
 
 TEST(ContingencyReference, StratifiedMantelHaenszelMatchesR) {

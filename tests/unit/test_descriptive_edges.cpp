@@ -28,24 +28,19 @@ double reference(const char* dataset, const char* quantity) {
 TEST(DescriptiveEdges, EmptyAndSingleColumns) {
   const double one[] = {5.0};
   const double none[] = {kSentinel};  // must not be taken for data
-  double mean = kSentinel, variance = kSentinel;
-
-  EXPECT_TRUE(std::isnan(qel::v1::GetSampleMean(none, 0)));
-  EXPECT_EQ(qel::v1::GetSampleMean(one, 1), 5.0);
-  EXPECT_TRUE(std::isnan(qel::v1::GetSampleVariance(none, 0)));
-  EXPECT_EQ(qel::v1::GetSampleVariance(one, 1), 0.0);
-  EXPECT_TRUE(std::isnan(qel::v1::GetSampleVariance(none, 0, 1.0)));
-  EXPECT_EQ(qel::v1::GetSampleVariance(one, 1, 1.0), 0.0);
-  qel::v1::GetSampleMeanAndVariance(none, 0, &mean, &variance);
-  EXPECT_TRUE(std::isnan(mean) && std::isnan(variance));
-  qel::v1::GetSampleMeanAndVariance(one, 1, &mean, &variance);
-  EXPECT_EQ(mean, 5.0);
-  EXPECT_EQ(variance, 0.0);
-  qel::v1::CalculateMeanAndStdDev(none, 0, &mean, &variance);
-  EXPECT_TRUE(std::isnan(mean) && std::isnan(variance));
-  qel::v1::CalculateMeanAndStdDev(one, 1, &mean, &variance);
-  EXPECT_EQ(mean, 5.0);
-  EXPECT_EQ(variance, 0.0);
+  // Empty: NaN everywhere; one value: itself and a variance of 0.
+  for (unsigned n : {0u, 1u}) {
+    const double* x = n ? one : none;
+    const double mean = n ? 5.0 : kNaN, spread = n ? 0.0 : kNaN;
+    double m = kSentinel, v = kSentinel, m2 = kSentinel, sd = kSentinel;
+    qel::v1::GetSampleMeanAndVariance(x, n, &m, &v);
+    qel::v1::CalculateMeanAndStdDev(x, n, &m2, &sd);
+    for (double got : {qel::v1::GetSampleMean(x, n), m, m2})
+      EXPECT_TRUE(got == mean || (std::isnan(got) && std::isnan(mean))) << n;
+    for (double got :
+         {qel::v1::GetSampleVariance(x, n), qel::v1::GetSampleVariance(x, n, 1.0), v, sd})
+      EXPECT_TRUE(got == spread || (std::isnan(got) && std::isnan(spread))) << n;
+  }
 
   EXPECT_TRUE(std::isnan(qel::v1::GetSum(none, 0)));
   EXPECT_EQ(qel::v1::GetSum(one, 1), 5.0);

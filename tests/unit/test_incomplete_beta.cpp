@@ -8,8 +8,8 @@
 #include <string>
 
 #include "reference_data.h"
-#include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace {
@@ -95,30 +95,20 @@ TEST(IncompleteBetaRatio, ErrorCodesInTheirOrder) {
   EXPECT_EQ(bratio(2.0, 3.0, 0.25, std::nextafter(0.75, 1.0)).ierr, 0);
 }
 
+// x at 0 or 1; a = 0 puts all mass at 0, b = 0 at 1; both parameters below
+// 1e-3 eps give b/(a+b) whatever x is.
 TEST(IncompleteBetaRatio, DegenerateArguments) {
-  BratioResult r = bratio(2.0, 3.0, 0.0, 1.0);
-  EXPECT_EQ(r.ierr, 0);
-  EXPECT_EQ(r.w, 0.0);
-  EXPECT_EQ(r.w1, 1.0);
-  r = bratio(2.0, 3.0, 1.0, 0.0);
-  EXPECT_EQ(r.w, 1.0);
-  EXPECT_EQ(r.w1, 0.0);
-  r = bratio(0.0, 3.0, 0.4, 0.6);  // a = 0: all mass at 0
-  EXPECT_EQ(r.w, 1.0);
-  EXPECT_EQ(r.w1, 0.0);
-  r = bratio(3.0, 0.0, 0.4, 0.6);  // b = 0: all mass at 1
-  EXPECT_EQ(r.w, 0.0);
-  EXPECT_EQ(r.w1, 1.0);
-  // Both parameters below 1e-3 eps: b/(a+b) whatever x is.
-  for (double x : {1e-10, 0.3, 0.9}) {
-    r = bratio(1e-20, 1e-20, x, 1.0 - x);
+  const struct {
+    double a, b, x, w;
+  } cases[] = {{2.0, 3.0, 0.0, 0.0},     {2.0, 3.0, 1.0, 1.0},       {0.0, 3.0, 0.4, 1.0},
+               {3.0, 0.0, 0.4, 0.0},     {1e-20, 1e-20, 1e-10, 0.5}, {1e-20, 1e-20, 0.3, 0.5},
+               {1e-20, 1e-20, 0.9, 0.5}, {1e-20, 3e-20, 0.3, 0.75}};
+  for (const auto& c : cases) {
+    const BratioResult r = bratio(c.a, c.b, c.x, 1.0 - c.x);
     EXPECT_EQ(r.ierr, 0);
-    EXPECT_EQ(r.w, 0.5);
-    EXPECT_EQ(r.w1, 0.5);
+    EXPECT_DOUBLE_EQ(r.w, c.w) << c.a << " " << c.b << " " << c.x;
+    EXPECT_DOUBLE_EQ(r.w1, 1.0 - c.w) << c.a << " " << c.b << " " << c.x;
   }
-  r = bratio(1e-20, 3e-20, 0.3, 0.7);
-  EXPECT_DOUBLE_EQ(r.w, 0.75);
-  EXPECT_DOUBLE_EQ(r.w1, 0.25);
 }
 
 TEST(IncompleteBetaRatio, NamedEdgeCases) {

@@ -24,12 +24,20 @@ using qeltest::relativeError;
 
 const double kNaN = std::numeric_limits<double>::quiet_NaN();
 const double kInf = std::numeric_limits<double>::infinity();
+const double kAny = 9.87e65;  // a field the edge case does not check
 
 const std::map<std::string, std::vector<double>>& samples() {
   static const std::map<std::string, std::vector<double>> table = [] {
     std::map<std::string, std::vector<double>> t;
     for (const auto& row : qeltest::loadReferenceData("location_samples.csv", 1))
       t[row.text[0]] = row.numbers;
+    // Samples of the edge cases.
+    t["none"] = {};
+    t["one"] = {3.5};
+    t["twos"] = {2.0, 2.0, 2.0, 2.0};
+    t["ones"] = {1.0, 1.0, 1.0, 1.0};
+    t["withNaN"] = {1.0, kNaN, 3.0, 4.0};
+    t["plain"] = {1.0, 2.0, 2.5, 3.0};
     return t;
   }();
   return table;
@@ -71,8 +79,12 @@ std::vector<Case> cases(const char* file = "location_tests.csv") {
 }
 
 // Runs the data form with test (or, when summary is set, the data form and
-// then the summary form on a fresh record holding the data form's inputs).
-Outcome run(const Case& c, bool summary) {
+// then the summary form on a fresh record holding the data form's inputs);
+// intervalOnly takes the forms without alternative and hypothesised value.
+Outcome run(const Case& c, bool summary, bool intervalOnly = false) {
+  const double level = c.confidence, mu = c.hypothesised;
+  const IntervalType type = c.type;
+  const AlternativeHypothesis alt = c.alternative;
   const std::vector<double>& x = samples().at(c.first);
   const std::vector<double>* y = c.second == "-" ? nullptr : &samples().at(c.second);
   const auto n = static_cast<unsigned int>(x.size());
@@ -80,14 +92,15 @@ Outcome run(const Case& c, bool summary) {
   if (c.test == "t1") {
     qel::v0::OneSampleT r;
     r.n = n;
-    o.code =
-        qel::v0::RunOneSampleT(&r, x.data(), c.confidence, c.type, c.alternative, c.hypothesised);
+    o.code = intervalOnly ? qel::v0::RunOneSampleT(&r, x.data(), level, type)
+                          : qel::v0::RunOneSampleT(&r, x.data(), level, type, alt, mu);
     if (summary) {
       qel::v0::OneSampleT s;
       s.n = n;
       s.mean = r.mean;
       s.standardDeviation = r.standardDeviation;
-      o.code = qel::v0::RunOneSampleT(&s, c.confidence, c.type, c.alternative, c.hypothesised);
+      o.code = intervalOnly ? qel::v0::RunOneSampleT(&s, level, type)
+                            : qel::v0::RunOneSampleT(&s, level, type, alt, mu);
       r = s;
     }
     o = {o.code,       r.mean,       r.standardDeviation, r.standardError, n - 1.0,
@@ -95,14 +108,14 @@ Outcome run(const Case& c, bool summary) {
   } else if (c.test == "z1") {
     qel::v0::OneSampleZ r;
     r.n = n;
-    o.code = qel::v0::RunOneSampleZ(&r, x.data(), c.sigma, c.confidence, c.type, c.alternative,
-                                    c.hypothesised);
+    o.code = intervalOnly ? qel::v0::RunOneSampleZ(&r, x.data(), c.sigma, level, type)
+                          : qel::v0::RunOneSampleZ(&r, x.data(), c.sigma, level, type, alt, mu);
     if (summary) {
       qel::v0::OneSampleZ s;
       s.n = n;
       s.mean = r.mean;
-      o.code =
-          qel::v0::RunOneSampleZ(&s, c.sigma, c.confidence, c.type, c.alternative, c.hypothesised);
+      o.code = intervalOnly ? qel::v0::RunOneSampleZ(&s, c.sigma, level, type)
+                            : qel::v0::RunOneSampleZ(&s, c.sigma, level, type, alt, mu);
       EXPECT_TRUE(std::isnan(s.standardDeviation)) << "summary z wrote the deviation";
       s.standardDeviation = r.standardDeviation;
       r = s;
@@ -112,14 +125,15 @@ Outcome run(const Case& c, bool summary) {
   } else if (c.test == "paired") {
     qel::v0::PairedT r;
     r.n = n;
-    o.code = qel::v0::RunPairedT(&r, x.data(), y->data(), c.confidence, c.type, c.alternative,
-                                 c.hypothesised);
+    o.code = intervalOnly ? qel::v0::RunPairedT(&r, x.data(), y->data(), level, type)
+                          : qel::v0::RunPairedT(&r, x.data(), y->data(), level, type, alt, mu);
     if (summary) {
       qel::v0::PairedT s;
       s.n = n;
       s.meanDifference = r.meanDifference;
       s.standardDeviationOfDifferences = r.standardDeviationOfDifferences;
-      o.code = qel::v0::RunPairedT(&s, c.confidence, c.type, c.alternative, c.hypothesised);
+      o.code = intervalOnly ? qel::v0::RunPairedT(&s, level, type)
+                            : qel::v0::RunPairedT(&s, level, type, alt, mu);
       EXPECT_TRUE(std::isnan(s.firstMean) && std::isnan(s.secondMean) &&
                   std::isnan(s.firstStandardError))
           << "summary paired t wrote a per-column field";
@@ -139,8 +153,9 @@ Outcome run(const Case& c, bool summary) {
     qel::v0::TwoSampleT r;
     r.firstN = n;
     r.secondN = static_cast<unsigned int>(y->size());
-    o.code = qel::v0::RunTwoSampleT(&r, x.data(), y->data(), pooled, c.confidence, c.type,
-                                    c.alternative, c.hypothesised);
+    o.code = intervalOnly
+                 ? qel::v0::RunTwoSampleT(&r, x.data(), y->data(), pooled, level, type)
+                 : qel::v0::RunTwoSampleT(&r, x.data(), y->data(), pooled, level, type, alt, mu);
     if (summary) {
       qel::v0::TwoSampleT s;
       s.firstN = r.firstN;
@@ -149,8 +164,8 @@ Outcome run(const Case& c, bool summary) {
       s.secondMean = r.secondMean;
       s.firstStandardDeviation = r.firstStandardDeviation;
       s.secondStandardDeviation = r.secondStandardDeviation;
-      o.code =
-          qel::v0::RunTwoSampleT(&s, pooled, c.confidence, c.type, c.alternative, c.hypothesised);
+      o.code = intervalOnly ? qel::v0::RunTwoSampleT(&s, pooled, level, type)
+                            : qel::v0::RunTwoSampleT(&s, pooled, level, type, alt, mu);
       r = s;
     }
     // The standard error of the difference is no field: recover it from
@@ -224,120 +239,30 @@ TEST(LocationTests, AgreeWithRsTTest) {
   checkAgainst("location_tests_r.csv", 30u);
 }
 
-TEST(LocationTests, SummaryFormsEqualDataForms) {
+bool same(double a, double b) {
+  return a == b || (std::isnan(a) && std::isnan(b));
+}
+
+// The summary forms give what the data forms give (same inputs, same
+// arithmetic: identical, not merely close); the interval-only forms, data and
+// summary, give the limits of the full forms (which depend on level and type
+// alone) and leave the test fields NaN.
+TEST(LocationTests, SummaryAndIntervalOnlyFormsAgreeWithTheDataForms) {
   for (const Case& c : cases()) {
-    const Outcome a = run(c, false);
-    const Outcome b = run(c, true);
+    const Outcome a = run(c, false), b = run(c, true);
     EXPECT_EQ(a.code, b.code);
-    // Same inputs, same arithmetic: identical results, not merely close.
     for (auto pair :
          {std::make_pair(a.standardError, b.standardError), std::make_pair(a.lower, b.lower),
           std::make_pair(a.upper, b.upper), std::make_pair(a.statistic, b.statistic),
-          std::make_pair(a.pValue, b.pValue), std::make_pair(a.df, b.df)}) {
-      if (std::isnan(pair.first)) {
-        EXPECT_TRUE(std::isnan(pair.second)) << "line " << c.line;
-      } else {
-        EXPECT_EQ(pair.first, pair.second) << "line " << c.line;
-      }
+          std::make_pair(a.pValue, b.pValue), std::make_pair(a.df, b.df)})
+      EXPECT_TRUE(same(pair.first, pair.second)) << "line " << c.line;
+    for (bool summary : {false, true}) {
+      const Outcome limits = run(c, summary, true);
+      EXPECT_EQ(limits.code, 0) << "line " << c.line;
+      EXPECT_TRUE(same(limits.lower, a.lower) && same(limits.upper, a.upper)) << "line " << c.line;
+      EXPECT_TRUE(std::isnan(limits.statistic) && std::isnan(limits.pValue)) << "line " << c.line;
     }
   }
-}
-
-TEST(LocationTests, IntervalOnlyFormsLeaveTheTestFieldsAlone) {
-  const std::vector<double>& x = samples().at("a10");
-  const std::vector<double>& y = samples().at("b10");
-  qel::v0::OneSampleT t;
-  t.n = 10;
-  EXPECT_EQ(qel::v0::RunOneSampleT(&t, x.data(), 0.95, qel::kIntervalTwoSided), 0);
-  EXPECT_TRUE(std::isfinite(t.lowerLimit) && std::isfinite(t.upperLimit));
-  EXPECT_TRUE(std::isnan(t.statistic) && std::isnan(t.pValue));
-  qel::v0::OneSampleZ z;
-  z.n = 10;
-  EXPECT_EQ(qel::v0::RunOneSampleZ(&z, x.data(), 1.0, 0.95, qel::kIntervalLowerBound), 0);
-  EXPECT_TRUE(std::isfinite(z.lowerLimit) && z.upperLimit == kInf);
-  EXPECT_TRUE(std::isnan(z.statistic) && std::isnan(z.pValue));
-  qel::v0::PairedT p;
-  p.n = 10;
-  EXPECT_EQ(qel::v0::RunPairedT(&p, x.data(), y.data(), 0.95, qel::kIntervalUpperBound), 0);
-  EXPECT_TRUE(p.lowerLimit == -kInf && std::isfinite(p.upperLimit));
-  EXPECT_TRUE(std::isnan(p.statistic) && std::isnan(p.pValue));
-  qel::v0::TwoSampleT w;
-  w.firstN = w.secondN = 10;
-  EXPECT_EQ(qel::v0::RunTwoSampleT(&w, x.data(), y.data(), false, 0.95, qel::kIntervalTwoSided), 0);
-  EXPECT_TRUE(std::isfinite(w.lowerLimit) && std::isfinite(w.upperLimit));
-  EXPECT_TRUE(std::isnan(w.statistic) && std::isnan(w.pValue));
-}
-
-TEST(LocationTests, SummaryIntervalFormsMatchTheTestForms) {
-  const qel::IntervalType type = qel::kIntervalTwoSided;
-  qel::v0::OneSampleT t, tt;
-  t.n = tt.n = 12;
-  t.mean = tt.mean = 4.5;
-  t.standardDeviation = tt.standardDeviation = 1.25;
-  EXPECT_EQ(qel::v0::RunOneSampleT(&t, 0.9, type), 0);
-  EXPECT_EQ(qel::v0::RunOneSampleT(&tt, 0.9, type, qel::kAlternativeLess, 4.0), 0);
-  EXPECT_EQ(t.lowerLimit, tt.lowerLimit);
-  EXPECT_EQ(t.upperLimit, tt.upperLimit);
-  EXPECT_TRUE(std::isnan(t.statistic) && std::isnan(t.pValue));
-
-  qel::v0::OneSampleZ z, zz;
-  z.n = zz.n = 12;
-  z.mean = zz.mean = 4.5;
-  EXPECT_EQ(qel::v0::RunOneSampleZ(&z, 2.0, 0.9, type), 0);
-  EXPECT_EQ(qel::v0::RunOneSampleZ(&zz, 2.0, 0.9, type, qel::kAlternativeGreater, 4.0), 0);
-  EXPECT_EQ(z.lowerLimit, zz.lowerLimit);
-  EXPECT_EQ(z.standardError, 2.0 / std::sqrt(12.0));
-  EXPECT_TRUE(std::isnan(z.standardDeviation) && std::isnan(z.pValue));
-
-  qel::v0::PairedT p, pp;
-  p.n = pp.n = 12;
-  p.meanDifference = pp.meanDifference = -0.5;
-  p.standardDeviationOfDifferences = pp.standardDeviationOfDifferences = 0.75;
-  EXPECT_EQ(qel::v0::RunPairedT(&p, 0.9, type), 0);
-  EXPECT_EQ(qel::v0::RunPairedT(&pp, 0.9, type, qel::kAlternativeNotEqual, 0.0), 0);
-  EXPECT_EQ(p.upperLimit, pp.upperLimit);
-  EXPECT_TRUE(std::isnan(p.statistic) && std::isnan(p.firstMean) && std::isnan(p.secondMean));
-
-  for (bool pooled : {false, true}) {
-    qel::v0::TwoSampleT w, ww;
-    w.firstN = ww.firstN = 12;
-    w.secondN = ww.secondN = 7;
-    w.firstMean = ww.firstMean = 3.0;
-    w.secondMean = ww.secondMean = 2.0;
-    w.firstStandardDeviation = ww.firstStandardDeviation = 1.0;
-    w.secondStandardDeviation = ww.secondStandardDeviation = 3.0;
-    EXPECT_EQ(qel::v0::RunTwoSampleT(&w, pooled, 0.9, type), 0);
-    EXPECT_EQ(qel::v0::RunTwoSampleT(&ww, pooled, 0.9, type, qel::kAlternativeLess, 0.0), 0);
-    EXPECT_EQ(w.lowerLimit, ww.lowerLimit);
-    EXPECT_EQ(w.degreesOfFreedom, ww.degreesOfFreedom);
-    EXPECT_EQ(w.difference, 1.0);
-    // Pooled: 17 degrees; Welch: floor(1.87429 / 0.276142) = floor(6.787) = 6.
-    EXPECT_EQ(w.degreesOfFreedom, pooled ? 17.0 : 6.0);
-    EXPECT_EQ(std::isnan(w.pooledStandardDeviation), !pooled);
-    EXPECT_TRUE(std::isnan(w.statistic));
-  }
-}
-
-TEST(LocationTests, RecordsStartWithNaNAndZeroCounts) {
-  qel::v0::OneSampleT t;
-  qel::v0::OneSampleZ z;
-  qel::v0::PairedT p;
-  qel::v0::TwoSampleT w;
-  for (double v : {t.mean, t.standardDeviation, t.standardError, t.lowerLimit, t.upperLimit,
-                   t.statistic, t.pValue, z.mean, z.standardDeviation, z.standardError,
-                   z.lowerLimit, z.upperLimit, z.statistic, z.pValue})
-    EXPECT_TRUE(std::isnan(v));
-  for (double v : {p.firstMean, p.secondMean, p.firstStandardDeviation, p.secondStandardDeviation,
-                   p.firstStandardError, p.secondStandardError, p.meanDifference,
-                   p.standardDeviationOfDifferences, p.standardErrorOfDifferences, p.lowerLimit,
-                   p.upperLimit, p.statistic, p.pValue})
-    EXPECT_TRUE(std::isnan(v));
-  for (double v :
-       {w.firstMean, w.secondMean, w.firstStandardDeviation, w.secondStandardDeviation,
-        w.firstStandardError, w.secondStandardError, w.difference, w.pooledStandardDeviation,
-        w.degreesOfFreedom, w.lowerLimit, w.upperLimit, w.statistic, w.pValue})
-    EXPECT_TRUE(std::isnan(v));
-  EXPECT_EQ(t.n + z.n + p.n + w.firstN + w.secondN, 0u);
 }
 
 TEST(LocationTests, PairedDataFormsRecordEachColumn) {
@@ -357,146 +282,83 @@ TEST(LocationTests, PairedDataFormsRecordEachColumn) {
   EXPECT_EQ(p.meanDifference, 4.0);
 }
 
-
-
-
+// Every row, data and summary form, with and without a test, under two
+// interval types that do not exist.
 TEST(LocationTests, BadIntervalTypeGives30002AndNaN) {
-  const auto bad = static_cast<IntervalType>(2);
-  const auto worse = static_cast<IntervalType>(-7);
-  const std::vector<double>& x = samples().at("a10");
-  const std::vector<double>& y = samples().at("b10");
-  for (IntervalType type : {bad, worse}) {
-    qel::v0::OneSampleT t;
-    t.n = 10;
-    EXPECT_EQ(qel::v0::RunOneSampleT(&t, x.data(), 0.95, type, qel::kAlternativeLess, 0.0), 30002);
-    EXPECT_TRUE(std::isnan(t.lowerLimit) && std::isnan(t.upperLimit));
-    EXPECT_TRUE(std::isnan(t.statistic) && std::isnan(t.pValue));
-    EXPECT_TRUE(std::isfinite(t.mean) && std::isfinite(t.standardError));
-
-    qel::v0::OneSampleZ z;
-    z.n = 10;
-    z.mean = 1.0;
-    EXPECT_EQ(qel::v0::RunOneSampleZ(&z, 1.0, 0.95, type, qel::kAlternativeGreater, 0.0), 30002);
-    EXPECT_TRUE(std::isnan(z.lowerLimit) && std::isnan(z.upperLimit));
-    EXPECT_TRUE(std::isnan(z.statistic) && std::isnan(z.pValue));
-
-    qel::v0::PairedT p;
-    p.n = 10;
-    EXPECT_EQ(
-        qel::v0::RunPairedT(&p, x.data(), y.data(), 0.95, type, qel::kAlternativeNotEqual, 0.0),
-        30002);
-    EXPECT_TRUE(std::isnan(p.lowerLimit) && std::isnan(p.upperLimit));
-    EXPECT_TRUE(std::isnan(p.statistic) && std::isnan(p.pValue));
-
-    qel::v0::TwoSampleT w;
-    w.firstN = w.secondN = 10;
-    EXPECT_EQ(qel::v0::RunTwoSampleT(&w, x.data(), y.data(), true, 0.95, type), 30002);
-    EXPECT_TRUE(std::isnan(w.lowerLimit) && std::isnan(w.upperLimit));
-    EXPECT_TRUE(std::isnan(w.statistic) && std::isnan(w.pValue));
-
+  for (Case c : cases()) {
+    for (int bad : {2, -7}) {
+      c.type = static_cast<IntervalType>(bad);
+      for (int form = 0; form < 4; ++form) {
+        const Outcome o = run(c, form & 1, form & 2);
+        EXPECT_EQ(o.code, 30002) << "line " << c.line;
+        EXPECT_TRUE(std::isnan(o.lower) && std::isnan(o.upper)) << "line " << c.line;
+        EXPECT_TRUE(std::isnan(o.statistic) && std::isnan(o.pValue)) << "line " << c.line;
+        EXPECT_TRUE(std::isfinite(o.estimate)) << "line " << c.line;
+      }
+    }
   }
 }
 
-
-TEST(LocationTests, EmptyAndSingleSamples) {
-  const double one[] = {3.5};
-  qel::v0::OneSampleT empty;
-  EXPECT_EQ(qel::v0::RunOneSampleT(&empty, one, 0.95, qel::kIntervalTwoSided,
-                                   qel::kAlternativeNotEqual, 0.0),
-            0);
-  for (double v : {empty.mean, empty.standardDeviation, empty.standardError, empty.lowerLimit,
-                   empty.upperLimit, empty.statistic, empty.pValue})
-    EXPECT_TRUE(std::isnan(v));
-
-  qel::v0::OneSampleT single;
-  single.n = 1;
-  EXPECT_EQ(qel::v0::RunOneSampleT(&single, one, 0.95, qel::kIntervalTwoSided,
-                                   qel::kAlternativeNotEqual, 0.0),
-            0);
-  EXPECT_EQ(single.mean, 3.5);
-  EXPECT_EQ(single.standardDeviation, 0.0);
-  EXPECT_EQ(single.standardError, 0.0);
-  EXPECT_TRUE(std::isnan(single.lowerLimit) && std::isnan(single.upperLimit));
-
-  qel::v0::TwoSampleT w;
-  w.firstN = w.secondN = 1;
-  EXPECT_EQ(qel::v0::RunTwoSampleT(&w, one, one, true, 0.95, qel::kIntervalTwoSided), 0);
-  EXPECT_EQ(w.degreesOfFreedom, 0.0);
-  EXPECT_TRUE(std::isnan(w.lowerLimit) && std::isnan(w.upperLimit));
-
-  qel::v0::PairedT p;
-  EXPECT_EQ(
-      qel::v0::RunPairedT(&p, one, one, 0.95, qel::kIntervalTwoSided, qel::kAlternativeLess, 0.0),
-      0);
-  EXPECT_TRUE(std::isnan(p.meanDifference) && std::isnan(p.lowerLimit) && std::isnan(p.pValue));
+// Empty, single, constant and NaN data: the limits that IEEE arithmetic and
+// the definitions give (a zero standard error makes the statistic infinite,
+// or NaN at the hypothesised value; no degrees of freedom, no interval).
+TEST(LocationTests, EmptySingleConstantAndNaNData) {
+  const double N = kNaN, A = kAny;
+  const auto two = qel::kIntervalTwoSided, lower = qel::kIntervalLowerBound,
+             upper = qel::kIntervalUpperBound;
+  const auto ne = qel::kAlternativeNotEqual, less = qel::kAlternativeLess,
+             greater = qel::kAlternativeGreater;
+  // test, first, second, confidence, type, alternative, hypothesised, sigma,
+  // {code, estimate, deviation, standard error, df, lower, upper, statistic, P}
+  const std::vector<Case> edges = {
+      {"t1", "none", "-", 0.95, two, ne, 0.0, N, {0, N, N, N, A, N, N, N, N}, __LINE__},
+      {"t1", "one", "-", 0.95, two, ne, 0.0, N, {0, 3.5, 0, 0, A, N, N, A, A}, __LINE__},
+      {"pooled", "one", "one", 0.95, two, ne, 0.0, N, {0, A, A, A, 0, N, N, A, A}, __LINE__},
+      {"paired", "none", "none", 0.95, two, less, 0.0, N, {0, N, A, A, A, N, A, A, N}, __LINE__},
+      {"t1", "twos", "-", 0.95, two, ne, 1.0, N, {0, 2, 0, 0, A, 2, 2, kInf, 0}, __LINE__},
+      {"t1", "twos", "-", 0.95, two, ne, 2.0, N, {0, A, A, A, A, A, A, N, N}, __LINE__},
+      {"z1", "ones", "-", 0.95, two, greater, 0.0, 0.0, {0, 1, A, A, A, A, A, kInf, 0}, __LINE__},
+      // Two constant samples under Welch: 0/0 degrees of freedom.
+      {"welch", "twos", "ones", 0.95, two, ne, 0.0, N, {0, A, A, A, N, N, A, kInf, A}, __LINE__},
+      {"t1", "withNaN", "-", 0.95, two, ne, 0.0, N, {0, N, A, A, A, N, N, N, N}, __LINE__},
+      {"paired",
+       "plain",
+       "withNaN",
+       0.95,
+       lower,
+       greater,
+       0,
+       N,
+       {0, N, A, A, A, N, A, A, N},
+       __LINE__},
+      {"pooled",
+       "plain",
+       "withNaN",
+       0.95,
+       upper,
+       less,
+       0,
+       N,
+       {0, N, A, A, A, A, N, A, N},
+       __LINE__},
+  };
+  for (const Case& c : edges) {
+    const Outcome o = run(c, false), &e = c.expected;
+    EXPECT_EQ(o.code, e.code) << "line " << c.line;
+    const double got[] = {o.estimate, o.deviation, o.standardError, o.df,
+                          o.lower,    o.upper,     o.statistic,     o.pValue};
+    const double want[] = {e.estimate, e.deviation, e.standardError, e.df,
+                           e.lower,    e.upper,     e.statistic,     e.pValue};
+    for (int i = 0; i < 8; ++i) {
+      if (want[i] == kAny) continue;
+      EXPECT_TRUE(same(got[i], want[i])) << "field " << i << ": got " << got[i] << ", want "
+                                         << want[i] << " (line " << c.line << ")";
+    }
+  }
 }
 
-TEST(LocationTests, ZeroStandardErrorGivesInfiniteOrNaNStatistic) {
-  const double constant[] = {2.0, 2.0, 2.0, 2.0};
-  qel::v0::OneSampleT t;
-  t.n = 4;
-  EXPECT_EQ(qel::v0::RunOneSampleT(&t, constant, 0.95, qel::kIntervalTwoSided,
-                                   qel::kAlternativeNotEqual, 1.0),
-            0);
-  EXPECT_EQ(t.standardError, 0.0);
-  EXPECT_EQ(t.lowerLimit, 2.0);
-  EXPECT_EQ(t.upperLimit, 2.0);
-  EXPECT_EQ(t.statistic, kInf);
-  EXPECT_EQ(t.pValue, 0.0);
-
-  qel::v0::OneSampleT atMean;
-  atMean.n = 4;
-  EXPECT_EQ(qel::v0::RunOneSampleT(&atMean, constant, 0.95, qel::kIntervalTwoSided,
-                                   qel::kAlternativeNotEqual, 2.0),
-            0);
-  EXPECT_TRUE(std::isnan(atMean.statistic) && std::isnan(atMean.pValue));
-
-  qel::v0::OneSampleZ z;
-  z.n = 4;
-  z.mean = 1.0;
-  EXPECT_EQ(
-      qel::v0::RunOneSampleZ(&z, 0.0, 0.95, qel::kIntervalTwoSided, qel::kAlternativeGreater, 0.0),
-      0);
-  EXPECT_EQ(z.statistic, kInf);
-  EXPECT_EQ(z.pValue, 0.0);
-
-  // Two constant samples under Welch: 0/0 degrees of freedom.
-  qel::v0::TwoSampleT w;
-  w.firstN = w.secondN = 4;
-  const double other[] = {1.0, 1.0, 1.0, 1.0};
-  EXPECT_EQ(qel::v0::RunTwoSampleT(&w, constant, other, false, 0.95, qel::kIntervalTwoSided,
-                                   qel::kAlternativeNotEqual, 0.0),
-            0);
-  EXPECT_TRUE(std::isnan(w.degreesOfFreedom) && std::isnan(w.lowerLimit));
-  EXPECT_EQ(w.statistic, kInf);
-}
-
-TEST(LocationTests, NaNInTheDataAndBadConfidenceGiveNaN) {
-  const double x[] = {1.0, kNaN, 3.0, 4.0};
-  const double y[] = {1.0, 2.0, 2.5, 3.0};
-  qel::v0::OneSampleT t;
-  t.n = 4;
-  EXPECT_EQ(
-      qel::v0::RunOneSampleT(&t, x, 0.95, qel::kIntervalTwoSided, qel::kAlternativeNotEqual, 0.0),
-      0);
-  EXPECT_TRUE(std::isnan(t.mean) && std::isnan(t.lowerLimit) && std::isnan(t.upperLimit) &&
-              std::isnan(t.statistic) && std::isnan(t.pValue));
-
-  qel::v0::PairedT p;
-  p.n = 4;
-  EXPECT_EQ(
-      qel::v0::RunPairedT(&p, y, x, 0.95, qel::kIntervalLowerBound, qel::kAlternativeGreater, 0.0),
-      0);
-  EXPECT_EQ(p.firstMean, 2.125);
-  EXPECT_TRUE(std::isnan(p.meanDifference) && std::isnan(p.lowerLimit) && std::isnan(p.pValue));
-
-  qel::v0::TwoSampleT w;
-  w.firstN = w.secondN = 4;
-  EXPECT_EQ(qel::v0::RunTwoSampleT(&w, y, x, true, 0.95, qel::kIntervalUpperBound,
-                                   qel::kAlternativeLess, 0.0),
-            0);
-  EXPECT_TRUE(std::isnan(w.difference) && std::isnan(w.upperLimit) && std::isnan(w.pValue));
-
+TEST(LocationTests, BadConfidenceGivesNaNLimits) {
+  const double* y = samples().at("plain").data();
   for (double confidence : {0.0, 1.0, 1.5, -0.2, kNaN}) {
     qel::v0::OneSampleT c;
     c.n = 4;

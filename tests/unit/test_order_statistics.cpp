@@ -124,31 +124,6 @@ TEST(SampleQuantiles, FrameRulesHoldForEveryType) {
   }
 }
 
-TEST(SampleQuantiles, TypeSixInterpolatesAndStopsAtTheLargest) {
-  const double sorted[] = {1.0, 5.0, 6.0, 20.0};
-  const double p[] = {0.25, 0.9, 0.1};
-  double q[3];
-  qel::v1::GetType6SampleQuantiles(sorted, 4, q, p, 3);
-  EXPECT_DOUBLE_EQ(q[0], 1.0 + 0.25 * (5.0 - 1.0));  // h = 1.25
-  EXPECT_EQ(q[1], 20.0);                             // h = 4.5 >= n
-  EXPECT_EQ(q[2], 1.0);                              // h = 0.5: g = 0
-}
-
-TEST(SampleQuantiles, DiscontinuousTypesAtExactPositions) {
-  const double sorted[] = {1.0, 2.0, 4.0, 8.0};
-  const double p[] = {0.25, 0.5, 0.375, 0.625};  // n p = 1, 2, 1.5, 2.5
-  double q[4];
-  qel::v1::GetType1SampleQuantiles(sorted, 4, q, p, 4);
-  EXPECT_EQ(std::vector<double>(q, q + 4), (std::vector<double>{1.0, 2.0, 2.0, 4.0}));
-  qel::v1::GetType2SampleQuantiles(sorted, 4, q, p, 4);
-  EXPECT_EQ(std::vector<double>(q, q + 4), (std::vector<double>{1.5, 3.0, 2.0, 4.0}));
-  // Type 3: n p - 1/2 = 0.5, 1.5, 1, 2: only the whole and even 2 steps back.
-  qel::v1::GetType3SampleQuantiles(sorted, 4, q, p, 4);
-  EXPECT_EQ(std::vector<double>(q, q + 4), (std::vector<double>{1.0, 2.0, 2.0, 2.0}));
-  qel::v1::GetType4SampleQuantiles(sorted, 4, q, p, 4);
-  EXPECT_EQ(std::vector<double>(q, q + 4), (std::vector<double>{1.0, 2.0, 1.5, 3.0}));
-}
-
 TEST(TypicalMedian, OddEvenAndEmpty) {
   const double sorted[] = {-1.0, 2.0, 2.5, 9.0};
   EXPECT_TRUE(std::isnan(qel::v1::GetTypicalMedian(sorted, 0)));
@@ -291,10 +266,8 @@ TEST(TrimmedMeans, FractionalEndWeights) {
               qel::v1::TrimmedMeanOnSorted(sorted.data(), n, 0.2), 1e-15);
   // Half trimmed: the middle one of an odd count, nothing of an even one.
   EXPECT_EQ(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), 9, 0.5), 2.0);
-  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.5)));
-  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, 0.75)));
-  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, -0.2)));
-  EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, kNaN)));
+  for (double trim : {0.5, 0.75, -0.2, kNaN})
+    EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), n, trim))) << trim;
   EXPECT_TRUE(std::isnan(qel::v1::LynTrimmedMeanOnSorted(sorted.data(), 0, 0.1)));
 
   // A large common offset: the compensated update keeps the small spread.

@@ -87,16 +87,37 @@ TEST(RootOfQuadratic, LargerRootOrMissing) {
   EXPECT_EQ(qel::mRootOfQuadratic(std::nan(""), 0.0, 1.0), mGetMissingValueCode());
 }
 
-TEST(RootFinder, KnownRootsOfSmoothFunctions) {
+// Roots of smooth functions (a bracket in descending order too), roots at an
+// end of the bracket, and integer arguments: the smallest integer past the
+// sign change (a zero at an integer has reached the other side; without a
+// strict change, the floor of the root end).
+TEST(RootFinder, KnownRoots) {
+  const struct {
+    double (*f)(double);
+    bool integer;
+    double a, b, root, tolerance;
+  } cases[] = {
+      {[](double x) { return x * x * x - 2.0; }, false, 0.0, 2.0, std::cbrt(2.0), 2e-12},
+      {[](double x) { return std::exp(-x) - 0.25; }, false, 10.0, 0.0, std::log(4.0), 1e-11},
+      {[](double x) { return x - 1.0; }, false, 1.0, 3.0, 1.0, 0.0},
+      {[](double x) { return x - 3.0; }, false, 1.0, 3.0, 3.0, 0.0},
+      {[](double x) { return std::floor(x) * std::floor(x) - 10.0; }, true, 0.0, 100.0, 4.0, 0.0},
+      {[](double x) { return 100.0 - std::pow(2.0, std::floor(x)); }, true, 0.0, 20.0, 7.0, 0.0},
+      {[](double x) { return x - 5.0; }, true, 0.0, 10.0, 5.0, 0.0},
+      {[](double x) { return x - 5.0; }, true, 0.0, 1000.0, 5.0, 0.0},
+      {[](double x) { return x - 5.5; }, true, 5.5, 9.0, 5.0, 0.0},
+  };
+  for (const auto& c : cases) {
+    Lambda f(c.f, c.integer);
+    int status = -1;
+    EXPECT_NEAR(qel::mRootFinder(c.a, c.b, f, &status), c.root, c.tolerance) << c.a << " " << c.b;
+    EXPECT_EQ(status, qel::qelOk);
+  }
+  // A root at an end: only the two ends are evaluated.
+  Lambda atUpper([](double x) { return x - 3.0; });
   int status = -1;
-  Lambda cube([](double x) { return x * x * x - 2.0; });
-  EXPECT_NEAR(qel::mRootFinder(0.0, 2.0, cube, &status), std::cbrt(2.0), 2e-12);
-  EXPECT_EQ(status, qel::qelOk);
-
-  // Decreasing function, bracket given in descending order.
-  Lambda decreasing([](double x) { return std::exp(-x) - 0.25; });
-  EXPECT_NEAR(qel::mRootFinder(10.0, 0.0, decreasing, &status), std::log(4.0), 1e-11);
-  EXPECT_EQ(status, qel::qelOk);
+  qel::mRootFinder(1.0, 3.0, atUpper, &status);
+  EXPECT_EQ(atUpper.points.size(), 2u);
 
   // A target subtracted by the subclass; the relative test on f scales with it.
   struct Square : qel::CmRealFunction {
@@ -105,18 +126,6 @@ TEST(RootFinder, KnownRootsOfSmoothFunctions) {
   square.mTarget = 1e20;
   EXPECT_NEAR(qel::mRootFinder(0.0, 1e12, square, &status), 1e10, 1e-1);
   EXPECT_EQ(status, qel::qelOk);
-}
-
-TEST(RootFinder, RootExactlyAtAnEnd) {
-  int status = -1;
-  Lambda atLower([](double x) { return x - 1.0; });
-  EXPECT_EQ(qel::mRootFinder(1.0, 3.0, atLower, &status), 1.0);
-  EXPECT_EQ(status, qel::qelOk);
-  Lambda atUpper([](double x) { return x - 3.0; });
-  EXPECT_EQ(qel::mRootFinder(1.0, 3.0, atUpper, &status), 3.0);
-  EXPECT_EQ(status, qel::qelOk);
-  // Only the two ends were evaluated: no iteration without a strict change.
-  EXPECT_EQ(atUpper.points.size(), 2u);
 }
 
 TEST(RootFinder, NoSignChangeAndNoValue) {
@@ -145,28 +154,6 @@ TEST(RootFinder, ExceptionsOfTheFunctionPassThrough) {
     return x - 0.5;
   });
   EXPECT_THROW(qel::mRootFinder(0.0, 1.0, throwing, &status), std::overflow_error);
-}
-
-TEST(RootFinder, IntegerArgumentGivesSmallestIntegerPastTheChange) {
-  int status = -1;
-  // floor(x)^2 - 10 changes sign between 3 and 4.
-  Lambda square([](double x) { return std::floor(x) * std::floor(x) - 10.0; }, true);
-  EXPECT_EQ(qel::mRootFinder(0.0, 100.0, square, &status), 4.0);
-  EXPECT_EQ(status, qel::qelOk);
-
-  // Decreasing: 100 - 2^n is positive up to 6 and negative from 7.
-  Lambda power([](double x) { return 100.0 - std::pow(2.0, std::floor(x)); }, true);
-  EXPECT_EQ(qel::mRootFinder(0.0, 20.0, power, &status), 7.0);
-
-  // A zero at an integer counts as having reached the other side.
-  Lambda linear([](double x) { return x - 5.0; }, true);
-  EXPECT_EQ(qel::mRootFinder(0.0, 10.0, linear, &status), 5.0);
-  EXPECT_EQ(qel::mRootFinder(0.0, 1000.0, linear, &status), 5.0);
-
-  // Without a strict sign change the floor of the root end is returned.
-  Lambda zeroAtEnd([](double x) { return x - 5.5; }, true);
-  EXPECT_EQ(qel::mRootFinder(5.5, 9.0, zeroAtEnd, &status), 5.0);
-  EXPECT_EQ(status, qel::qelOk);
 }
 
 // A function that is the smallest subnormal on the left of 0.5 and 0.5 - x

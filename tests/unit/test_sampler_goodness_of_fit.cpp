@@ -1,7 +1,8 @@
 // Every family of the sampler: 1e5 draws from a fixed seed pass a
 // Kolmogorov-Smirnov test (continuous) or a chi-square test (discrete) against
 // the distribution object's own Cdf or Pdf at significance 1e-4, and the sample
-// mean and variance lie within 5 standard errors of the family's moments.
+// mean and variance lie within 5 standard errors of the family's moments
+// (tools/reference/gen_sampler_moments.py).
 // Parameters in the body and at awkward values (tiny gamma and beta shapes,
 // p near 0 and 1, a huge Poisson mean). The Kolmogorov distribution is the
 // asymptotic series, the chi-square tail that of the library.
@@ -11,10 +12,12 @@
 #include <algorithm>
 #include <cmath>
 #include <functional>
+#include <map>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "reference_data.h"
 #include "utilities/distributions/classes.h"
 #include "utilities/distributions/kernels.h"
 
@@ -22,10 +25,8 @@ namespace {
 
 using qel::ISampler;
 
-constexpr unsigned kDraws = 100000;
 constexpr double kSignificance = 1e-4;
 constexpr double kSeed = 12345.0;
-const double kNoMoment = std::nan("");
 
 struct SamplerDeleter {
   void operator()(ISampler* s) const { qel::DeleteISampler(&s); }
@@ -109,168 +110,137 @@ void expectMoments(const std::vector<double>& x, double mean, double variance,
   }
 }
 
-struct Case {
-  std::string label;
-  std::function<int(ISampler&, double*)> draw;
-  std::function<qel::CmDist*()> dist;
-  double mean;
-  double variance;
-  unsigned draws = kDraws;
+using Params = std::vector<double>;
+struct Family {
+  std::function<int(ISampler&, double*, unsigned, const Params&)> draw;
+  std::function<qel::CmDist*(const Params&)> dist;
 };
 
-void runCases(const std::vector<Case>& cases, bool continuous) {
+int whole(double x) {
+  return static_cast<int>(x);
+}
+
+// The sampler call and the distribution object of each family of
+// sampler_families.csv, parameters in the order of the call.
+const std::map<std::string, Family>& families() {
+  using S = ISampler&;
+  using P = const Params&;
+  static const std::map<std::string, Family> table = {
+      {"normal",
+       {[](S s, double* o, unsigned n, P p) { return s.Normal(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistNormal(p[0], p[1]); }}},
+      {"uniform",
+       {[](S s, double* o, unsigned n, P p) { return s.Uniform(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistUniform(p[0], p[1]); }}},
+      {"exponential",
+       {[](S s, double* o, unsigned n, P p) { return s.Exponential(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistExponential(p[0], p[1]); }}},
+      {"cauchy",
+       {[](S s, double* o, unsigned n, P p) { return s.Cauchy(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistCauchy(p[0], p[1]); }}},
+      {"laplace",
+       {[](S s, double* o, unsigned n, P p) { return s.Laplace(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistLaplace(p[0], p[1]); }}},
+      {"largest_extreme_value",
+       {[](S s, double* o, unsigned n, P p) { return s.LargestExtremeValue(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistLargestExtremeValue(p[0], p[1]); }}},
+      {"smallest_extreme_value",
+       {[](S s, double* o, unsigned n, P p) { return s.SmallestExtremeValue(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistSmallestExtremeValue(p[0], p[1]); }}},
+      {"logistic",
+       {[](S s, double* o, unsigned n, P p) { return s.Logistic(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistLogistic(p[0], p[1]); }}},
+      {"loglogistic",
+       {[](S s, double* o, unsigned n, P p) { return s.LogLogistic(o, n, p[0], p[1], p[2]); },
+        [](P p) { return new qel::CmDistLogLogistic(p[0], p[1], p[2]); }}},
+      {"lognormal",
+       {[](S s, double* o, unsigned n, P p) { return s.LogNormal(o, n, p[0], p[1], p[2]); },
+        [](P p) { return new qel::CmDistLogNormal(p[0], p[1], p[2]); }}},
+      {"lambda",
+       {[](S s, double* o, unsigned n, P p) { return s.Lambda(o, n, p[0], p[1], p[2]); },
+        [](P p) { return new qel::CmDistLambda(p[0], p[1], p[2]); }}},
+      {"triangular",
+       {[](S s, double* o, unsigned n, P p) { return s.Triangular(o, n, p[0], p[1], p[2]); },
+        [](P p) { return new qel::CmDistTriangular(p[0], p[1], p[2]); }}},
+      {"weibull",
+       {[](S s, double* o, unsigned n, P p) { return s.Weibull(o, n, p[0], p[1], p[2]); },
+        [](P p) { return new qel::CmDistWeibull(p[0], p[1], p[2]); }}},
+      {"gamma",
+       {[](S s, double* o, unsigned n, P p) { return s.Gamma(o, n, p[0], p[1], p[2]); },
+        [](P p) { return new qel::CmDistGamma(p[0], p[1], p[2]); }}},
+      {"chisq",
+       {[](S s, double* o, unsigned n, P p) { return s.ChiSq(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistChiSq(p[0], p[1]); }}},
+      {"beta",
+       {[](S s, double* o, unsigned n, P p) { return s.Beta(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistBeta(p[0], p[1]); }}},
+      {"F",
+       {[](S s, double* o, unsigned n, P p) { return s.F(o, n, p[0], p[1], p[2]); },
+        [](P p) { return new qel::CmDistF(p[0], p[1], p[2]); }}},
+      {"t",
+       {[](S s, double* o, unsigned n, P p) { return s.T(o, n, p[0], p[1]); },
+        [](P p) { return new qel::CmDistT(p[0], p[1]); }}},
+      {"bernoulli",
+       {[](S s, double* o, unsigned n, P p) { return s.Bernoulli(o, n, p[0]); },
+        [](P p) { return new qel::CmDistBernoulli(p[0]); }}},
+      {"binomial",
+       {[](S s, double* o, unsigned n, P p) { return s.Binomial(o, n, whole(p[0]), p[1]); },
+        [](P p) { return new qel::CmDistBinomial(whole(p[0]), p[1]); }}},
+      {"poisson",
+       {[](S s, double* o, unsigned n, P p) { return s.Poisson(o, n, p[0]); },
+        [](P p) { return new qel::CmDistPoisson(p[0]); }}},
+      // The objects' flag counts failures, the sampler's trials.
+      {"negative_binomial",
+       {[](S s, double* o, unsigned n, P p) {
+          return s.NegBinomial(o, n, whole(p[0]), p[1], p[2] != 0);
+        },
+        [](P p) { return new qel::CmDistNegBinomial(p[1], p[0], p[2] == 0); }}},
+      {"geometric",
+       {[](S s, double* o, unsigned n, P p) { return s.Geometric(o, n, p[0], p[1] != 0); },
+        [](P p) { return new qel::CmDistGeometric(p[0], p[1] == 0); }}},
+      {"hypergeometric",
+       {[](S s, double* o, unsigned n, P p) {
+          return s.Hypergeometric(o, n, whole(p[0]), whole(p[1]), whole(p[2]));
+        },
+        [](P p) { return new qel::CmDistHypergeometric(whole(p[0]), whole(p[1]), whole(p[2])); }}},
+      {"integer_uniform",
+       {[](S s, double* o, unsigned n, P p) { return s.Uniform(o, n, whole(p[0]), whole(p[1])); },
+        [](P p) { return new qel::CmDistIntegerUniform(whole(p[0]), whole(p[1])); }}},
+  };
+  return table;
+}
+
+// Every continuous (or discrete) row of sampler_families.csv, drawn in turn
+// from one stream.
+void checkFamilies(bool continuous, std::size_t atLeast) {
   SamplerPtr sampler = makeSampler();
-  for (const Case& c : cases) {
-    std::vector<double> x(c.draws);
-    EXPECT_EQ(c.draw(*sampler, x.data()), 0) << c.label;
-    std::unique_ptr<qel::CmDist> dist(c.dist());
-    ASSERT_TRUE(dist->mAreParamsValid()) << c.label;
-    const double p = continuous ? ksPValue(x, *dist) : chiSquarePValue(x, *dist);
-    EXPECT_GT(p, kSignificance) << c.label;
-    expectMoments(x, c.mean, c.variance, c.label);
+  std::size_t checked = 0;
+  for (const auto& row : qeltest::loadReferenceData("sampler_families.csv", 1)) {
+    const auto& v = row.numbers;
+    if ((v[0] != 0) != continuous) continue;
+    const Params p(v.begin() + 2, v.begin() + 5);
+    const std::string label = row.text[0] + " line " + std::to_string(row.line);
+    ASSERT_EQ(families().count(row.text[0]), 1u) << label;
+    const Family& family = families().at(row.text[0]);
+    std::vector<double> x(static_cast<std::size_t>(v[1]));
+    EXPECT_EQ(family.draw(*sampler, x.data(), static_cast<unsigned>(x.size()), p), 0) << label;
+    std::unique_ptr<qel::CmDist> dist(family.dist(p));
+    ASSERT_TRUE(dist->mAreParamsValid()) << label;
+    EXPECT_GT(continuous ? ksPValue(x, *dist) : chiSquarePValue(x, *dist), kSignificance) << label;
+    expectMoments(x, v[5], v[6], label);
+    ++checked;
   }
+  EXPECT_GE(checked, atLeast);
 }
 
-const double kPi = 3.141592653589793;
-const double kEuler = 0.5772156649015329;
-
-TEST(SamplerGoodnessOfFit, ContinuousByInversionAndPolar) {
-  const double g1 = std::tgamma(1 + 1 / 1.5), g2 = std::tgamma(1 + 2 / 1.5);
-  const double lam = 0.14;
-  const double lambdaVar =
-      2 / (lam * lam) *
-      (1 / (1 + 2 * lam) - std::pow(std::tgamma(lam + 1), 2) / std::tgamma(2 * lam + 2));
-  const double s = 0.2;  // log-logistic scale
-  const double ll1 = kPi * s / std::sin(kPi * s);
-  const double ll2 = 2 * kPi * s / std::sin(2 * kPi * s);
-  runCases(
-      {{"normal(1, 2)", [](ISampler& s, double* o) { return s.Normal(o, kDraws, 1, 2); },
-        [] { return new qel::CmDistNormal(1, 2); }, 1, 4},
-       {"uniform(-1, 3)", [](ISampler& s, double* o) { return s.Uniform(o, kDraws, -1.0, 3.0); },
-        [] { return new qel::CmDistUniform(-1, 3); }, 1, 16.0 / 12},
-       {"exponential(2, 1)", [](ISampler& s, double* o) { return s.Exponential(o, kDraws, 2, 1); },
-        [] { return new qel::CmDistExponential(2, 1); }, 3, 4},
-       {"cauchy(1, 0.5)", [](ISampler& s, double* o) { return s.Cauchy(o, kDraws, 1, 0.5); },
-        [] { return new qel::CmDistCauchy(1, 0.5); }, kNoMoment, kNoMoment},
-       {"laplace(-2, 3)", [](ISampler& s, double* o) { return s.Laplace(o, kDraws, -2, 3); },
-        [] { return new qel::CmDistLaplace(-2, 3); }, -2, 18},
-       {"largest extreme value(1, 2)",
-        [](ISampler& s, double* o) { return s.LargestExtremeValue(o, kDraws, 1, 2); },
-        [] { return new qel::CmDistLargestExtremeValue(1, 2); }, 1 + 2 * kEuler, kPi * kPi * 4 / 6},
-       {"smallest extreme value(1, 2)",
-        [](ISampler& s, double* o) { return s.SmallestExtremeValue(o, kDraws, 1, 2); },
-        [] { return new qel::CmDistSmallestExtremeValue(1, 2); }, 1 - 2 * kEuler,
-        kPi * kPi * 4 / 6},
-       {"logistic(3, 0.5)", [](ISampler& s, double* o) { return s.Logistic(o, kDraws, 3, 0.5); },
-        [] { return new qel::CmDistLogistic(3, 0.5); }, 3, kPi * kPi * 0.25 / 3},
-       {"loglogistic(0.5, 0.2, 1)",
-        [](ISampler& s, double* o) { return s.LogLogistic(o, kDraws, 0.5, 0.2, 1); },
-        [] { return new qel::CmDistLogLogistic(0.5, 0.2, 1); }, 1 + std::exp(0.5) * ll1,
-        std::exp(1.0) * (ll2 - ll1 * ll1)},
-       {"lognormal(0.5, 0.4, 2)",
-        [](ISampler& s, double* o) { return s.LogNormal(o, kDraws, 0.5, 0.4, 2); },
-        [] { return new qel::CmDistLogNormal(0.5, 0.4, 2); }, 2 + std::exp(0.5 + 0.08),
-        (std::exp(0.16) - 1) * std::exp(1 + 0.16)},
-       {"lambda(0.14, 1, 2)",
-        [](ISampler& s, double* o) { return s.Lambda(o, kDraws, 0.14, 1, 2); },
-        [] { return new qel::CmDistLambda(0.14, 1, 2); }, 1, 4 * lambdaVar},
-       {"triangular(0, 1, 4)",
-        [](ISampler& s, double* o) { return s.Triangular(o, kDraws, 0, 1, 4); },
-        [] { return new qel::CmDistTriangular(0, 1, 4); }, 5.0 / 3, (16.0 + 1 - 4) / 18},
-       {"weibull(1.5, 2, 0.5)",
-        [](ISampler& s, double* o) { return s.Weibull(o, kDraws, 1.5, 2, 0.5); },
-        [] { return new qel::CmDistWeibull(1.5, 2, 0.5); }, 0.5 + 2 * g1, 4 * (g2 - g1 * g1)}},
-      true);
-}
-
-double gammaMean(double k, double theta) {
-  return k * theta;
-}
-double gammaVar(double k, double theta) {
-  return k * theta * theta;
-}
-
-TEST(SamplerGoodnessOfFit, GammaEveryGeneratorAndTinyShapes) {
-  std::vector<Case> cases;
-  for (double shape : {0.01, 0.3, 0.999, 1.0, 1.001, 2.5, 3.999, 4.0, 7.5, 1e4}) {
-    cases.push_back(
-        {"gamma shape " + std::to_string(shape),
-         [shape](ISampler& s, double* o) { return s.Gamma(o, kDraws, shape, 1.5, 0.0); },
-         [shape] { return new qel::CmDistGamma(shape, 1.5, 0.0); }, gammaMean(shape, 1.5),
-         gammaVar(shape, 1.5)});
-  }
-  cases.push_back({"chi-square 3", [](ISampler& s, double* o) { return s.ChiSq(o, kDraws, 3, 0); },
-                   [] { return new qel::CmDistChiSq(3, 0); }, 3, 6});
-  runCases(cases, true);
-}
-
-TEST(SamplerGoodnessOfFit, BetaFAndT) {
-  std::vector<Case> cases;
-  const double shapes[][2] = {{2, 3},   {3, 2}, {5, 5},    {0.5, 0.5}, {0.05, 0.5}, {5, 0.3},
-                              {0.3, 5}, {1, 1}, {0.01, 2}, {0.5, 0.2}, {40, 0.9}};
-  for (const auto& ab : shapes) {
-    const double a = ab[0], b = ab[1];
-    cases.push_back({"beta(" + std::to_string(a) + ", " + std::to_string(b) + ")",
-                     [a, b](ISampler& s, double* o) { return s.Beta(o, kDraws, a, b); },
-                     [a, b] { return new qel::CmDistBeta(a, b); }, a / (a + b),
-                     a * b / ((a + b) * (a + b) * (a + b + 1))});
-  }
-  cases.push_back({"F(5, 10)", [](ISampler& s, double* o) { return s.F(o, kDraws, 5, 10, 0); },
-                   [] { return new qel::CmDistF(5, 10, 0); }, 10.0 / 8,
-                   2 * 100.0 * 13 / (5 * 64.0 * 6)});
-  cases.push_back({"F(0.5, 3)", [](ISampler& s, double* o) { return s.F(o, kDraws, 0.5, 3, 0); },
-                   [] { return new qel::CmDistF(0.5, 3, 0); }, kNoMoment, kNoMoment});
-  cases.push_back({"t(6)", [](ISampler& s, double* o) { return s.T(o, kDraws, 6, 0); },
-                   [] { return new qel::CmDistT(6, 0); }, 0, 1.5});
-  // Noncentral t is drawn by inversion through a root search: 5000 draws.
-  const double nu = 8, delta = 1.5;
-  const double tMean =
-      delta * std::sqrt(nu / 2) * std::exp(std::lgamma((nu - 1) / 2) - std::lgamma(nu / 2));
-  cases.push_back({"t(8, 1.5)", [](ISampler& s, double* o) { return s.T(o, 5000, 8, 1.5); },
-                   [] { return new qel::CmDistT(8, 1.5); }, tMean,
-                   nu * (1 + delta * delta) / (nu - 2) - tMean * tMean, 5000});
-  cases.push_back({"t(1)", [](ISampler& s, double* o) { return s.T(o, kDraws, 1, 0); },
-                   [] { return new qel::CmDistT(1, 0); }, kNoMoment, kNoMoment});
-  runCases(cases, true);
+// Inversion and the polar method; the gamma family through every generator
+// (the shape picks it), tiny shapes; beta, F and t, noncentral t.
+TEST(SamplerGoodnessOfFit, ContinuousFamilies) {
+  checkFamilies(true, 40);
 }
 
 TEST(SamplerGoodnessOfFit, DiscreteFamilies) {
-  std::vector<Case> cases = {
-      {"bernoulli(0.3)", [](ISampler& s, double* o) { return s.Bernoulli(o, kDraws, 0.3); },
-       [] { return new qel::CmDistBernoulli(0.3); }, 0.3, 0.21},
-      {"binomial(20, 0.3)", [](ISampler& s, double* o) { return s.Binomial(o, kDraws, 20, 0.3); },
-       [] { return new qel::CmDistBinomial(20, 0.3); }, 6, 4.2},
-      {"binomial(50, 0.002)",
-       [](ISampler& s, double* o) { return s.Binomial(o, kDraws, 50, 0.002); },
-       [] { return new qel::CmDistBinomial(50, 0.002); }, 0.1, 50 * 0.002 * 0.998},
-      {"binomial(30, 0.999)",
-       [](ISampler& s, double* o) { return s.Binomial(o, kDraws, 30, 0.999); },
-       [] { return new qel::CmDistBinomial(30, 0.999); }, 29.97, 30 * 0.999 * 0.001},
-      {"poisson(3)", [](ISampler& s, double* o) { return s.Poisson(o, kDraws, 3); },
-       [] { return new qel::CmDistPoisson(3); }, 3, 3},
-      {"poisson(0.01)", [](ISampler& s, double* o) { return s.Poisson(o, kDraws, 0.01); },
-       [] { return new qel::CmDistPoisson(0.01); }, 0.01, 0.01},
-      // Inversion at a huge mean costs tens of microseconds a draw: 2e4 draws.
-      {"poisson(1e6)", [](ISampler& s, double* o) { return s.Poisson(o, 20000, 1e6); },
-       [] { return new qel::CmDistPoisson(1e6); }, 1e6, 1e6, 20000},
-      {"negative binomial trials(3, 0.4)",
-       [](ISampler& s, double* o) { return s.NegBinomial(o, kDraws, 3, 0.4, true); },
-       [] { return new qel::CmDistNegBinomial(0.4, 3, false); }, 3 / 0.4, 3 * 0.6 / 0.16},
-      {"negative binomial failures(5, 0.9)",
-       [](ISampler& s, double* o) { return s.NegBinomial(o, kDraws, 5, 0.9, false); },
-       [] { return new qel::CmDistNegBinomial(0.9, 5, true); }, 5 * 0.1 / 0.9, 5 * 0.1 / 0.81},
-      {"geometric trials(0.2)",
-       [](ISampler& s, double* o) { return s.Geometric(o, kDraws, 0.2, true); },
-       [] { return new qel::CmDistGeometric(0.2, false); }, 5, 0.8 / 0.04},
-      {"geometric failures(0.02)",
-       [](ISampler& s, double* o) { return s.Geometric(o, kDraws, 0.02, false); },
-       [] { return new qel::CmDistGeometric(0.02, true); }, 49, 0.98 / 0.0004},
-      {"hypergeometric(50, 20, 10)",
-       [](ISampler& s, double* o) { return s.Hypergeometric(o, kDraws, 50, 20, 10); },
-       [] { return new qel::CmDistHypergeometric(50, 20, 10); }, 4, 10 * 0.4 * 0.6 * 40 / 49},
-      {"integer uniform(-3, 7)", [](ISampler& s, double* o) { return s.Uniform(o, kDraws, -3, 7); },
-       [] { return new qel::CmDistIntegerUniform(-3, 7); }, 2, (121.0 - 1) / 12}};
-  runCases(cases, false);
+  checkFamilies(false, 13);
 }
 
 }  // namespace

@@ -75,7 +75,6 @@ TEST(Selection, MedianOfThreeTakesTheMiddleOfEveryPermutation) {
   EXPECT_EQ(qel::mMedianOfThree(1.0, 4.0, 4.0), 4.0);
 }
 
-
 // The tied search only steers the pivots: the selection tests cannot see it.
 TEST(Selection, LowerBoundFindsTheValueHoldingEachOrderStatistic) {
   std::vector<int> untied = {1, 2, 3, 4};
@@ -122,7 +121,6 @@ TEST(Selection, WeightedSelectionEqualsTheExpandedSortedList) {
     }
   }
 }
-
 
 // Every rank of the Walsh averages of small samples, from scratch and with a
 // start pivot, and all ranks in one rising sequence resumed from the bounds.
@@ -201,31 +199,21 @@ TEST(Selection, EveryPairwiseDifferenceOfSmallTiedSamples) {
   }
 }
 
-
-// With a tolerance, sums closer than it to the pivot count as equal: the
-// answer lies within the tolerance of the true k-th value, and the band
-// counts of a pivot agree with a direct count.
+// The band counts of a pivot (sums within the tolerance of it) agree with a
+// direct count.
 TEST(Selection, ToleranceBandsCountNearlyEqualSums) {
   std::mt19937 rng(5);
   std::uniform_real_distribution<double> jitter(-1e-14, 1e-14);
   std::vector<double> x = tiedSample(rng, 60, 5, 1.0);
   for (double& v : x) v += jitter(rng);
-  std::vector<double> averages = sortedWalshAverages(x);
   Compressed c = compress(x, false);
   const double tolerance = 1e-12;
-  for (std::size_t k = 1; k <= averages.size(); k += 37) {
-    qel::CmSelectionBounds bounds;
-    qel::mResetBoundsAvg(static_cast<int>(c.index.size()), bounds);
-    double found = qel::mFinderAvg(c.index, x.data(), c.cumulative, bounds, tolerance, std::nan(""),
-                                   double(k));
-    EXPECT_NEAR(found, averages[k - 1], tolerance) << k;
-  }
   qel::CmSelectionBounds bounds;
   qel::mResetBoundsAvg(static_cast<int>(c.index.size()), bounds);
   double pivot = 2.0;  // sums near 2 are numerous: the band is wide
   qel::CmBandWeights w = qel::mBoundsAvg(c.index, x.data(), c.cumulative, bounds, pivot, tolerance);
   double below = 0, band = 0, above = 0;
-  for (double a : averages) {
+  for (double a : sortedWalshAverages(x)) {
     double sum = 2.0 * a;
     if (sum < pivot - tolerance) {
       ++below;
@@ -241,9 +229,42 @@ TEST(Selection, ToleranceBandsCountNearlyEqualSums) {
   EXPECT_GT(band, 1.0);
 }
 
-// Empty and single samples, ranks out of range, and data holding NaN: the
-// search answers NaN or one of the candidates, and always returns.
-TEST(Selection, DegenerateSamplesAndNaN) {
+// With a tolerance the answer lies within it of the true k-th average; over
+// data holding NaN the search answers NaN or one of the candidates, and always
+// returns. Few rows (the direct search) and many (sampled pivots).
+TEST(Selection, ToleranceAndNaNOnFewAndManyRows) {
+  for (int n : {60, 500}) {
+    std::mt19937 rng(n);
+    std::uniform_real_distribution<double> jitter(-1e-14, 1e-14);
+    std::vector<double> x = tiedSample(rng, n, 5 + n / 20, 1.0);
+    for (double& v : x) v += jitter(rng);
+    const std::vector<double> averages = sortedWalshAverages(x);
+    const Compressed c = compress(x, false);
+    for (std::size_t k = 1; k <= averages.size(); k += averages.size() / 40 + 1) {
+      qel::CmSelectionBounds bounds;
+      qel::mResetBoundsAvg(n, bounds);
+      const double found =
+          qel::mFinderAvg(c.index, x.data(), c.cumulative, bounds, 1e-12, std::nan(""), double(k));
+      EXPECT_NEAR(found, averages[k - 1], 1e-12) << n << " " << k;
+    }
+    for (int i = 0; i < n; i += 7 + n / 50) x[i] = std::nan("");
+    const Compressed withNaN = compress(x, false);
+    for (std::size_t k = 1; k <= averages.size(); k += averages.size() / 6 + 1) {
+      qel::CmSelectionBounds bounds;
+      qel::mResetBoundsAvg(n, bounds);
+      const double found = qel::mFinderAvg(withNaN.index, x.data(), withNaN.cumulative, bounds, 0.0,
+                                           std::nan(""), double(k));
+      bool candidate = std::isnan(found);
+      for (int i = 0; i < n && !candidate; ++i) {
+        for (int j = i; j < n && !candidate; ++j) candidate = (x[i] + x[j]) * 0.5 == found;
+      }
+      EXPECT_TRUE(candidate) << n << " " << found;
+    }
+  }
+}
+
+// Empty and single samples.
+TEST(Selection, EmptyAndSingleSamples) {
   std::vector<int> none;
   qel::CmSelectionBounds bounds;
   qel::mResetBoundsAvg(0, bounds);
@@ -255,28 +276,7 @@ TEST(Selection, DegenerateSamplesAndNaN) {
   qel::mResetBoundsDiff(1, 0, bounds);
   EXPECT_TRUE(std::isnan(
       qel::mFinderDiff(index, one, cumulative, none, nullptr, none, bounds, 0.0, 0.0, 1.0)));
-
-  std::mt19937 rng(17);
-  std::vector<double> x = tiedSample(rng, 90, 20, 1.0);
-  for (int i = 0; i < 90; i += 7) x[i] = std::nan("");
-  std::vector<double> averages;  // unsorted: NaN has no place in an order
-  for (int i = 0; i < 90; ++i) {
-    for (int j = i; j < 90; ++j) averages.push_back((x[i] + x[j]) * 0.5);
-  }
-  Compressed c = compress(x, false);
-  for (std::size_t k = 1; k <= averages.size(); k += 97) {
-    qel::mResetBoundsAvg(90, bounds);
-    double found =
-        qel::mFinderAvg(c.index, x.data(), c.cumulative, bounds, 0.0, std::nan(""), double(k));
-    bool candidate =
-        std::isnan(found) || std::find(averages.begin(), averages.end(), found) != averages.end();
-    EXPECT_TRUE(candidate) << found;
-  }
 }
-
-}  // namespace
-
-namespace {
 
 // Many rows: the search brackets rank k between two pivots from a sample of
 // the cells. Every rank tried, from the extremes (where the bracket reaches
@@ -330,37 +330,6 @@ TEST(Selection, SampledPivotsOnManyRows) {
         EXPECT_EQ(again, expected) << "resumed, walsh " << walsh << " tied " << tied << " k " << k;
       }
     }
-  }
-}
-
-// Many rows with a tolerance and with NaN: within the tolerance of the true
-// value, and a search over NaN returns (NaN or a candidate).
-TEST(Selection, SampledPivotsWithToleranceAndNaN) {
-  std::mt19937 rng(31);
-  std::uniform_real_distribution<double> jitter(-1e-14, 1e-14);
-  std::vector<double> x = tiedSample(rng, 500, 30, 1.0);
-  for (double& v : x) v += jitter(rng);
-  const std::vector<double> averages = sortedWalshAverages(x);
-  const Compressed c = compress(x, false);
-  for (std::size_t k = 1; k <= averages.size(); k += 4999) {
-    qel::CmSelectionBounds bounds;
-    qel::mResetBoundsAvg(500, bounds);
-    const double found =
-        qel::mFinderAvg(c.index, x.data(), c.cumulative, bounds, 1e-12, std::nan(""), double(k));
-    EXPECT_NEAR(found, averages[k - 1], 1e-12) << k;
-  }
-  for (int i = 0; i < 500; i += 11) x[i] = std::nan("");
-  const Compressed withNaN = compress(x, false);
-  for (double k : {1.0, 3000.0, 60000.0, 125000.0}) {
-    qel::CmSelectionBounds bounds;
-    qel::mResetBoundsAvg(500, bounds);
-    const double found =
-        qel::mFinderAvg(withNaN.index, x.data(), withNaN.cumulative, bounds, 0.0, std::nan(""), k);
-    bool candidate = std::isnan(found);
-    for (int i = 0; i < 500 && !candidate; ++i) {
-      for (int j = i; j < 500 && !candidate; ++j) candidate = (x[i] + x[j]) * 0.5 == found;
-    }
-    EXPECT_TRUE(candidate) << found;
   }
 }
 

@@ -12,6 +12,8 @@
 
 namespace {
 
+const double kNaN = std::nan("");
+
 std::map<std::string, std::vector<double>> loadSamples() {
   std::map<std::string, std::vector<double>> samples;
   for (const auto& row : qeltest::loadReferenceData("sign_tests_samples.csv", 1)) {
@@ -68,6 +70,16 @@ TEST(SignTest, MatchesR) {
     EXPECT_EQ(r.countBelow, v[17]) << where;
     EXPECT_EQ(r.countEqual, v[18]) << where;
     EXPECT_EQ(r.countAbove, v[19]) << where;
+
+    // A bad interval type: 30002, every limit NaN, no test.
+    qel::v0::OneSampleSign bad;
+    bad.n = r.n;
+    EXPECT_EQ(qel::v0::RunLynOneSampleSign(&bad, x.data(), v[1], static_cast<qel::IntervalType>(2),
+                                           alt, v[3]),
+              qel::qelFailBadEnumValue);
+    for (double limit :
+         {bad.narrowerLowerLimit, bad.interpolatedUpperLimit, bad.widerUpperLimit, bad.pValue})
+      EXPECT_TRUE(std::isnan(limit)) << where;
   }
 }
 
@@ -89,18 +101,7 @@ TEST(SignTest, EdgeCases) {
   EXPECT_TRUE(std::isnan(r.interpolatedLowerLimit));
   EXPECT_EQ(r.pValue, 1.0);
   EXPECT_EQ(r.n, 0u);
-
-  // A bad interval type: 30002, every limit NaN, no test.
-  r.n = 6;
-  EXPECT_EQ(qel::v0::RunLynOneSampleSign(&r, x, 0.95, static_cast<qel::IntervalType>(2),
-                                         qel::kAlternativeNotEqual, 0.0),
-            qel::qelFailBadEnumValue);
-  EXPECT_TRUE(std::isnan(r.narrowerLowerLimit));
-  EXPECT_TRUE(std::isnan(r.interpolatedUpperLimit));
-  EXPECT_TRUE(std::isnan(r.widerUpperLimit));
-  EXPECT_TRUE(std::isnan(r.pValue));
 }
-
 
 TEST(WilcoxonTest, MatchesR) {
   const auto samples = loadSamples();
@@ -124,13 +125,18 @@ TEST(WilcoxonTest, MatchesR) {
     expectClose(r.pValue, v[9], 1e-10, where + " P-value");
     EXPECT_EQ(r.n, static_cast<int>(v[10])) << where;
 
-    // The interval form gives the same interval and leaves the test fields.
-    qel::v0::OneSampleWilcoxon ci;
-    ci.n = static_cast<int>(x.size());
-    EXPECT_EQ(qel::v0::RunLynOneSampleWilcoxon(&ci, x.data(), v[1], type), 0);
-    expectClose(ci.lowerLimit, r.lowerLimit, 0.0, where);
-    expectClose(ci.upperLimit, r.upperLimit, 0.0, where);
-    EXPECT_TRUE(std::isnan(ci.W));
+    // The interval form gives the same interval and leaves the test fields;
+    // under a bad interval type it answers 30002 and NaN limits.
+    for (int bad : {0, 1}) {
+      qel::v0::OneSampleWilcoxon ci;
+      ci.n = static_cast<int>(x.size());
+      EXPECT_EQ(qel::v0::RunLynOneSampleWilcoxon(&ci, x.data(), v[1],
+                                                 bad ? static_cast<qel::IntervalType>(-2) : type),
+                bad ? qel::qelFailBadEnumValue : 0);
+      expectClose(ci.lowerLimit, bad ? kNaN : r.lowerLimit, 0.0, where);
+      expectClose(ci.upperLimit, bad ? kNaN : r.upperLimit, 0.0, where);
+      EXPECT_TRUE(std::isnan(ci.W));
+    }
   }
   EXPECT_GT(checked, 40);
 }
@@ -153,13 +159,6 @@ TEST(WilcoxonTest, EdgeCases) {
             0);
   EXPECT_TRUE(std::isnan(empty.estimatedMedian));
   EXPECT_TRUE(std::isnan(empty.W));
-
-  qel::v0::OneSampleWilcoxon bad;
-  bad.n = 4;
-  EXPECT_EQ(qel::v0::RunLynOneSampleWilcoxon(&bad, same, 0.95, static_cast<qel::IntervalType>(-2)),
-            qel::qelFailBadEnumValue);
-  EXPECT_TRUE(std::isnan(bad.lowerLimit));
-  EXPECT_TRUE(std::isnan(bad.upperLimit));
 }
 
 TEST(RunsTest, MatchesR) {

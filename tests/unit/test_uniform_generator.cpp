@@ -82,27 +82,15 @@ TEST(UniformGenerator, StreamsMatchIndependentArithmeticBitForBit) {
   EXPECT_GE(deep, 6);
 }
 
+// Beyond the stream rows (seeds 1 and -1, fractions, the size of the space,
+// digit boundaries, reduction): more seeds that give the state (1, 1, 1), and
+// bases set directly, which come back unchanged below the size of the space
+// and reduced above it.
 TEST(UniformGenerator, SeedSpaceEdges) {
-  // b = 1: states (1, 1, 2), first value frac(157/32363 + 146/31727 + 284/31657).
-  CmUniformGenerator one(1.0);
-  EXPECT_EQ(one.mGetBase(), 1.0);
-  double whole;
-  EXPECT_EQ(bits(one.mGetRandom()),
-            bits(std::modf(157.0 / 32363.0 + 146.0 / 31727.0 + 284.0 / 31657.0, &whole)));
-
-  // x and -x give the same stream; the size of the space and fractions below
-  // one give the state (1, 1, 1), whose base is 0.
-  CmUniformGenerator positive(98765.0), negative(-98765.0);
-  EXPECT_EQ(draws(positive, 100), draws(negative, 100));
-  for (double seed : {kBaseSpace, 0.5, 0.999999, -0.25, 2.0 * kBaseSpace}) {
+  for (double seed : {0.999999, -0.25, 2.0 * kBaseSpace}) {
     CmUniformGenerator generator(seed);
     EXPECT_EQ(generator.mGetBase(), 0.0) << seed;
   }
-  CmUniformGenerator origin(kBaseSpace), fraction(0.5);
-  EXPECT_EQ(draws(origin, 50), draws(fraction, 50));
-
-  // Integer bases below the size of the space come back unchanged, including
-  // the digit boundaries; larger ones come back reduced.
   CmUniformGenerator generator(1.0);
   for (double base : {0.0, 1.0, 31655.0, 31656.0, 1004318255.0, 1004318256.0, kBaseSpace - 1.0,
                       4503599627370.0, 12345678901234.0}) {
@@ -113,10 +101,6 @@ TEST(UniformGenerator, SeedSpaceEdges) {
   EXPECT_EQ(generator.mGetBase(), 77.0);
   generator.mSetBase(123.75);
   EXPECT_EQ(generator.mGetBase(), 123.0);
-
-  // Equal non-zero seeds give equal sequences, value for value.
-  CmUniformGenerator a(4242.0), b(4242.0);
-  EXPECT_EQ(draws(a, 1000), draws(b, 1000));
 }
 
 TEST(UniformGenerator, NonFiniteBaseNeitherTrapsNorLeavesTheRanges) {

@@ -26,6 +26,10 @@
 #              the upper-tail normal P-value of the z statistic
 #   kendall  : cor(method = "kendall") on the expanded data (tau-b), small
 #              tables only
+#   pct      : percentages of the column totals, of the row totals and of N,
+#              each cell by cell column by column
+#   margins  : column totals, row totals, N, and the column and row totals
+#              as percentages of N
 #   mh_stratum / mh : strata of 2 x 2 tables (a, b, c, d column by column),
 #              then mantelhaen.test(correct = TRUE): common odds ratio,
 #              statistic, P-value, df
@@ -55,6 +59,8 @@ tableCase <- function(name, m, integerCounts = TRUE) {
   emitRow("table", name, c(ncol(m), nrow(m), as.vector(m)))
   rs <- rowSums(m); cs <- colSums(m); N <- sum(m)
   keepR <- rs > 0; keepC <- cs > 0
+  emitRow("pct", name, c(100 * sweep(m, 2, cs, "/"), 100 * sweep(m, 1, rs, "/"), 100 * m / N))
+  emitRow("margins", name, c(cs, rs, N, 100 * cs / N, 100 * rs / N))
   reduced <- m[keepR, keepC, drop = FALSE]
   # With one row or column left, chisq.test would test goodness of fit to
   # equal proportions, another test: such tables are checked by hand.
@@ -140,6 +146,7 @@ tableCase("unbalanced2x2", matrix(c(25000, 3, 7, 1), 2, 2))
 tableCase("ordered5x4", matrix(c(30, 12, 5, 2, 1, 10, 25, 14, 6, 2, 3, 9, 22, 17, 8, 1, 2, 8, 19, 28), 5, 4))
 tableCase("noninteger", matrix(c(2.5, 7.25, 1.5, 4.75, 3.5, 6.125), 2, 3), integerCounts = FALSE)
 tableCase("row1x4", matrix(c(5, 3, 8, 2), 1, 4))
+kappaCase("perfect2x2", matrix(c(10, 0, 0, 10), 2, 2), c("a", "b"), c("a", "b"))
 kappaCase("kappa_square", matrix(c(40, 5, 3, 6, 30, 4, 2, 7, 25), 3, 3), c("a", "b", "c"), c("a", "b", "c"))
 kappaCase("kappa_offset", matrix(c(22, 4, 3, 5, 18, 2, 1, 6, 15, 3, 2, 9), 3, 4),
           c("a", "b", "d", "e"), c("a", "c", "d"))

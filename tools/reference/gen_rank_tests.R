@@ -34,6 +34,11 @@ mwCase("normal_less", rnorm(25), rnorm(60, 0.3, 2), -1, 0.99)
 mwCase("ties", round(rnorm(50, 0.5) * 2) / 2, round(rnorm(45) * 2) / 2, 0, 0.95)
 mwCase("even_N", rexp(20), rexp(30, 2), 0, 0.8)
 mwCase("large", rnorm(700, 0.1), rnorm(900), 0, 0.95)
+# The two-sided continuity correction near the expectation: W = 11 against
+# E(W) = 12, and W = E(W) exactly (no correction, P = 1); identical samples.
+mwCase("below_expectation", c(1, 3.5, 5.5), c(2, 3, 4, 6), 0, 0.9)
+mwCase("at_expectation", c(1, 3.5, 6.5), c(2, 3, 4, 6), 0, 0.9)
+mwCase("identical", 1:5, 1:5, 0, 0.95)
 
 kwCase <- function(name, groups) {
   for (i in seq_along(groups)) emitRow(paste0("kw_g", i), name, groups[[i]])
