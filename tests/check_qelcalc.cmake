@@ -270,6 +270,4 @@ run(0 "^n 5\ndegree 0\nintercept NaN\nresidual_sd NaN\nr_squared NaN\ncode 30019
     curvefit ${WORK}/qelcalc_curvefit.txt --degree 0 --no-intercept)
 run(0 "^  qelcalc curvefit" curvefit --help)
 run(2 "^$" curvefit ${WORK}/qelcalc_curvefit.txt --degree 1.5)
-run(2 "^$" curvefit ${WORK}/qelcalc_curvefit.txt --order 2)
 run(2 "^$" curvefit ${WORK}/qelcalc_bad.txt)
-run(2 "^$" curvefit ${WORK}/no_such_file.txt)

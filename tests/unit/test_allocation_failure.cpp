@@ -393,8 +393,7 @@ TEST(AllocationFailure, ContingencyTableReportsOutOfMemory) {
 
 namespace {
 
-// Every allocation of the curve fit in turn (the design's columns, the
-// scratch of the reduction): 30001 with every output NaN.
+// Every allocation of the curve fit in turn: 30001 with every output NaN.
 TEST(AllocationFailure, CurveFitReportsOutOfMemory) {
   const double x[] = {0.0, 1.0, 2.0, 3.0, 4.0, 5.0}, y[] = {1.0, 2.5, 2.9, 4.2, 5.1, 5.8};
   double c[5], r2 = 0.0;
