@@ -197,20 +197,19 @@ double GenerateHouseholderVector(double* v, unsigned length, double* beta) {
   if (!(s >= kSmallSum && s <= kLargeSum && a <= std::sqrt(kLargeSum))) {
     // Extreme magnitudes: scale v by a power of 2 (the reflection of the
     // scaled vector is the same), then scale the norm back.
-    double largest = 0.0;
-    for (unsigned i = 0; i < length; ++i) largest = std::max(largest, std::fabs(v[i]));
-    if (std::isnan(largest) || std::isnan(s)) {
+    double tail = 0.0;
+    for (unsigned i = 1; i < length; ++i) tail = std::max(tail, std::fabs(v[i]));
+    if (s == 0.0 && tail == 0.0) return v[0];  // the identity
+    const double largest = std::max(tail, a);
+    if (std::isnan(s) || std::isnan(a) || std::isinf(largest)) {
       *beta = kNaN;
       return kNaN;
     }
-    if (largest == 0.0 || std::isinf(largest)) return s == 0.0 ? v[0] : kNaN;
     int e = 0;
     std::frexp(largest, &e);
     const double factor = std::ldexp(1.0, -e);
     for (unsigned i = 0; i < length; ++i) v[i] *= factor;
-    s = squaredNorm(v + 1, length - 1);
-    if (s == 0.0) return std::ldexp(v[0], e);
-    return std::ldexp(reflectHeadAndTail(v, s, beta), e);
+    return std::ldexp(reflectHeadAndTail(v, squaredNorm(v + 1, length - 1), beta), e);
   }
   return reflectHeadAndTail(v, s, beta);
 }

@@ -50,9 +50,10 @@ double** MakeDesignMatrix(unsigned const* groupSizes, unsigned groups, int* stat
 // new diagonal element (r = ||v|| >= 0). v[1..] are kept; v[0] becomes
 // v[0] - r, computed as -s / (v[0] + r) for positive v[0] to avoid
 // cancellation (Parlett 1971), where s is the sum of squares of v[1..]. When
-// length is 1 or s is 0 the reflection is the identity: beta = 0 and the
-// return value is v[0] itself. The sums are scaled when the squares would
-// overflow or underflow.
+// length is 1 or v[1..] are 0 the reflection is the identity: beta = 0 and
+// the return value is v[0] itself. When the squares would overflow or
+// underflow, the whole of v is first scaled by a power of 2 (which leaves
+// the reflection the same). Infinite or NaN elements give NaN and beta NaN.
 double GenerateHouseholderVector(double* v, unsigned length, double* beta);
 
 // Applies the reflection (v, beta) to column: column -= v (beta v'column).
