@@ -298,3 +298,14 @@ run(2 "^$" power variance --n 10 --power 0.9 --method anova)
 run(2 "^$" power t --n 0 --power 0.9)
 run(2 "^$" power anova --n 10 --power 0.9)
 run(2 "^$" power t --n 10 --power 0.9 --null 0.5)
+
+# curvefit: a straight line through five points (R: lm(y ~ x)), a fit with
+# no term, and bad input.
+file(WRITE ${WORK}/qelcalc_curvefit.txt "x,y\n1,2.1\n2,3.9\n\n3 6.2\n4\t7.8\n5,10.1\n")
+run(0 "^n 5\ndegree 1\nintercept 0\\.0(49999999999|500000000000)[0-9]*\nx\\^1 1\\.9(8999999999|9000000000)[0-9]*\nresidual_sd 0\\.188856206322[0-9]*\nr_squared 0\\.99730532890097[0-9]*\ncode 0\n$"
+    curvefit ${WORK}/qelcalc_curvefit.txt)
+run(0 "^n 5\ndegree 0\nintercept NaN\nresidual_sd NaN\nr_squared NaN\ncode 30019 [^\n]*\n$"
+    curvefit ${WORK}/qelcalc_curvefit.txt --degree 0 --no-intercept)
+run(0 "^  qelcalc curvefit" curvefit --help)
+run(2 "^$" curvefit ${WORK}/qelcalc_curvefit.txt --degree 1.5)
+run(2 "^$" curvefit ${WORK}/qelcalc_bad.txt)

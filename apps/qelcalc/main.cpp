@@ -7,6 +7,7 @@
 #include <string>
 
 #include "cli.h"
+#include "curvefit_mode.h"
 #include "describe_mode.h"
 #include "distribution_mode.h"
 #include "fit_mode.h"
@@ -33,6 +34,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printRankTestUsage(out);
   qelcalc::printProportionVarianceUsage(out);
   qelcalc::printFitUsage(out);
+  qelcalc::printCurveFitUsage(out);
   qelcalc::printSummaryUsage(out);
   qelcalc::printTableUsage(out);
   qelcalc::printMatrixUsage(out);
@@ -61,6 +63,7 @@ int main(int argc, char** argv) {
     if (mode == "ttest") return qelcalc::runTTestMode(argc, argv, std::cout);
     if (mode == "test") return qelcalc::runTestMode(argc, argv, std::cout);
     if (mode == "fit") return qelcalc::runFitMode(argc, argv, std::cout);
+    if (mode == "curvefit") return qelcalc::runCurveFitMode(argc, argv, std::cout);
     if (mode == "summary") return qelcalc::runSummaryMode(argc, argv, std::cout);
     if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
     if (mode == "table") return qelcalc::runTableMode(argc, argv, std::cout);

@@ -9,6 +9,7 @@
 #include <qel/interval.h>
 #include <qel/location_tests.h>
 #include <qel/sign_tests.h>
+#include <qel/curve_fit.h>
 #include <qel/fits.h>
 #include <qel/order_statistics.h>
 #include <qel/rank_tests.h>
