@@ -9,6 +9,7 @@
 #include <cmath>
 #include <limits>
 
+#include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
 
 namespace {
@@ -72,6 +73,7 @@ TEST(ElvGammaDf, ZeroAndHugeArguments) {
 
 // One point in each branch: (x, a, method, code).
 TEST(ElvGammaDf, MethodNumbersOfTheBranches) {
+  const qel::elv::ScopedElvPrecision written(qel::elv::ElvPrecision::Written);
   struct Case {
     double x, a;
     int method, code;

@@ -19,13 +19,15 @@
 #include <utility>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
 using namespace qel::elv;
 
 constexpr long kBetaSeriesCap = 1000000;
-constexpr int kContinuedFractionSteps = 80;
+// Enough for a gap of 2e-15 at the slowest admissible convergence.
+constexpr int kContinuedFractionSteps = 400;
 constexpr int kPowerSeriesTerms = 30;
 constexpr double kEulerGamma = 0.5772156649015329;
 constexpr double kZeta2 = 1.6449340668482264;
@@ -90,7 +92,7 @@ int beta_Iabx(double* out, double a, double b, double x) {
     const double ratio = (b - n) / (a + n) * y;
     if (ratio < -0.5) break;
     term *= ratio;
-    if (std::fabs(term) < kSeriesCutoff) {
+    if (std::fabs(term) < seriesCutoff()) {
       finite = true;
       break;
     }
@@ -107,7 +109,7 @@ int beta_Iabx(double* out, double a, double b, double x) {
   // Hypergeometric form: positive terms, geometric tail with ratio x.
   term = 1.0;
   n = 0;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     ++n;
     if (n >= kBetaSeriesCap) return seriesFailed(name);
     term *= (a + b + n - 1.0) * x / (a + n);
@@ -131,7 +133,7 @@ int beta_Jabx(double* out, double a, double b, double x) {
     ++n;
     if (n >= kBetaSeriesCap) return seriesFailed(name);
     term *= (a - n) / (b + n) * u;
-    if (term < kSeriesCutoff) {
+    if (term < seriesCutoff()) {
       finite = true;
       break;
     }
@@ -195,7 +197,7 @@ int beta_J_complete(double* out, double a, double b, double x) {
       }
       pair[half] = A / B;
     }
-    if (std::fabs(pair[1] - pair[0]) < kSeriesCutoff * pair[1]) {
+    if (std::fabs(pair[1] - pair[0]) < fractionGap() * pair[1]) {
       *out = 0.5 * (pair[0] + pair[1]);
       ELVmethod = 1;
       ELVsteps2 = step;
@@ -222,7 +224,7 @@ double beta_ps(double x, double a, double b) {
   double term = std::exp(a * lnbx) * (b - 1.0) * x / (1.0 + a);
   double s = term;
   int i = 2;
-  for (; i <= kPowerSeriesTerms && std::fabs(term) > kSeriesCutoff; ++i) {
+  for (; i <= kPowerSeriesTerms && std::fabs(term) > seriesCutoff(); ++i) {
     term *= -((b - i) / i) * ((a + i - 1.0) / (a + i)) * x;
     s += term;
   }

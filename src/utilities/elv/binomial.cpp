@@ -14,6 +14,7 @@
 #include <utility>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -30,7 +31,7 @@ template <class Ratio>
 int scaledSum(const char* name, long available, double* out, Ratio ratio) {
   double term = 1.0;
   long n = 0;
-  while (n < available && term >= kSeriesCutoff) {
+  while (n < available && term >= seriesCutoff()) {
     if (n + 1 >= kMaxCount) {
       ELVsteps1 = 0;
       ELVexit(name, 4, 'F');

@@ -17,6 +17,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -24,7 +25,8 @@ using namespace qel::elv;
 
 constexpr long kIaxCap = 1000001;
 constexpr long kJaxCap = 1000000;
-constexpr int kContinuedFractionSteps = 80;
+// Enough for a gap of 2e-15 at the slowest admissible convergence.
+constexpr int kContinuedFractionSteps = 400;
 constexpr int kPowerSeriesTerms = 40;
 
 }  // namespace
@@ -36,7 +38,7 @@ extern "C" {
 int gamma_Iax(double* out, double a, double x) {
   double term = 1.0;
   long n = 0;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     ++n;
     if (n >= kIaxCap) {
       ELVsteps1 = 0;
@@ -60,7 +62,7 @@ int gamma_Iax(double* out, double a, double x) {
 int gamma_Jax(double* out, double a, double x) {
   double term = 1.0;
   long n = 0;
-  while (n + 1 <= a - 1.0 && term >= kSeriesCutoff) {
+  while (n + 1 <= a - 1.0 && term >= seriesCutoff()) {
     ++n;
     if (n >= kJaxCap) {
       ELVsteps1 = 0;
@@ -70,7 +72,7 @@ int gamma_Jax(double* out, double a, double x) {
     term *= (a - n) / x;
   }
   double sum = 1.0;
-  if (term < kSeriesCutoff) {
+  if (term < seriesCutoff()) {
     ELVmethod = 0;
   } else {
     n = static_cast<long>(std::floor(a));
@@ -110,7 +112,7 @@ int gamma_J_complete(double* out, double x, double a) {
       B2 *= 1e-100;
     }
     const double odd = A1 / B1, even = A2 / B2;
-    if ((even - odd) / odd < kSeriesCutoff) {
+    if ((even - odd) / odd < fractionGap()) {
       *out = 0.5 * (odd + even);
       ELVmethod = 1;
       ELVsteps2 = n;
@@ -132,7 +134,7 @@ double gamma_ps(double x, double a) {
   double term = std::pow(x, 1.0 + a) / (1.0 + a);
   double s = term;
   int i = 2;
-  for (; i <= kPowerSeriesTerms && std::fabs(term) > kSeriesCutoff; ++i) {
+  for (; i <= kPowerSeriesTerms && std::fabs(term) > seriesCutoff(); ++i) {
     term *= (-x / i) * ((a + i - 1.0) / (a + i));
     s += term;
   }
@@ -255,7 +257,7 @@ int gamma_newton(double* x, char mode, double target, double a) {
   ELVstartup(name);
   double step = 0.0, scale = -1.0;
   for (long counter = 1; counter <= 35; ++counter) {
-    if (std::fabs(step) < kSeriesCutoff * scale) {
+    if (std::fabs(step) < stepLimit() * scale) {
       // The last correction is below the step limit; applying it costs
       // nothing and, Newton's convergence being quadratic, leaves an error
       // far below it.
@@ -281,7 +283,7 @@ int gamma_newton(double* x, char mode, double target, double a) {
     }
     scale = *x > r ? *x : r;
   }
-  if (std::fabs(step) < kSeriesCutoff * scale) {
+  if (std::fabs(step) < stepLimit() * scale) {
     *x += step;
     ELVsteps1 = 36;
     ELVexit(name, 0, 'N');
@@ -345,7 +347,7 @@ void gamma_upper_quant(double p, double a, double* q) {
         code = 1;
       } else {
         *q = std::exp(s);
-        if (*q < kSeriesCutoff) {
+        if (*q < seriesCutoff()) {
           method = 3;
         } else {
           code = gamma_newton(q, 'U', p, a);
@@ -393,7 +395,7 @@ void gamma_lower_quant(double p, double a, double* q) {
       code = 1;
     } else {
       *q = std::exp(s);
-      if (*q < kSeriesCutoff) {
+      if (*q < seriesCutoff()) {
         method = 2;
       } else {
         code = gamma_newton(q, 'L', p, a);

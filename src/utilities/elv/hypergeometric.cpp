@@ -14,6 +14,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -117,7 +118,7 @@ int hyper_Ik(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
   // Forward pass: the number of terms until one falls below the cut-off.
   double term = 1.0, i = static_cast<double>(k);
   long length = 0;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     if (length >= kSeriesCap) {
       *out = -1.0;
       ELVexit("hyper_Ik", 4, 'F');
@@ -147,7 +148,7 @@ int hyper_Jk(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
   const double lowest = std::max(0.0, dn - (dN - dM));
   double term = 1.0, i = static_cast<double>(k) + 1.0;
   long length = 0;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     if (length >= kSeriesCap) {
       *out = -1.0;
       ELVexit("hyper_Jk", 4, 'F');

@@ -22,10 +22,8 @@ constexpr double kMaxDf = 189812530.0;
 constexpr double kWidthFactor = 6.1738;
 // A distribution argument below this counts as 0.
 constexpr double kTinyArgument = 2.2250738585072014e-288;
-// Term cut-off of the scaled series, relative step limit of Newton.
-constexpr double kSeriesCutoff = 1e-9;
-// Tail probability and relative stop limit of the Poisson-mixture sums.
-constexpr double kMixtureStop = 5e-10;
+// The term cut-off, Newton step limit and mixture stop are the precision
+// setting of precision.h.
 // Admissible probability argument of the quantile functions.
 constexpr double kMinQuantileP = 1e-12;
 constexpr double kMaxQuantileP = 0.5;

@@ -6,6 +6,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace qel {
 namespace elv {
@@ -47,7 +48,7 @@ MixtureResult ended(MixtureResult result, MixtureEnd end, double sum) {
 }
 
 bool restNegligible(double ratio, double term, double sum) {
-  return ratio < 1.0 && term / (1.0 - ratio) / sum < kMixtureStop;
+  return ratio < 1.0 && term / (1.0 - ratio) / sum < mixtureStop();
 }
 
 }  // namespace
@@ -55,14 +56,16 @@ bool restNegligible(double ratio, double term, double sum) {
 long descendingMixtureStart(double L) {
   long k = 0;
   double f = 0.0;
-  poisson_upper_quant(&k, &f, kMixtureStop, L);
+  ELVstartup("poisson_upper_quant");
+  poissonUpperQuantile(&k, &f, mixtureStop(), L);
   return ELVerrno >= 2 ? -1 : k;
 }
 
 long ascendingMixtureStart(double L) {
   long k = 0;
   double f = 0.0;
-  poisson_lower_quant(&k, &f, kMixtureStop, L);
+  ELVstartup("poisson_lower_quant");
+  poissonLowerQuantile(&k, &f, mixtureStop(), L);
   return ELVerrno >= 2 ? -1 : k;
 }
 

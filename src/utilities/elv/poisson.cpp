@@ -10,6 +10,8 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/mixture.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -25,7 +27,7 @@ extern "C" {
 int poisson_Ik(long k, double* out, double m) {
   double term = m / (k + 1.0);
   long n = 1;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     if (n + 1 >= kMaxCount) {
       ELVsteps1 = 0;
       ELVexit("poisson_Ik", 4, 'F');
@@ -46,7 +48,7 @@ int poisson_Ik(long k, double* out, double m) {
 int poisson_Jk(long k, double* out, double m) {
   double term = 1.0;
   long n = 0;
-  while (n < k && term >= kSeriesCutoff) {
+  while (n < k && term >= seriesCutoff()) {
     if (n + 1 >= kMaxCount) {
       ELVsteps1 = 0;
       ELVexit("poisson_Jk", 4, 'F');
@@ -163,12 +165,33 @@ extern "C" {
 
 // Largest k with P(X > k) <= p, and f = (p - P(X > k))/P(X = k).
 void poisson_upper_quant(long* k, double* f, double p, double m) {
-  static const char* const name = "poisson_upper_quant";
-  ELVstartup(name);
+  ELVstartup("poisson_upper_quant");
   if (quantileArgumentsRefused(p, m)) {
-    ELVexit(name, 2, 'F');
+    ELVexit("poisson_upper_quant", 2, 'F');
     return;
   }
+  qel::elv::poissonUpperQuantile(k, f, p, m);
+}
+
+// Smallest k with P(X <= k) > p, and f = (p - P(X < k))/P(X = k).
+void poisson_lower_quant(long* k, double* f, double p, double m) {
+  ELVstartup("poisson_lower_quant");
+  if (quantileArgumentsRefused(p, m)) {
+    ELVexit("poisson_lower_quant", 2, 'F');
+    return;
+  }
+  qel::elv::poissonLowerQuantile(k, f, p, m);
+}
+
+}  // extern "C"
+
+namespace qel {
+namespace elv {
+
+// The quantile searches without the range check of the probability (the
+// mixture sums ask for tails far below 1e-12); p must lie in (0, 0.5].
+void poissonUpperQuantile(long* k, double* f, double p, double m) {
+  static const char* const name = "poisson_upper_quant";
   double start;
   if (m < 5e-13) {
     start = 0.0;
@@ -208,14 +231,8 @@ void poisson_upper_quant(long* k, double* f, double p, double m) {
   ELVexit(name, 0, 'N');
 }
 
-// Smallest k with P(X <= k) > p, and f = (p - P(X < k))/P(X = k).
-void poisson_lower_quant(long* k, double* f, double p, double m) {
+void poissonLowerQuantile(long* k, double* f, double p, double m) {
   static const char* const name = "poisson_lower_quant";
-  ELVstartup(name);
-  if (quantileArgumentsRefused(p, m)) {
-    ELVexit(name, 2, 'F');
-    return;
-  }
   long j;
   double mass, r;
   if (m <= 36.0) {
@@ -254,4 +271,5 @@ void poisson_lower_quant(long* k, double* f, double p, double m) {
   ELVexit(name, 0, 'N');
 }
 
-}  // extern "C"
+}  // namespace elv
+}  // namespace qel
