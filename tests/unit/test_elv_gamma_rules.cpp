@@ -288,6 +288,7 @@ TEST(ElvGammaQuantiles, MethodNumbersOfTheBranches) {
 }
 
 TEST(ElvNormalQuantiles, RangeLinearFormAndSymmetry) {
+  const qel::elv::ScopedElvPrecision written(qel::elv::ElvPrecision::Written);
   double z = 0;
   normal_upper_quant(0.6, &z);
   EXPECT_EQ(ELVerrno, 2);

@@ -1,0 +1,168 @@
+#!/usr/bin/env python3
+"""Reference values for the exported distribution functions at double
+precision: densities, both tails and quantiles of the families on the ELV
+routines (normal, gamma, chi-square, beta, F, t, central and noncentral, and
+the binomial, Poisson and hypergeometric laws), from the body out to the far
+tails (tail probabilities down to 1e-300, quantiles of p from 1e-300 to
+1 - 1e-15).
+
+Writes tests/data/distribution_precision.csv with rows
+    family,function,x,param1,param2,param3,param4,expected
+(the layout of kernels.csv; the family builders are those of gen_kernels.py
+and gen_kernels_beta_t.py, run here over wider grids). Noncentral t tails
+are integrals over the chi-square mixing variable around the peak of the
+integrand (gen_elv_t_noncentral.py), so that far tails keep their digits.
+Run: /usr/bin/python3 tools/reference/gen_distribution_precision.py
+"""
+import os
+import sys
+
+import mpmath
+from mpmath import mpf
+
+sys.path.insert(0, os.path.dirname(__file__))
+import gen_kernels as gk  # noqa: E402
+import gen_kernels_beta_t as gb  # noqa: E402
+from gen_elv_t_noncentral import tail as nct_tail  # noqa: E402
+from refdata import d, write_rows  # noqa: E402
+
+DATA = os.path.join(os.path.dirname(__file__), "..", "..", "tests", "data")
+
+_gammainc = mpmath.gammainc
+
+
+def gammainc(a, lo, hi, regularized=True):
+    """Regularized incomplete gamma; mpmath's own lower form gives up for large
+    shapes, so the lower tail is taken from its Kummer series
+    P(a,x) = x^a e^-x / Gamma(a+1) 1F1(1; a+1; x), and the upper tail as its
+    complement where that loses nothing."""
+    assert regularized
+    a = mpf(a)
+    if lo == 0:
+        x = mpf(hi)
+        return mpmath.exp(a * mpmath.log(x) - x - mpmath.loggamma(a + 1)) * mpmath.hyp1f1(
+            1, a + 1, x, maxterms=10**8)
+    x = mpf(lo)
+    if x > a + 1:
+        return _gammainc(a, x, mpmath.inf, regularized=True)
+    return 1 - gammainc(a, 0, x)
+
+
+mpmath.gammainc = gammainc
+
+FAR = [1e-300, 1e-250, 1e-200, 1e-100, 1e-50, 1e-20, 1e-13]
+PS = FAR + gk.PS + [1 - 1e-13, 1 - 1e-15]
+
+
+def solve_real(f):
+    """Root of an increasing f on the whole line: bisection in u, y = sinh(u)."""
+    lo, hi = mpf(-700), mpf(700)
+    for _ in range(400):
+        mid = (lo + hi) / 2
+        if f(mpmath.sinh(mid)) < 0:
+            lo = mid
+        else:
+            hi = mid
+        if hi - lo <= mpf(10) ** -28:
+            break
+    return mpmath.sinh((lo + hi) / 2)
+
+
+def smaller_tail_root(low, up):
+    """Quantile from the smaller tail, solved in logarithms."""
+    def inv(p):
+        if p < mpf(1) / 2:
+            return solve_real(lambda y: mpmath.log(low(y)) - mpmath.log(p))
+        return solve_real(lambda y: mpmath.log(1 - p) - mpmath.log(up(y)))
+    return inv
+
+
+def student(df, delta, xs, ps):
+    k, dl = d(df), d(delta)
+    mpmath.mp.dps = 40
+    if delta == 0:
+        low = lambda x: gb.t_tails(x, k)[0]  # noqa: E731
+        up = lambda x: gb.t_tails(x, k)[1]  # noqa: E731
+        pdf = lambda x: mpmath.exp(mpmath.loggamma((k + 1) / 2) - mpmath.loggamma(k / 2)  # noqa
+                                   - mpmath.log(mpmath.pi * k) / 2
+                                   - (k + 1) / 2 * mpmath.log1p(x * x / k))
+    else:
+        low = lambda x: nct_tail(x, k, dl, False)  # noqa: E731
+        up = lambda x: nct_tail(x, k, dl, True)  # noqa: E731
+        pdf = None
+    inv = smaller_tail_root(low, up)
+    rows = gk.rows_for("t", [df, delta], xs, [p for p in ps if not (delta == 0 and p == 0.5)],
+                       pdf, low, up, inv)
+    mpmath.mp.dps = 60
+    return rows
+
+
+def fisher(d1, d2, xs, ps):
+    a, b = d(d1) / 2, d(d2) / 2
+
+    def low(x):
+        y = d(d1) * x / (d(d1) * x + d(d2))
+        return gb.I(y, a, b)
+
+    def up(x):
+        y = d(d2) / (d(d1) * x + d(d2))
+        return gb.I(y, b, a)
+    pdf = lambda x: mpmath.exp(mpmath.loggamma(a + b) - mpmath.loggamma(a)  # noqa: E731
+                               - mpmath.loggamma(b) + a * mpmath.log(d(d1) / d(d2))
+                               + (a - 1) * mpmath.log(x) - (a + b) * mpmath.log1p(x * d(d1) / d(d2)))
+    inv0 = smaller_tail_root(lambda y: low(mpmath.exp(y)), lambda y: up(mpmath.exp(y)))
+    return gk.rows_for("f", [d1, d2, 0.0], xs, ps, pdf, low, up, lambda p: mpmath.exp(inv0(p)))
+
+
+def noncentral_chisq_inv(df, nc, ps):
+    k, L = d(df), d(nc)
+    rows = []
+    for p in ps:
+        P = d(p)
+        if P < mpf(1) / 2:
+            q = gk.solve_increasing(lambda y: mpmath.log(gk.ncchi2(y, k, L, False)) - mpmath.log(P),
+                                    mpf(10) ** -300, 100 * (df + nc) + 1000, logscale=True)
+        else:
+            q = gk.solve_increasing(lambda y: mpmath.log(1 - P) - mpmath.log(gk.ncchi2(y, k, L, True)),
+                                    mpf(10) ** -300, 100 * (df + nc) + 1000, logscale=True)
+        rows.append(["chisq", "inv", float(p), df, nc, 0.0, 0.0, q])
+    return rows
+
+
+def main():
+    gk.PS = PS
+    gb.PS = PS
+    rows = []
+    for mean, sigma in ((0.0, 1.0), (3.0, 2.0)):
+        rows += gk.normal(mean, sigma)
+    for shape in (0.05, 0.5, 1.0, 2.5, 30.0, 1e4):
+        rows += gk.gamma_family(shape, 1.0, 0.0)
+    for df in (1.0, 7.0, 1e5):
+        rows += gk.chisq(df, 0.0)
+    for df, nc in ((3.0, 10.0), (50.0, 200.0), (1e6, 10.0)):
+        rows += gk.chisq(df, nc)
+        rows += noncentral_chisq_inv(df, nc, [1e-300, 1e-20, 1e-3, 0.5, 1 - 1e-13])
+    for a, b in ((0.5, 0.5), (2.0, 7.5), (100.0, 3000.0), (0.05, 4.0)):
+        rows += gb.beta(a, b)
+    for d1, d2 in ((2.0, 3.0), (10.0, 50.0)):
+        rows += fisher(d1, d2, [1e-30, 1e-4, 0.05, 0.5, 1.0, 2.2, 8.0, 60.0, 1e8], PS)
+    rows += gb.fdist(4.0, 12.0, 5.0)
+    central = [-1e30, -1e4, -40.0, -6.0, -1.5, -1e-6, 0.0, 0.4, 2.5, 9.0, 300.0, 1e20]
+    for df in (1.0, 5.5, 60.0, 1e6):
+        rows += student(df, 0.0, central, PS)
+    for df, delta, xs in ((1.0, 10.0, [-3.0, 2.0, 9.0, 50.0, 1e6]),
+                          (10.0, 2.0, [-8.0, -1.0, 0.5, 2.0, 6.0, 40.0]),
+                          (30.0, -3.0, [-40.0, -6.0, -3.0, -1.0, 0.5, 4.0])):
+        rows += student(df, delta, xs, [1e-300, 1e-20, 1e-6, 0.5, 0.99, 1 - 1e-15])
+    for n, p in ((10, 0.5), (100, 0.73), (5000, 0.4), (100000, 1e-3)):
+        rows += gk.binomial(n, p)[0]
+    for mean in (0.5, 40.0, 1e5):
+        rows += gk.poisson(mean)
+    for N, M, n in ((50, 25, 30), (1000, 400, 150), (10000, 4000, 500)):
+        rows += gk.hypergeometric(N, M, n)
+    write_rows(os.path.join(DATA, "distribution_precision.csv"),
+               "family,function,x,param1,param2,param3,param4,expected", rows)
+
+
+if __name__ == "__main__":
+    main()
