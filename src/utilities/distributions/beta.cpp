@@ -7,6 +7,7 @@
 
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/special_functions/transcendental.h"
@@ -61,7 +62,13 @@ double mBetaInvCdf(double p, double a, double b) {
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_beta_lower_quant(p, a, b, &q) : elv_beta_upper_quant(1.0 - p, a, b, &q);
-  return ElvFailed(status) ? mGetMissingValueCode() : q;
+  if (!ElvFailed(status)) return q;
+  // Beyond the routines' range of tails: the smaller tail in logarithms.
+  const TailPair tails = [a, b](double x, double* lower, double* upper) {
+    double density = 0.0;
+    return !ElvFailed(elv_beta_df(x, a, b, lower, upper, &density));
+  };
+  return mTailQuantile(tails, p, TailSupport::Unit, a / (a + b));
 }
 
 // --- F ---------------------------------------------------------------------
@@ -125,15 +132,14 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
     double q = 0.0;
     const ElvStatus status =
         p <= 0.5 ? elv_F_lower_quant(p, df1, df2, &q) : elv_F_upper_quant(1.0 - p, df1, df2, &q);
-    return ElvFailed(status) ? mGetMissingValueCode() : q;
+    if (!ElvFailed(status)) return q;
   }
-  try {
-    CmFCdf f(df1, df2, noncentrality, p);
-    int status = 0;
-    return mRootFinder(0.0, std::fmin(kSearchLimit, kLargestFArgument), f, &status);
-  } catch (const std::runtime_error&) {
-    return mGetMissingValueCode();
-  }
+  // Beyond the routines' range of tails, and for the noncentral law: the
+  // smaller tail, solved in logarithms from about the mean.
+  const TailPair tails = [df1, df2, noncentrality](double x, double* lower, double* upper) {
+    return mFCdf(x, df1, df2, noncentrality, lower, upper);
+  };
+  return mTailQuantile(tails, p, TailSupport::Positive, 1.0 + noncentrality / df1);
 }
 
 double mFPValue(double x, double df1, double df2, EAlternative alternative) {

@@ -3,13 +3,15 @@
 // Quantiles come from the ELV quantile routines, which work from the nearer
 // tail. A quantile whose lower tail misses p by more than 1e-9 p is refined
 // by regula falsi (Illinois) on the distribution function, started on a
-// bracket [0, q] that doubles until it holds p. The noncentral chi-square has
-// no quantile routine: there the search runs from [0, 1e30].
+// bracket [0, q] that doubles until it holds p. Beyond the routines' range of
+// tails, and for the noncentral chi-square, which has no quantile routine,
+// the smaller tail is solved in logarithms (tail_quantile.h).
 #include <cmath>
 #include <stdexcept>
 
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/special_functions/transcendental.h"
@@ -37,15 +39,40 @@ double searchUpwardFromZero(CmRealFunction& f, double start) {
   return mRootFinder(x1, x2, f, &status);
 }
 
-// The standard gamma quantile by the ELV routine for the nearer tail.
-double gammaQuantileFromElv(double p, double shape) {
+// The ELV quantile routines take tails from 1e-12 on; beyond, the answer is
+// searched from the quantile at that limit.
+constexpr double kElvSmallestTail = 1e-12;
+
+double clampToElvRange(double p) {
+  return p <= 0.5 ? std::fmax(p, kElvSmallestTail) : std::fmin(p, 1.0 - kElvSmallestTail);
+}
+
+bool farBeyondElvRange(double p) {
+  return p > 0.0 && p < 1.0 && (p < kElvSmallestTail || 1.0 - p < kElvSmallestTail);
+}
+
+double gammaElvQuantile(double p, double shape) {
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_gamma_lower_quant(p, shape, &q) : elv_gamma_upper_quant(1.0 - p, shape, &q);
   return ElvFailed(status) ? mGetMissingValueCode() : q;
 }
 
+// The standard gamma quantile by the ELV routine for the nearer tail; tails
+// beyond its range by the tail search started from its range limit.
+double gammaQuantileFromElv(double p, double shape) {
+  if (!farBeyondElvRange(p)) return gammaElvQuantile(p, shape);
+  double start = gammaElvQuantile(clampToElvRange(p), shape);
+  if (mIsNumericMissing(start) || !(start > 0.0)) start = shape;
+  const TailPair tails = [shape](double x, double* lower, double* upper) {
+    double density = 0.0;
+    return !ElvFailed(elv_gamma_df(x, shape, lower, upper, &density));
+  };
+  return mTailQuantile(tails, p, TailSupport::Positive, start);
+}
+
 double chiSqQuantileFromElv(double p, double df) {
+  if (farBeyondElvRange(p)) return 2.0 * gammaQuantileFromElv(p, df / 2.0);
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_chi2_lower_quant(p, df, &q) : elv_chi2_upper_quant(1.0 - p, df, &q);
@@ -180,7 +207,11 @@ double mChiSqInvCdf(double p, double df, double noncentrality) {
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
   if (noncentrality == 0.0) return centralChiSqQuantile(p, df);
-  return mChiSqInvCdfByRootFinder(p, df, noncentrality, kNoncentralSearchStart);
+  // The smaller tail, solved in logarithms from the mean.
+  const TailPair tails = [df, noncentrality](double x, double* lower, double* upper) {
+    return mChiSqCdf(x, df, noncentrality, lower, upper);
+  };
+  return mTailQuantile(tails, p, TailSupport::Positive, df + noncentrality);
 }
 
 double mChiSqInvCdfByRootFinder(double p, double df, double noncentrality, double start) {

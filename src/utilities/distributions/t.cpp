@@ -3,13 +3,14 @@
 // The noncentral density has no short closed form; it comes from the
 // recurrence between distribution functions of the noncentral t,
 //   f(x; df, d) = df/x (F(x sqrt((df + 2)/df); df + 2, d) - F(x; df, d)).
-// The noncentral quantile is a bracketed search started from the normal
-// approximation with the exact mean and variance of the noncentral t.
+// The noncentral quantile solves the smaller tail in logarithms
+// (tail_quantile.h), started from the mean of the noncentral t.
 #include <cmath>
 #include <stdexcept>
 
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/special_functions/transcendental.h"
@@ -30,7 +31,14 @@ double centralTQuantile(double p, double df) {
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_t_lower_quant(p, df, &q) : elv_t_upper_quant(1.0 - p, df, &q);
-  return ElvFailed(status) ? mGetMissingValueCode() : q;
+  if (!ElvFailed(status) || !(p > 0.0 && p < 1.0)) {
+    return ElvFailed(status) ? mGetMissingValueCode() : q;
+  }
+  // Beyond the routines' range of tails: the smaller tail in logarithms.
+  const TailPair tails = [df](double x, double* lower, double* upper) {
+    return !ElvFailed(elv_t_ncdf(x, df, 0.0, lower, upper));
+  };
+  return mTailQuantile(tails, p, TailSupport::RealLine, p < 0.5 ? -1.0 : 1.0);
 }
 
 // The starting bracket of the noncentral quantile search.
@@ -124,14 +132,13 @@ double mTInvCdf(double p, double df, double noncentrality) {
   if (p == 0.0 || p == 1.0) return mGetMissingValueCode();
   if (noncentrality == 0.0) return centralTQuantile(p, df);
   try {
+    // The smaller tail, solved in logarithms from the normal approximation.
     double x1 = 0.0, x2 = 0.0;
-    startingBracket(p, df, noncentrality, &x1, &x2);
-    CmTCdf f(df, noncentrality, p);
-    if (mBracketFinder(&x1, &x2, f, -kSearchLimit, kSearchLimit) != 0) {
-      return mGetMissingValueCode();
-    }
-    int status = 0;
-    return mRootFinder(x1, x2, f, &status);
+    startingBracket(0.5, df, noncentrality, &x1, &x2);
+    const TailPair tails = [df, noncentrality](double x, double* lower, double* upper) {
+      return mTCdf(x, df, noncentrality, lower, upper);
+    };
+    return mTailQuantile(tails, p, TailSupport::RealLine, x1);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   } catch (const std::invalid_argument&) {

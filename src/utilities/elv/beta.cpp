@@ -69,7 +69,7 @@ double tailBorder(double a, double b) {
     v -= a * std::log(b);
   }
   if (v >= a * -kLn2) return 0.5;
-  if (v < kUnderflowLog * a) return 0.0;
+  if (v < underflowLog() * a) return 0.0;
   return std::exp(v / a);
 }
 
@@ -294,23 +294,23 @@ void beta_df(double x, double a, double b, double* lower, double* upper, double*
     if (a < 1.0 && b * x < 1.0) {
       const double S = beta_ps(x, a, b);
       const double d = beta_lntab(a, b);
-      up = (logOrLow(S) - ln_gamma(a) - d >= kUnderflowLog) ? S / Gamma(a) / std::exp(d) : 0.0;
+      up = (logOrLow(S) - ln_gamma(a) - d >= underflowLog()) ? S / Gamma(a) / std::exp(d) : 0.0;
       ELVmethod += 50;
     } else {
       const double L = lp + std::log1p(-x) - std::log(b);
       const double r = ((a - 1.0) / (1.0 + b)) * (1.0 - x) / x;
       double J;
-      if (L >= kUnderflowLog) {
+      if (L >= underflowLog()) {
         if (beta_Jabx(&J, a, b, x) != 0) goto seriesFailure;
         up = std::exp(L) * J;
         ELVmethod += 60;
-      } else if (a <= 1.0 || (r < 1.0 && L - std::log1p(-r) < kUnderflowLog)) {
+      } else if (a <= 1.0 || (r < 1.0 && L - std::log1p(-r) < underflowLog())) {
         code = 1;
         ELVmethod = 70;
       } else {
         if (beta_Jabx(&J, a, b, x) != 0) goto seriesFailure;
         const double logUpper = logOrLow(J) + L;
-        if (logUpper < kUnderflowLog) {
+        if (logUpper < underflowLog()) {
           code = 1;
           ELVmethod += 80;
         } else {
@@ -323,22 +323,22 @@ void beta_df(double x, double a, double b, double* lower, double* upper, double*
   } else {
     const double r = ((b - 1.0) / (1.0 + a)) * x / (1.0 - x);
     double I;
-    if (lp >= kUnderflowLog) {
+    if (lp >= underflowLog()) {
       if (beta_Iabx(&I, a, b, x) != 0) goto seriesFailure;
-      if (logOrLow(I) + lp < kUnderflowLog) {
+      if (logOrLow(I) + lp < underflowLog()) {
         code = 1;
         ELVmethod = 15;
       } else {
         lo = *density * I;
         ELVmethod = 10;
       }
-    } else if (b <= 1.0 || (r < 1.0 && lp - std::log1p(-r) < kUnderflowLog)) {
+    } else if (b <= 1.0 || (r < 1.0 && lp - std::log1p(-r) < underflowLog())) {
       code = 1;
       ELVmethod = 20;
     } else {
       if (beta_Iabx(&I, a, b, x) != 0) goto seriesFailure;
       const double logLower = logOrLow(I) + lp;
-      if (logLower < kUnderflowLog) {
+      if (logLower < underflowLog()) {
         code = 1;
         ELVmethod = 30;
       } else {

@@ -186,16 +186,16 @@ void gamma_df(double x, double a, double* lower, double* upper, double* density)
   if (x > border) {
     if (a < 1.0 && x < 1.0) {
       const double S = gamma_ps(x, a);
-      *upper = (std::log(S) - ln_gamma(a) >= kUnderflowLog) ? S / Gamma(a) : 0.0;
+      *upper = (std::log(S) - ln_gamma(a) >= underflowLog()) ? S / Gamma(a) : 0.0;
       *lower = 1.0 - *upper;
       ELVmethod = 50;
-    } else if (lp >= kUnderflowLog) {
+    } else if (lp >= underflowLog()) {
       double J;
       if (gamma_Jax(&J, a, x) != 0) goto seriesFailure;
       *upper = *density * J;
       *lower = 1.0 - *upper;
       ELVmethod += 60;
-    } else if (a <= 1.0 || lp - std::log(1.0 - (a - 1.0) / x) < kUnderflowLog) {
+    } else if (a <= 1.0 || lp - std::log(1.0 - (a - 1.0) / x) < underflowLog()) {
       *lower = 1.0;
       *upper = 0.0;
       code = 1;
@@ -204,7 +204,7 @@ void gamma_df(double x, double a, double* lower, double* upper, double* density)
       double J;
       if (gamma_Jax(&J, a, x) != 0) goto seriesFailure;
       const double logUpper = std::log(J) + lp;
-      if (logUpper < kUnderflowLog) {
+      if (logUpper < underflowLog()) {
         *lower = 1.0;
         *upper = 0.0;
         code = 1;
@@ -217,12 +217,12 @@ void gamma_df(double x, double a, double* lower, double* upper, double* density)
     }
   } else {
     const double L = std::log(x / a) + lp;
-    if (L >= kUnderflowLog) {
+    if (L >= underflowLog()) {
       double I;
       if (gamma_Iax(&I, a, x) != 0) goto seriesFailure;
       *lower = std::exp(L) * I;
       ELVmethod = 10;
-    } else if (L - std::log(1.0 - x / (1.0 + a)) < kUnderflowLog) {
+    } else if (L - std::log(1.0 - x / (1.0 + a)) < underflowLog()) {
       *lower = 0.0;
       code = 1;
       ELVmethod = 20;
@@ -230,7 +230,7 @@ void gamma_df(double x, double a, double* lower, double* upper, double* density)
       double I;
       if (gamma_Iax(&I, a, x) != 0) goto seriesFailure;
       const double logLower = std::log(I) + L;
-      if (logLower < kUnderflowLog) {
+      if (logLower < underflowLog()) {
         *lower = 0.0;
         code = 1;
         ELVmethod = 30;
@@ -341,7 +341,7 @@ void gamma_upper_quant(double p, double a, double* q) {
       // Near 0, P(a,q) is q^a / Gamma(1+a): solve q^a = (1-p) Gamma(1+a),
       // with ln Gamma(1+a) = log(1 - a gammod(a)).
       const double s = (logs(-p) + logs(-gammod(a) * a)) / a;
-      if (s < kUnderflowLog) {
+      if (s < underflowLog()) {
         *q = 0.0;
         method = 2;
         code = 1;
@@ -389,7 +389,7 @@ void gamma_lower_quant(double p, double a, double* q) {
   if (a <= 1.0) {
     // Near 0, P(a,q) is q^a / Gamma(1+a).
     const double s = (std::log(p) + logs(-gammod(a) * a)) / a;
-    if (s < kUnderflowLog) {
+    if (s < underflowLog()) {
       *q = 0.0;
       method = 1;
       code = 1;

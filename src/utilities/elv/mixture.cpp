@@ -92,7 +92,7 @@ MixtureResult descendingMixtureSum(const MixtureComponents& components, long k,
   }
   result.peak = result.last = j;
   const double logPeak = logPeakTerm(components, j, factor, settings);
-  if (logPeak < kUnderflowLog) return ended(result, MixtureEnd::Underflow, 0.0);
+  if (logPeak < underflowLog()) return ended(result, MixtureEnd::Underflow, 0.0);
 
   // Stage two: sum below the peak.
   double term = std::exp(logPeak);
@@ -135,7 +135,7 @@ MixtureResult ascendingMixtureSum(const MixtureComponents& components, long k,
   }
   result.peak = result.last = j;
   const double logPeak = logPeakTerm(components, j, factor, settings);
-  if (logPeak < kUnderflowLog) return ended(result, MixtureEnd::Underflow, 0.0);
+  if (logPeak < underflowLog()) return ended(result, MixtureEnd::Underflow, 0.0);
 
   // Stage two: sum above the peak.
   double term = std::exp(logPeak);

@@ -88,21 +88,21 @@ void poisson_df(long k, double m, double* lower, double* upper, double* mass) {
   if (k > m - 1.0) {
     // Upper tail P(X > k) = mass I.
     double I;
-    if (lm >= kUnderflowLog) {
+    if (lm >= underflowLog()) {
       if (poisson_Ik(k, &I, m) != 0) goto seriesFailure;
       *upper = *mass * I;
       ELVmethod = 20;
     } else {
       // I is at most r/(1-r), r = m/(k+1): a bound decides underflow early.
       const double r = m / (k + 1.0);
-      if (lm + std::log(r / (1.0 - r)) < kUnderflowLog) {
+      if (lm + std::log(r / (1.0 - r)) < underflowLog()) {
         *upper = 0.0;
         code = 1;
         ELVmethod = 21;
       } else {
         if (poisson_Ik(k, &I, m) != 0) goto seriesFailure;
         const double logUpper = std::log(I) + lm;
-        if (logUpper < kUnderflowLog) {
+        if (logUpper < underflowLog()) {
           *upper = 0.0;
           code = 1;
           ELVmethod = 22;
@@ -116,18 +116,18 @@ void poisson_df(long k, double m, double* lower, double* upper, double* mass) {
   } else {
     // Lower tail P(X <= k) = mass J, J at most 1/(1 - k/m).
     double J;
-    if (lm >= kUnderflowLog) {
+    if (lm >= underflowLog()) {
       if (poisson_Jk(k, &J, m) != 0) goto seriesFailure;
       *lower = *mass * J;
       ELVmethod = 10;
-    } else if (lm - std::log(1.0 - k / m) < kUnderflowLog) {
+    } else if (lm - std::log(1.0 - k / m) < underflowLog()) {
       *lower = 0.0;
       code = 1;
       ELVmethod = 11;
     } else {
       if (poisson_Jk(k, &J, m) != 0) goto seriesFailure;
       const double logLower = std::log(J) + lm;
-      if (logLower < kUnderflowLog) {
+      if (logLower < underflowLog()) {
         *lower = 0.0;
         code = 1;
         ELVmethod = 12;

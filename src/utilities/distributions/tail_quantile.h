@@ -1,0 +1,27 @@
+// Quantiles of a continuous law from its smaller tail, solved in logarithms,
+// so that p = 1e-300 and 1 - p = 1e-300 keep their digits.
+#ifndef QEL_SRC_UTILITIES_DISTRIBUTIONS_TAIL_QUANTILE_H
+#define QEL_SRC_UTILITIES_DISTRIBUTIONS_TAIL_QUANTILE_H
+
+#include <functional>
+
+namespace qel {
+
+// Both tails at x; false when they are not available.
+using TailPair = std::function<bool(double x, double* lower, double* upper)>;
+
+enum class TailSupport {
+  Positive,  // (0, inf)
+  Unit,      // (0, 1)
+  RealLine,  // (-inf, inf)
+};
+
+// x with P(X <= x) = p for 0 < p < 1, solved on the smaller tail: the lower
+// tail for p at most 1/2, the upper tail against 1 - p otherwise. start is a
+// point of the support near the answer. The missing value when the tails
+// fail or no bracket is found.
+double mTailQuantile(const TailPair& tails, double p, TailSupport support, double start);
+
+}  // namespace qel
+
+#endif
