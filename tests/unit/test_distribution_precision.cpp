@@ -26,12 +26,12 @@ int I(double v) {
   return static_cast<int>(v);
 }
 
-#define QEL_EVAL(Pdf, Cdf, Inv)                                             \
-  [](const std::string& f, double x, const double* p) {                     \
-    if (f == "pdf") return Pdf;                                             \
-    if (f == "inv") return Inv;                                             \
-    const bool u = f == "upper";                                            \
-    return Cdf;                                                             \
+#define QEL_EVAL(Pdf, Cdf, Inv)                         \
+  [](const std::string& f, double x, const double* p) { \
+    if (f == "pdf") return Pdf;                         \
+    if (f == "inv") return Inv;                         \
+    const bool u = f == "upper";                        \
+    return Cdf;                                         \
   }
 
 const std::map<std::string, Eval>& families() {
@@ -52,10 +52,9 @@ const std::map<std::string, Eval>& families() {
                             qel::BinomialInvCdf(x, I(p[0]), p[1]))},
       {"poisson", QEL_EVAL(qel::PoissonPdf(x, p[0]), qel::PoissonCdf(x, p[0], u),
                            qel::PoissonInvCdf(x, p[0]))},
-      {"hypergeometric",
-       QEL_EVAL(qel::HypergeometricPdf(x, I(p[0]), I(p[1]), I(p[2])),
-                qel::HypergeometricCdf(x, I(p[0]), I(p[1]), I(p[2]), u),
-                qel::HypergeometricInvCdf(x, I(p[0]), I(p[1]), I(p[2])))},
+      {"hypergeometric", QEL_EVAL(qel::HypergeometricPdf(x, I(p[0]), I(p[1]), I(p[2])),
+                                  qel::HypergeometricCdf(x, I(p[0]), I(p[1]), I(p[2]), u),
+                                  qel::HypergeometricInvCdf(x, I(p[0]), I(p[1]), I(p[2])))},
   };
   return table;
 }
@@ -84,7 +83,8 @@ TEST(DistributionPrecision, EveryFamilyToDoublePrecision) {
     double& w = worst[family + " " + function];
     w = std::max(w, error);
   }
-  for (const auto& [name, error] : worst) std::printf("  %-22s max error %.2e\n", name.c_str(), error);
+  for (const auto& [name, error] : worst)
+    std::printf("  %-22s max error %.2e\n", name.c_str(), error);
 }
 
 }  // namespace

@@ -32,7 +32,8 @@ TEST(ElvPrecisionSetting, SeriesLengthsOfBothSettings) {
     const qel::elv::ScopedElvPrecision scope(written ? ElvPrecision::Written : ElvPrecision::Full);
     ELVerrno = 0;
     EXPECT_EQ(runHelper(row.text[0], row.numbers.data()), 0) << "line " << row.line;
-    EXPECT_EQ(ELVsteps1, static_cast<int64_t>(row.numbers[4])) << row.text[0] << " line " << row.line;
+    EXPECT_EQ(ELVsteps1, static_cast<int64_t>(row.numbers[4]))
+        << row.text[0] << " line " << row.line;
     ++rows;
   }
   EXPECT_GT(rows, 30);

@@ -7,13 +7,13 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/CheckedFunctions.h"
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/elv/normal_precise.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/LYNBasicTypes.h"
-#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 

@@ -2,8 +2,8 @@
 // computed: the smaller one directly as erfc(|x|/sqrt 2)/2 and the larger as
 // its complement. At full precision erfc comes from the scaled complementary
 // error function with an exact exponent (normal_precise.cpp); the historical
-// setting takes erfc(z) as the upper tail of the gamma law of shape 1/2 at z^2. The inverse over the whole open interval rides on the upper
-// quantile of normal_quantile.cpp.
+// setting takes erfc(z) as the upper tail of the gamma law of shape 1/2 at z^2. The inverse over
+// the whole open interval rides on the upper quantile of normal_quantile.cpp.
 #include <qel/elv.h>
 
 #include <cmath>
