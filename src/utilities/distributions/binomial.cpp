@@ -13,6 +13,7 @@
 #include <stdexcept>
 
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/tail_quantile.h"
 #include "utilities/distributions/discrete_rules.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/incomplete_beta.h"
@@ -74,7 +75,15 @@ double mBinomialInvCdf(double p, int n, double prob) {
   const ElvStatus status = lowerRoutine
                                ? elv_binomial_lower_quant(p, trials, prob, &k, &fraction)
                                : elv_binomial_upper_quant(1.0 - p, trials, prob, &k, &fraction);
-  if (ElvFailed(status)) return mGetMissingValueCode();
+  if (ElvFailed(status)) {
+    // Beyond the routines' range of tails: a search on the smaller tail.
+    const TailPair tails = [n, prob](double j, double* lower, double* above) {
+      *lower = mBinomialCdf(j, n, prob, false);
+      *above = mBinomialCdf(j + 1.0, n, prob, true);
+      return !mIsNumericMissing(*lower) && !mIsNumericMissing(*above);
+    };
+    return mDiscreteTailQuantile(tails, p, 0.0, std::floor(n * prob), n);
+  }
   return discrete::correctedQuantile(static_cast<double>(k), fraction, lowerRoutine);
 }
 

@@ -11,6 +11,7 @@
 #include <stdexcept>
 
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/tail_quantile.h"
 #include "utilities/distributions/discrete_rules.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
@@ -81,7 +82,15 @@ double mHypergeometricInvCdf(double p, int N, int M, int n) {
   const ElvStatus status = lowerRoutine
                                ? elv_hypergeo_lower_quant(p, uN, uM, un, &k, &fraction)
                                : elv_hypergeo_upper_quant(1.0 - p, uN, uM, un, &k, &fraction);
-  if (ElvFailed(status)) return mGetMissingValueCode();
+  if (ElvFailed(status)) {
+    // Beyond the routines' range of tails: a search on the smaller tail.
+    const TailPair tails = [N, M, n](double j, double* lower, double* above) {
+      *lower = mHypergeometricCdf(j, N, M, n, false);
+      *above = mHypergeometricCdf(j + 1.0, N, M, n, true);
+      return !mIsNumericMissing(*lower) && !mIsNumericMissing(*above);
+    };
+    return mDiscreteTailQuantile(tails, p, s.lo, s.lo, s.hi);
+  }
   return discrete::correctedQuantile(static_cast<double>(k), fraction, lowerRoutine);
 }
 

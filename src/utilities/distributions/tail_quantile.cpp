@@ -153,4 +153,37 @@ double mTailQuantile(const TailPair& tails, double p, TailSupport support, doubl
   return narrow(eq, support, a, b);
 }
 
+namespace {
+
+// 1 when k reaches p, 0 when not, -1 when the tails failed.
+int reaches(const TailPair& tails, double p, double k) {
+  double lower = 0.0, above = 0.0;
+  if (!tails(k, &lower, &above) || std::isnan(lower) || std::isnan(above)) return -1;
+  return (p <= 0.5 ? lower >= p : above <= 1.0 - p) ? 1 : 0;
+}
+
+}  // namespace
+
+double mDiscreteTailQuantile(const TailPair& tails, double p, double lo, double start,
+                             double last) {
+  if (!(p > 0.0 && p < 1.0)) return mGetMissingValueCode();
+  double below = lo - 1.0;  // does not reach p
+  double high = std::fmax(std::fmin(start, last), lo);
+  for (;;) {
+    const int r = reaches(tails, p, high);
+    if (r < 0) return mGetMissingValueCode();
+    if (r == 1) break;
+    if (high >= last) return mGetMissingValueCode();
+    below = high;
+    high = std::fmin(2.0 * high + 1.0, last);
+  }
+  while (high - below > 1.0) {
+    const double mid = std::floor(below + 0.5 * (high - below));
+    const int r = reaches(tails, p, mid);
+    if (r < 0) return mGetMissingValueCode();
+    (r == 1 ? high : below) = mid;
+  }
+  return high;
+}
+
 }  // namespace qel

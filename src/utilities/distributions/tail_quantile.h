@@ -22,6 +22,12 @@ enum class TailSupport {
 // fail or no bracket is found.
 double mTailQuantile(const TailPair& tails, double p, TailSupport support, double start);
 
+// Smallest integer k from lo on with P(X <= k) >= p, 0 < p < 1, decided on
+// the smaller tail: tails(k) gives P(X <= k) and P(X > k). The search
+// doubles its upper end from start (at most last) and then bisects. The
+// missing value when the tails fail or no such k is found.
+double mDiscreteTailQuantile(const TailPair& tails, double p, double lo, double start, double last);
+
 }  // namespace qel
 
 #endif
