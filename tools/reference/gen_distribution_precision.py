@@ -12,7 +12,10 @@ Writes tests/data/distribution_precision.csv with rows
 and gen_kernels_beta_t.py, run here over wider grids). Noncentral t tails
 are integrals over the chi-square mixing variable around the peak of the
 integrand (gen_elv_t_noncentral.py), so that far tails keep their digits.
+The noncentral t rows, slow to integrate, go to
+tests/data/distribution_precision_nct.csv in a run of their own.
 Run: /usr/bin/python3 tools/reference/gen_distribution_precision.py
+     /usr/bin/python3 tools/reference/gen_distribution_precision.py noncentral-t
 """
 import os
 import sys
@@ -40,6 +43,8 @@ def gammainc(a, lo, hi, regularized=True):
     a = mpf(a)
     if lo == 0:
         x = mpf(hi)
+        if x > a + 1:
+            return 1 - _gammainc(a, x, mpmath.inf, regularized=True)
         return mpmath.exp(a * mpmath.log(x) - x - mpmath.loggamma(a + 1)) * mpmath.hyp1f1(
             1, a + 1, x, maxterms=10**8)
     x = mpf(lo)
@@ -55,25 +60,44 @@ PS = FAR + gk.PS + [1 - 1e-13, 1 - 1e-15]
 
 
 def solve_real(f):
-    """Root of an increasing f on the whole line: bisection in u, y = sinh(u)."""
-    lo, hi = mpf(-700), mpf(700)
-    for _ in range(400):
-        mid = (lo + hi) / 2
-        if f(mpmath.sinh(mid)) < 0:
-            lo = mid
+    """Root of an increasing f on the whole line: secant steps in u, y = sinh(u),
+    from a bracket found by doubling steps, safeguarded by bisection."""
+    lo, hi = mpf(-1), mpf(1)
+    while f(mpmath.sinh(lo)) > 0:
+        if lo <= -700:
+            raise RuntimeError("no bracket")
+        lo = max(2 * lo, mpf(-700))
+    while f(mpmath.sinh(hi)) < 0:
+        if hi >= 700:
+            raise RuntimeError("no bracket")
+        hi = min(2 * hi, mpf(700))
+    flo, fhi = f(mpmath.sinh(lo)), f(mpmath.sinh(hi))
+    for _ in range(200):
+        mid = lo - flo * (hi - lo) / (fhi - flo) if mpmath.isfinite(flo) and mpmath.isfinite(fhi) \
+            else (lo + hi) / 2
+        if not lo < mid < hi or _ % 4 == 3:
+            mid = (lo + hi) / 2
+        fm = f(mpmath.sinh(mid))
+        if fm == 0:
+            return mpmath.sinh(mid)
+        if fm < 0:
+            lo, flo = mid, fm
         else:
-            hi = mid
-        if hi - lo <= mpf(10) ** -28:
+            hi, fhi = mid, fm
+        if hi - lo <= mpf(10) ** -30 * max(1, abs(lo)):
             break
     return mpmath.sinh((lo + hi) / 2)
 
 
 def smaller_tail_root(low, up):
     """Quantile from the smaller tail, solved in logarithms."""
+    def safe_log(v):
+        return mpmath.log(v) if v > 0 else -mpmath.inf
+
     def inv(p):
         if p < mpf(1) / 2:
-            return solve_real(lambda y: mpmath.log(low(y)) - mpmath.log(p))
-        return solve_real(lambda y: mpmath.log(1 - p) - mpmath.log(up(y)))
+            return solve_real(lambda y: safe_log(low(y)) - mpmath.log(p))
+        return solve_real(lambda y: mpmath.log(1 - p) - safe_log(up(y)))
     return inv
 
 
@@ -132,11 +156,22 @@ def noncentral_chisq_inv(df, nc, ps):
 def main():
     gk.PS = PS
     gb.PS = PS
+    header = "family,function,x,param1,param2,param3,param4,expected"
     rows = []
+    if "noncentral-t" in sys.argv[1:]:
+        for df, delta, xs in ((1.0, 10.0, [-3.0, 2.0, 9.0, 50.0, 1e6]),
+                              (10.0, 2.0, [-8.0, -1.0, 0.5, 2.0, 6.0, 40.0]),
+                              (30.0, -3.0, [-40.0, -6.0, -3.0, -1.0, 0.5, 4.0])):
+            rows += student(df, delta, xs, [1e-300, 1e-20, 1e-6, 0.5, 0.99, 1 - 1e-15])
+            print("noncentral t", df, file=sys.stderr, flush=True)
+        write_rows(os.path.join(DATA, "distribution_precision_nct.csv"), header, rows)
+        return
     for mean, sigma in ((0.0, 1.0), (3.0, 2.0)):
         rows += gk.normal(mean, sigma)
+    print("normal", file=sys.stderr, flush=True)
     for shape in (0.05, 0.5, 1.0, 2.5, 30.0, 1e4):
         rows += gk.gamma_family(shape, 1.0, 0.0)
+        print("gamma", shape, file=sys.stderr, flush=True)
     for df in (1.0, 7.0, 1e5):
         rows += gk.chisq(df, 0.0)
     for df, nc in ((3.0, 10.0), (50.0, 200.0), (1e6, 10.0)):
@@ -150,18 +185,14 @@ def main():
     central = [-1e30, -1e4, -40.0, -6.0, -1.5, -1e-6, 0.0, 0.4, 2.5, 9.0, 300.0, 1e20]
     for df in (1.0, 5.5, 60.0, 1e6):
         rows += student(df, 0.0, central, PS)
-    for df, delta, xs in ((1.0, 10.0, [-3.0, 2.0, 9.0, 50.0, 1e6]),
-                          (10.0, 2.0, [-8.0, -1.0, 0.5, 2.0, 6.0, 40.0]),
-                          (30.0, -3.0, [-40.0, -6.0, -3.0, -1.0, 0.5, 4.0])):
-        rows += student(df, delta, xs, [1e-300, 1e-20, 1e-6, 0.5, 0.99, 1 - 1e-15])
+    print("central done", file=sys.stderr, flush=True)
     for n, p in ((10, 0.5), (100, 0.73), (5000, 0.4), (100000, 1e-3)):
         rows += gk.binomial(n, p)[0]
     for mean in (0.5, 40.0, 1e5):
         rows += gk.poisson(mean)
     for N, M, n in ((50, 25, 30), (1000, 400, 150), (10000, 4000, 500)):
         rows += gk.hypergeometric(N, M, n)
-    write_rows(os.path.join(DATA, "distribution_precision.csv"),
-               "family,function,x,param1,param2,param3,param4,expected", rows)
+    write_rows(os.path.join(DATA, "distribution_precision.csv"), header, rows)
 
 
 if __name__ == "__main__":
