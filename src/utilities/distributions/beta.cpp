@@ -8,6 +8,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -40,9 +41,7 @@ double mBetaPdf(double x, double a, double b) {
     return b == 1.0 ? a : 0.0;
   }
   try {
-    return mExponential((a - 1.0) * mLog(x, true) + (b - 1.0) * std::log1p(-x) + mLogGamma(a + b) -
-                            mLogGamma(a) - mLogGamma(b),
-                        true);
+    return saddle::betaDensity(x, a, b);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -88,13 +87,7 @@ double CmFCdf::operator()(double x) {
 double mFPdf(double x, double df1, double df2) {
   if (x <= 0.0) return 0.0;
   try {
-    const double a = df1 / 2.0;
-    const double b = df2 / 2.0;
-    const double c = a + b;
-    const double ratio = df1 / df2;
-    return mExponential(mLogGamma(c) - mLogGamma(a) - mLogGamma(b) + a * mLog(ratio, true) +
-                            (a - 1.0) * mLog(x, true) - c * std::log1p(x * ratio),
-                        true);
+    return saddle::fDensity(x, df1, df2);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }

@@ -12,6 +12,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -131,10 +132,8 @@ double CmChiSqCdf::operator()(double x) {
 
 double mGammaPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
-  double lower = 0.0, upper = 0.0, density = 0.0;
-  const double z = (x - threshold) / scale;
-  if (ElvFailed(elv_gamma_df(z, shape, &lower, &upper, &density))) return mGetMissingValueCode();
-  return density / scale;
+  // Loader's saddle-point form keeps the density's digits for large shapes.
+  return saddle::gammaDensity((x - threshold) / scale, shape) / scale;
 }
 
 double mGammaCdf(double x, double shape, double scale, double threshold, bool upperTail) {
@@ -171,13 +170,7 @@ double mGammaInvCdfByRootFinder(double p, double shape, double start) {
 
 double mChiSqPdf(double x, double df) {
   if (x <= 0.0) return 0.0;
-  try {
-    const double h = df / 2.0;
-    return mExponential(-mLogGamma(h) - h * std::log(2.0) + (h - 1.0) * mLog(x, true) - x / 2.0,
-                        true);
-  } catch (const std::runtime_error&) {
-    return 0.0;
-  }
+  return saddle::gammaDensity(x / 2.0, df / 2.0) / 2.0;
 }
 
 bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double* upper) {

@@ -7,11 +7,12 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/tail_quantile.h"
-#include "utilities/distributions/discrete_rules.h"
-#include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -19,11 +20,7 @@ namespace qel {
 double mPoissonPdf(double x, double mean) {
   double k;
   if (!discrete::massPoint(x, &k) || k < 0.0) return 0.0;
-  try {
-    return mExponential(-mean + k * mLog(mean, true) - mLogGamma(k + 1.0), true);
-  } catch (const std::runtime_error&) {
-    return 0.0;
-  }
+  return saddle::poissonMass(k, mean);
 }
 
 // The upper tail P(X >= k) is P(X > k - 1).

@@ -11,6 +11,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -80,7 +81,8 @@ double CmTCdf::operator()(double x) {
 
 double mTPdf(double x, double df, double noncentrality) {
   try {
-    if (noncentrality == 0.0 || x == 0.0) {
+    if (noncentrality == 0.0) return saddle::tDensity(x, df);
+    if (x == 0.0) {
       const double a = (df + 1.0) / 2.0;
       const double b = df / 2.0;
       return mExponential(mLogGamma(a) - mLogGamma(b) - 0.5 * mLog(mGetPi() * df, true) -
