@@ -3,9 +3,9 @@
 #include <cmath>
 #include <map>
 
-#include "utilities/LYNBasicTypes.h"
-#include "utilities/distributions/discrete_rules.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/LYNBasicTypes.h"
 
 namespace qel {
 

@@ -11,10 +11,10 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/distributions/kernels.h"
+#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 

@@ -10,10 +10,10 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/discrete_rules.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/distributions/discrete_rules.h"
-#include "utilities/distributions/kernels.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
