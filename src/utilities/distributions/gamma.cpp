@@ -14,6 +14,7 @@
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
 
@@ -62,18 +63,23 @@ double gammaElvQuantile(double p, double shape) {
 // The standard gamma quantile by the ELV routine for the nearer tail; tails
 // beyond its range by the tail search started from its range limit.
 double gammaQuantileFromElv(double p, double shape) {
-  if (!farBeyondElvRange(p)) return gammaElvQuantile(p, shape);
-  double start = gammaElvQuantile(clampToElvRange(p), shape);
-  if (mIsNumericMissing(start) || !(start > 0.0)) start = shape;
   const TailPair tails = [shape](double x, double* lower, double* upper) {
     double density = 0.0;
     return !ElvFailed(elv_gamma_df(x, shape, lower, upper, &density));
   };
+  if (!farBeyondElvRange(p)) {
+    return mPolishedQuantile(tails, p, TailSupport::Positive, gammaElvQuantile(p, shape));
+  }
+  double start = gammaElvQuantile(clampToElvRange(p), shape);
+  if (mIsNumericMissing(start) || !(start > 0.0)) start = shape;
   return mTailQuantile(tails, p, TailSupport::Positive, start);
 }
 
 double chiSqQuantileFromElv(double p, double df) {
-  if (farBeyondElvRange(p)) return 2.0 * gammaQuantileFromElv(p, df / 2.0);
+  if (farBeyondElvRange(p) || elv::elvPrecision() == elv::ElvPrecision::Full) {
+    const double half = gammaQuantileFromElv(p, df / 2.0);
+    return mIsNumericMissing(half) ? half : 2.0 * half;
+  }
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_chi2_lower_quant(p, df, &q) : elv_chi2_upper_quant(1.0 - p, df, &q);

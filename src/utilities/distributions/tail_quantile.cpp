@@ -13,13 +13,14 @@
 #include <limits>
 
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/elv/precision.h"
 
 namespace qel {
 
 namespace {
 
 constexpr double kInfinity = std::numeric_limits<double>::infinity();
-constexpr int kBracketSteps = 12;  // step lengths 1 to 2048 in c
+constexpr int kBracketSteps = 60;  // doubling step lengths in c, up to the whole range
 constexpr int kNarrowingSteps = 400;
 
 double toCoordinate(double x, TailSupport s) {
@@ -37,10 +38,10 @@ double toCoordinate(double x, TailSupport s) {
 double fromCoordinate(double c, TailSupport s) {
   switch (s) {
     case TailSupport::Positive:
-      return std::exp(std::fmax(std::fmin(c, 709.0), -745.0));
+      return std::exp(std::fmax(std::fmin(c, 709.0), -708.0));
     case TailSupport::Unit:
-      return c > 0.0 ? 1.0 / (1.0 + std::exp(-std::fmin(c, 745.0)))
-                     : std::exp(std::fmax(c, -745.0)) / (1.0 + std::exp(std::fmax(c, -745.0)));
+      return c > 0.0 ? 1.0 / (1.0 + std::exp(-std::fmin(c, 708.0)))
+                     : std::exp(std::fmax(c, -708.0)) / (1.0 + std::exp(std::fmax(c, -708.0)));
     case TailSupport::RealLine:
       break;
   }
@@ -75,7 +76,8 @@ struct Point {
 };
 
 // Doubling steps in c from the start until g changes sign.
-bool bracket(const Equation& eq, TailSupport s, double start, Point* a, Point* b) {
+bool bracket(const Equation& eq, TailSupport s, double start, double firstStep, Point* a,
+             Point* b) {
   Point p{start, eq(start)};
   if (std::isnan(p.g)) return false;
   if (p.g == 0.0) {
@@ -84,10 +86,12 @@ bool bracket(const Equation& eq, TailSupport s, double start, Point* a, Point* b
   }
   const double direction = p.g < 0.0 ? 1.0 : -1.0;
   const double c0 = toCoordinate(start, s);
-  double step = 1.0;
+  double step = firstStep;
+  double previous = start;
   for (int i = 0; i < kBracketSteps; ++i, step += step) {
-    const double x = fromCoordinate(c0 + direction * step, s);
-    if (!inside(x, s)) return false;
+    const double x = fromCoordinate(c0 + direction * std::fmin(step, 2000.0), s);
+    if (!inside(x, s) || x == previous) return false;  // the end of the support
+    previous = x;
     const Point q{x, eq(x)};
     if (std::isnan(q.g)) return false;
     if ((q.g >= 0.0) != (p.g >= 0.0) || q.g == 0.0) {
@@ -143,14 +147,33 @@ double narrow(const Equation& eq, TailSupport s, Point a, Point b) {
 
 }  // namespace
 
-double mTailQuantile(const TailPair& tails, double p, TailSupport support, double start) {
+double mTailQuantile(const TailPair& tails, double p, TailSupport support, double start,
+                     double firstStep) {
   if (!(p > 0.0 && p < 1.0) || !inside(start, support)) return mGetMissingValueCode();
   const bool upper = p > 0.5;
   const Equation eq{tails, upper, std::log(upper ? 1.0 - p : p)};
   Point a{}, b{};
-  if (!bracket(eq, support, start, &a, &b)) return mGetMissingValueCode();
+  if (!bracket(eq, support, start, firstStep, &a, &b)) {
+    // On (0, 1) a quantile closer to 1 than the last double below it rounds
+    // to 1.
+    if (support == TailSupport::Unit && upper) {
+      const double below = std::nextafter(1.0, 0.0);
+      const double g = eq(below);
+      if (!std::isnan(g) && g < 0.0) return 1.0;
+    }
+    return mGetMissingValueCode();
+  }
   if (a.x == b.x) return a.x;
   return narrow(eq, support, a, b);
+}
+
+double mPolishedQuantile(const TailPair& tails, double p, TailSupport support, double q) {
+  if (elv::elvPrecision() != elv::ElvPrecision::Full || mIsNumericMissing(q) ||
+      !inside(q, support) || !(p > 0.0 && p < 1.0)) {
+    return q;
+  }
+  const double polished = mTailQuantile(tails, p, support, q, 1e-9);
+  return mIsNumericMissing(polished) ? q : polished;
 }
 
 namespace {
