@@ -73,7 +73,7 @@ TEST(ElvGammaDf, ZeroAndHugeArguments) {
 
 // One point in each branch: (x, a, method, code).
 TEST(ElvGammaDf, MethodNumbersOfTheBranches) {
-  const qel::elv::ScopedElvPrecision written(qel::elv::ElvPrecision::Written);
+  const qel::elv::ScopedElvPrecision historical(qel::elv::ElvPrecision::Historical);
   struct Case {
     double x, a;
     int method, code;
@@ -288,7 +288,7 @@ TEST(ElvGammaQuantiles, MethodNumbersOfTheBranches) {
 }
 
 TEST(ElvNormalQuantiles, RangeLinearFormAndSymmetry) {
-  const qel::elv::ScopedElvPrecision written(qel::elv::ElvPrecision::Written);
+  const qel::elv::ScopedElvPrecision historical(qel::elv::ElvPrecision::Historical);
   double z = 0;
   normal_upper_quant(0.6, &z);
   EXPECT_EQ(ELVerrno, 2);

@@ -28,8 +28,9 @@ int runHelper(const std::string& helper, const double* a) {
 TEST(ElvPrecisionSetting, SeriesLengthsOfBothSettings) {
   int rows = 0;
   for (const auto& row : qeltest::loadReferenceData("elv_series_lengths.csv", 2)) {
-    const bool written = row.text[1] == "written";
-    const qel::elv::ScopedElvPrecision scope(written ? ElvPrecision::Written : ElvPrecision::Full);
+    const bool historical = row.text[1] == "historical";
+    const qel::elv::ScopedElvPrecision scope(historical ? ElvPrecision::Historical
+                                                        : ElvPrecision::Full);
     ELVerrno = 0;
     EXPECT_EQ(runHelper(row.text[0], row.numbers.data()), 0) << "line " << row.line;
     EXPECT_EQ(ELVsteps1, static_cast<int64_t>(row.numbers[4]))
@@ -42,7 +43,7 @@ TEST(ElvPrecisionSetting, SeriesLengthsOfBothSettings) {
 TEST(ElvPrecisionSetting, ScopeRestoresTheSetting) {
   EXPECT_EQ(qel::elv::elvPrecision(), ElvPrecision::Full);
   {
-    const qel::elv::ScopedElvPrecision outer(ElvPrecision::Written);
+    const qel::elv::ScopedElvPrecision outer(ElvPrecision::Historical);
     EXPECT_EQ(qel::elv::seriesCutoff(), 1e-9);
     EXPECT_EQ(qel::elv::mixtureStop(), 5e-10);
     const qel::elv::ScopedElvPrecision inner(ElvPrecision::Full);

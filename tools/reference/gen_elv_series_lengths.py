@@ -26,7 +26,7 @@ sys.path.insert(0, os.path.dirname(__file__))
 from refdata import write_rows  # noqa: E402
 
 mpmath.mp.dps = 50
-CUTOFFS = {"written": mpf("1e-9"), "full": mpf(1.4e-17)}
+CUTOFFS = {"historical": mpf("1e-9"), "full": mpf(1.4e-17)}
 
 
 def length(ratio, cutoff, available=None):

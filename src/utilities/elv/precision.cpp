@@ -15,7 +15,7 @@ namespace {
 // 1e-26, and a continued-fraction midpoint is off by half the gap, while the
 // rounding noise of a tail (a few units of 1e-16) can never stall either.
 constexpr ElvTolerances kFull = {1.4e-17, 1e-13, 2e-15, 1e-17};
-constexpr ElvTolerances kWritten = {1e-9, 1e-9, 1e-9, 5e-10};
+constexpr ElvTolerances kHistorical = {1e-9, 1e-9, 1e-9, 5e-10};
 
 std::atomic<int> current{static_cast<int>(ElvPrecision::Full)};
 
@@ -30,7 +30,7 @@ ElvPrecision elvPrecision() {
 }
 
 const ElvTolerances& elvTolerances() {
-  return elvPrecision() == ElvPrecision::Full ? kFull : kWritten;
+  return elvPrecision() == ElvPrecision::Full ? kFull : kHistorical;
 }
 
 }  // namespace elv

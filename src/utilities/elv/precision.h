@@ -17,7 +17,7 @@ namespace elv {
 
 enum class ElvPrecision {
   Full,     // double precision (the default)
-  Written,  // cut-off 1e-9, mixture stop 5e-10
+  Historical,  // cut-off 1e-9, mixture stop 5e-10
 };
 
 struct ElvTolerances {
