@@ -67,7 +67,10 @@ double stirlerr(double n) {
 }
 
 double bd0(double x, double m) {
-  if (std::fabs(x - m) < 0.1 * (x + m)) {
+  // The series has terms of one sign; Loader takes it for |v| < 0.1, taken
+  // here up to |v| < 0.5 (some 25 terms), where the closed form would lose
+  // up to a digit and a half to cancellation.
+  if (std::fabs(x - m) < 0.5 * (x + m)) {
     // With v = (x - m)/(x + m) the deviance is (x - m) v + 2 x sum v^(2j+1)/(2j+1).
     double v = (x - m) / (x + m);
     double s = (x - m) * v;
