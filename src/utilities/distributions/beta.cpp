@@ -56,6 +56,7 @@ double mBetaCdf(double x, double a, double b, bool upperTail) {
 }
 
 double mBetaInvCdf(double p, double a, double b) {
+  if (!mPositiveShapes(a, b)) return mGetMissingValueCode();
   if (p == 0.0) return 0.0;
   if (p == 1.0) return 1.0;
   double q = 0.0;
@@ -118,6 +119,9 @@ double mFCdf(double x, double df1, double df2, double noncentrality, bool upperT
 }
 
 double mFInvCdf(double p, double df1, double df2, double noncentrality) {
+  if (!mPositiveShapes(df1, df2) || !std::isgreaterequal(noncentrality, 0.0)) {
+    return mGetMissingValueCode();
+  }
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();

@@ -63,6 +63,7 @@ double gammaElvQuantile(double p, double shape) {
 // The standard gamma quantile by the ELV routine for the nearer tail; tails
 // beyond its range by the tail search started from its range limit.
 double gammaQuantileFromElv(double p, double shape) {
+  if (!mPositiveShapes(shape)) return mGetMissingValueCode();
   const TailPair tails = [shape](double x, double* lower, double* upper) {
     double density = 0.0;
     return !ElvFailed(elv_gamma_df(x, shape, lower, upper, &density));
@@ -203,6 +204,9 @@ double mChiSqCdf(double x, double df, double noncentrality, bool upperTail) {
 }
 
 double mChiSqInvCdf(double p, double df, double noncentrality) {
+  if (!mPositiveShapes(df) || !std::isgreaterequal(noncentrality, 0.0)) {
+    return mGetMissingValueCode();
+  }
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
   if (noncentrality == 0.0) return centralChiSqQuantile(p, df);

@@ -30,6 +30,7 @@ constexpr int kElvDomainStatus = 3;
 
 // The central t quantile by the ELV routine for the nearer tail.
 double centralTQuantile(double p, double df) {
+  if (!mPositiveShapes(df)) return mGetMissingValueCode();
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_t_lower_quant(p, df, &q) : elv_t_upper_quant(1.0 - p, df, &q);
@@ -152,6 +153,7 @@ double mTCdf(double x, double df, double noncentrality, bool upperTail) {
 }
 
 double mTInvCdf(double p, double df, double noncentrality) {
+  if (!mPositiveShapes(df) || std::isnan(noncentrality)) return mGetMissingValueCode();
   if (p == 0.0 || p == 1.0) return mGetMissingValueCode();
   if (noncentrality == 0.0) return centralTQuantile(p, df);
   try {

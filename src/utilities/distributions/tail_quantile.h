@@ -3,6 +3,7 @@
 #ifndef QEL_SRC_UTILITIES_DISTRIBUTIONS_TAIL_QUANTILE_H
 #define QEL_SRC_UTILITIES_DISTRIBUTIONS_TAIL_QUANTILE_H
 
+#include <cmath>
 #include <functional>
 
 namespace qel {
@@ -22,6 +23,13 @@ enum class TailSupport {
 // fail or no bracket is found. firstStep is the first bracketing step in the
 // coordinate of the support (log x, logit x or asinh x): small when start is
 // already close, as for the polishing of a quantile to the last digit.
+// True when every shape is a positive number. The comparison is the quiet
+// one: a NaN shape must not raise the invalid operation in an armed thread
+// before the searches, whose arithmetic on such a shape would.
+inline bool mPositiveShapes(double a, double b = 1.0) {
+  return std::isgreater(a, 0.0) && std::isgreater(b, 0.0);
+}
+
 double mTailQuantile(const TailPair& tails, double p, TailSupport support, double start,
                      double firstStep = 1.0);
 
