@@ -246,3 +246,18 @@ run(2 "^$" test wilcoxon ${WORK}/qelcalc_groups.csv --column 1 --column2 3)
 run(2 "^$" test wilcoxon ${WORK}/qelcalc_groups.csv --approximate)
 run(2 "^$" test runs ${WORK}/qelcalc_ga.txt --mu 1)
 run(2 "^$" test runs)
+
+# gof and ticks: the chi-square test of counts (R: chisq.test(c(30, 70),
+# p = c(0.2, 0.8)) gives X-squared 6.25, P 0.01241933065155) and an axis.
+file(WRITE ${WORK}/qelcalc_counts.txt "30\n70\n")
+run(0 "^category 1 20 5\ncategory 2 80 1\\.25\nstatistic 6\\.25\ndf 1\np 0\\.0124193306515[0-9]*\n$"
+    gof ${WORK}/qelcalc_counts.txt --proportions 0.2,0.8)
+run(2 "^$" gof ${WORK}/qelcalc_counts.txt --proportions 0.2)
+run(2 "^$" gof ${WORK}/qelcalc_bad.txt)
+run(0 "^first 0\nlast 10\nscale_min -0\\.188\nscale_max 10\\.18[0-9]*\nincrement 2\ncount 6\nticks 0 2 4 6 8 10\n$"
+    ticks 0.3 9.7)
+run(0 "^first -100\nlast 0\n.*count 6\nticks -100 -80 -60 -40 -20 0\n$" ticks -100 1)
+run(0 "^first 1\nlast 9\n" ticks 0.3 9.7 --limits 0.5,100)
+run(2 "^$" ticks 1 2 --limits a,b)
+run(2 "^$" ticks 1 2 --ticks 4)
+run(2 "^$" ticks 1)

@@ -10,6 +10,7 @@
 #include "describe_mode.h"
 #include "distribution_mode.h"
 #include "fit_mode.h"
+#include "gof_mode.h"
 #include "pvalue_mode.h"
 #include "rank_test_mode.h"
 #include "sample_mode.h"
@@ -31,6 +32,8 @@ void printUsage(std::ostream& out) {
   qelcalc::printFitUsage(out);
   qelcalc::printSummaryUsage(out);
   qelcalc::printTableUsage(out);
+  qelcalc::printGofUsage(out);
+  qelcalc::printTicksUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -58,6 +61,8 @@ int main(int argc, char** argv) {
     if (mode == "summary") return qelcalc::runSummaryMode(argc, argv, std::cout);
     if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
     if (mode == "table") return qelcalc::runTableMode(argc, argv, std::cout);
+    if (mode == "gof") return qelcalc::runGofMode(argc, argv, std::cout);
+    if (mode == "ticks") return qelcalc::runTicksMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

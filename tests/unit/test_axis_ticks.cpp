@@ -159,6 +159,7 @@ TEST(AxisTicks, WholeSearchesWorkedByHand) {
   EXPECT_TRUE(five.firstTick == 4.5 && five.lastTick == 5.5);
   EXPECT_TRUE(zero.firstTick == -0.5 && zero.lastTick == 0.5);
   EXPECT_TRUE(m.firstTick == -100 && m.lastTick == 0 && m.scaleMinimum < -100);
+  EXPECT_FALSE(std::signbit(m.lastTick));
 }
 
 struct Args {

@@ -78,8 +78,9 @@ double roundScaleEnd(double x, int digits, bool isMinimum) {
   return outwardInteger(x * p, isMinimum) / p;
 }
 
+// Within the doubles, and without a negative zero (a mirrored 0 tick).
 double clampToRange(double x) {
-  return std::max(-DBL_MAX, std::min(DBL_MAX, x));
+  return std::max(-DBL_MAX, std::min(DBL_MAX, x)) + 0.0;
 }
 
 }  // namespace
