@@ -261,3 +261,19 @@ run(0 "^first 1\nlast 9\n" ticks 0.3 9.7 --limits 0.5,100)
 run(2 "^$" ticks 1 2 --limits a,b)
 run(2 "^$" ticks 1 2 --ticks 4)
 run(2 "^$" ticks 1)
+
+# quad and sint: the 4-point Gauss-Legendre rule (published constants), the
+# 3-point Hermite rule (nodes 0 and +-sqrt(3/2)), sign levels for n = 20
+# (tools/reference/gen_sint.py: d 6, levels 0.958610534668, 0.884681701660).
+run(0 "^0\\.861136311594052[0-9]* 0\\.347854845137453[0-9]*\n0\\.339981043584856[0-9]* 0\\.652145154862546[0-9]*\n$"
+    quad legendre 4)
+run(0 "^-1\\.22474487139158[0-9]* 0\\.29540897515091[0-9]*\n0 1\\.18163590060367[0-9]*\n1\\.22474487139158[0-9]* 0\\.29540897515091[0-9]*\n$"
+    quad hermite 3)
+run(0 "^kind 0\nd 6\nlevel_d 0\\.9586105346679[0-9]*\nlevel_d_plus_1 0\\.884681701660[0-9]*\nlambda 0\\.2352342158[0-9]*\n$"
+    sint 20 --confidence 0.95)
+run(2 "^$" quad laguerre 2 --alpha -1)
+run(2 "^$" quad hermite 2 --alpha 1)
+run(2 "^$" quad cheb 3)
+run(2 "^$" quad legendre 0)
+run(2 "^$" sint 20)
+run(2 "^$" sint 20 --confidence 1.5)

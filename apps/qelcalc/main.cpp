@@ -12,6 +12,7 @@
 #include "fit_mode.h"
 #include "gof_mode.h"
 #include "pvalue_mode.h"
+#include "quad_mode.h"
 #include "rank_test_mode.h"
 #include "sample_mode.h"
 #include "summary_mode.h"
@@ -34,6 +35,8 @@ void printUsage(std::ostream& out) {
   qelcalc::printTableUsage(out);
   qelcalc::printGofUsage(out);
   qelcalc::printTicksUsage(out);
+  qelcalc::printQuadUsage(out);
+  qelcalc::printSintUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -63,6 +66,8 @@ int main(int argc, char** argv) {
     if (mode == "table") return qelcalc::runTableMode(argc, argv, std::cout);
     if (mode == "gof") return qelcalc::runGofMode(argc, argv, std::cout);
     if (mode == "ticks") return qelcalc::runTicksMode(argc, argv, std::cout);
+    if (mode == "quad") return qelcalc::runQuadMode(argc, argv, std::cout);
+    if (mode == "sint") return qelcalc::runSintMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

@@ -155,7 +155,21 @@ bool mGaussHermiteQuadratureWeights(unsigned n, std::vector<double>& nodes,
   std::vector<double> off(n > 0 ? n - 1 : 0);
   for (std::size_t i = 0; i < off.size(); ++i) off[i] = std::sqrt(0.5 * static_cast<double>(i + 1));
   if (!golubWelsch(std::vector<double>(n, 0.0), off, std::sqrt(M_PI), nodes, weights)) return false;
-  if (half) keepPositiveHalf(nodes, weights);
+  // The rule is symmetric: each pair is averaged with its mirror image, and
+  // an odd rule's middle node is exactly 0.
+  std::vector<double> x = nodes, w = weights;
+  keepPositiveHalf(x, w);
+  if (half) {
+    nodes.swap(x);
+    weights.swap(w);
+    return true;
+  }
+  for (std::size_t i = 0; i < x.size(); ++i) {
+    nodes[n - 1 - i] = x[i];
+    nodes[i] = -x[i];
+    weights[i] = weights[n - 1 - i] = w[i];
+  }
+  if (n % 2) nodes[n / 2] = 0.0;
   return true;
 }
 

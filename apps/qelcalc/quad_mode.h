@@ -1,0 +1,18 @@
+// qelcalc quad legendre|hermite|laguerre N [--alpha A]
+// qelcalc sint N --confidence C
+#ifndef QELCALC_QUAD_MODE_H
+#define QELCALC_QUAD_MODE_H
+
+#include <ostream>
+
+namespace qelcalc {
+
+int runQuadMode(int argc, char** argv, std::ostream& out);
+void printQuadUsage(std::ostream& out);
+
+int runSintMode(int argc, char** argv, std::ostream& out);
+void printSintUsage(std::ostream& out);
+
+}  // namespace qelcalc
+
+#endif
