@@ -69,12 +69,14 @@ TEST(GaussRules, MatchMpmathAndAreExactOnMonomials) {
     // Legendre keeps the positive half, descending.
     const std::size_t offset = legendre ? n - n / 2 : 0;
     ASSERT_EQ(x.size(), n - offset) << r.first;
-    double wMax = 0, xMax = 0;
-    for (const auto& row : r.second) wMax = std::max(wMax, row.numbers[3]);
-    for (const auto& row : r.second) xMax = std::max(xMax, std::fabs(row.numbers[2]));
+    double wMax = 0, xMax = 1;
+    for (const auto& row : r.second) {
+      wMax = std::max(wMax, row.numbers[3]);
+      xMax = std::max(xMax, std::fabs(row.numbers[2]));
+    }
     for (std::size_t i = 0; i < x.size(); ++i) {
       const auto& ref = r.second[legendre ? n - 1 - i : i].numbers;
-      EXPECT_NEAR(x[i], ref[2], 4e-15 * std::max(xMax, 1.0)) << r.first << " " << i;
+      EXPECT_NEAR(x[i], ref[2], 4e-15 * xMax) << r.first << " " << i;
       // Golub-Welsch weights carry an absolute error of about eps times
       // the largest.
       if (ref[3] > 1e-10 * wMax)
@@ -100,8 +102,7 @@ TEST(GaussRules, MatchMpmathAndAreExactOnMonomials) {
       // Odd moments cancel: the error scale is sum |w x^k|.
       double scale = 1;
       for (std::size_t i = 0; i < x.size(); ++i) scale += std::fabs(w[i] * f(x[i]));
-      EXPECT_NEAR(sum, exact, 1e-13 * scale * (k + 1))
-          << r.first << " k " << k;
+      EXPECT_NEAR(sum, exact, 1e-13 * scale * (k + 1)) << r.first << " k " << k;
     }
   }
   Power cube(3);
@@ -111,8 +112,7 @@ TEST(GaussRules, MatchMpmathAndAreExactOnMonomials) {
 
 TEST(GaussRules, BadArguments) {
   std::vector<double> x{1}, w{1};
-  EXPECT_FALSE(qel::mGaussLaguerreQuadratureWeights(4, x, w, -1.0));
-  EXPECT_TRUE(x.empty() && w.empty());
+  EXPECT_FALSE(qel::mGaussLaguerreQuadratureWeights(4, x, w, -1.0) || !x.empty() || !w.empty());
   EXPECT_FALSE(qel::mGaussLaguerreQuadratureWeights(4, x, w, std::nan("")));
   EXPECT_TRUE(qel::mGaussHermiteQuadratureWeights(0, x, w, false) && x.empty());
 }
@@ -129,8 +129,7 @@ TEST(SignLevels, MatchExactBinomialSums) {
     qel::mSint(n, v[1], levels, &d, &kind, &lambda);
     // Above n = 50 the normal kernel's own error (about 1e-11) shows.
     const double tol = n > 50 ? 1e-10 : 1e-13;
-    EXPECT_EQ(kind, int(v[2])) << row.line;
-    EXPECT_EQ(d, int(v[3])) << row.line;
+    EXPECT_TRUE(kind == int(v[2]) && d == int(v[3])) << row.line;
     ASSERT_EQ(levels.size(), kind == 1 ? 1u : 2u) << row.line;
     EXPECT_LE(relativeError(levels[0], v[4]), tol) << row.line;
     if (kind != 1) {

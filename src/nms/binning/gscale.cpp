@@ -311,6 +311,9 @@ bool FindHighestNicenessScore(const std::vector<double>& increments,
         lowBound = std::max(sMin, s.lowerLimit);
         highBound = std::max(sMin + s.lowTickMargin * i, s.lowerLimit);
       }
+      // From b on, every first tick gets the same bounds; the ticks ascend,
+      // so none after one above them can pass.
+      if (f >= x.b && f > highBound) break;
       if (!(f >= lowBound && f <= highBound)) continue;
       const double p1 = ComputeBelowDataMinPenalty(x.b, sMin, x.L, s.belowMax);
       const double p3 = ComputeBelowFirstTickPenalty(f, sMin, i, s.lowTickMargin);
@@ -406,8 +409,10 @@ TickChoice search(const TickSearch& s) {
   const double largest = (x.d - x.a) / (s.minTicks - 1);
   const double lowestFirst = std::max(x.a, s.lowerLimit);
   const double highestFirst = std::max(x.b + s.lowTickMargin * largest, s.lowerLimit);
-  std::vector<double> increments, firstTicks;
-  std::vector<int> incGroups, tickGroups;
+  // Candidate lists reused from call to call on each thread: a call then
+  // allocates nothing once the lists have grown.
+  thread_local std::vector<double> increments, firstTicks;
+  thread_local std::vector<int> incGroups, tickGroups;
   TickChoice choice{};
   if (std::isfinite(smallest) && std::isfinite(largest) &&
       FindSetOfNiceNumbers(smallest, largest, adNiceIncValsArray, aiNiceIncGrpsArray, 10,
