@@ -277,3 +277,11 @@ run(2 "^$" quad cheb 3)
 run(2 "^$" quad legendre 0)
 run(2 "^$" sint 20)
 run(2 "^$" sint 20 --confidence 1.5)
+
+# range: R's ptukey(3.5, 3, Inf) = 0.964442958136556, qtukey(0.95, 3, Inf) =
+# 3.31449316; for k = 2, P(R > 20) = erfc(10) = 2.088487583762545e-45.
+run(0 "^cdf 0\\.9644429581[0-9]*\n$" range cdf 3.5 --k 3)
+run(0 "^cdf 2\\.08848758376254[0-9]*e-45\n$" range cdf 20 --k 2 --upper)
+run(0 "^inv 3\\.314493[0-9]*\n$" range inv 0.95 --k 3)
+run(2 "^$" range cdf 1 --k 1)
+run(2 "^$" range inv 0.95 --k 3 --upper)

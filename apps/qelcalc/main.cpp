@@ -37,6 +37,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printTicksUsage(out);
   qelcalc::printQuadUsage(out);
   qelcalc::printSintUsage(out);
+  qelcalc::printRangeUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -68,6 +69,7 @@ int main(int argc, char** argv) {
     if (mode == "ticks") return qelcalc::runTicksMode(argc, argv, std::cout);
     if (mode == "quad") return qelcalc::runQuadMode(argc, argv, std::cout);
     if (mode == "sint") return qelcalc::runSintMode(argc, argv, std::cout);
+    if (mode == "range") return qelcalc::runRangeMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

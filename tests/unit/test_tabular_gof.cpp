@@ -6,6 +6,7 @@
 
 #include <cmath>
 #include <map>
+#include <numeric>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -35,9 +36,7 @@ std::vector<double> split(const std::string& s) {  // "a;b;c"
 }
 
 double sum(const std::vector<double>& x) {
-  double s = 0;
-  for (double v : x) s += v;
-  return s;
+  return std::accumulate(x.begin(), x.end(), 0.0);
 }
 
 TEST(TabularChiSqGof, MatchesRChisqTest) {
