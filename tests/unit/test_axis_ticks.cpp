@@ -131,10 +131,9 @@ TEST(AxisTicks, WholeSearchesWorkedByHand) {
   // Equal data widen by half a unit; all-zero data become -0.5 .. 0.5;
   // -100 .. 1 is solved mirrored and comes back oriented.
   const TickCalculationResult five = ticks(5, 5), zero = ticks(0, 0), m = ticks(-100, 1);
-  EXPECT_TRUE(five.firstTick == 4.5 && five.lastTick == 5.5);
-  EXPECT_TRUE(zero.firstTick == -0.5 && zero.lastTick == 0.5);
-  EXPECT_TRUE(m.firstTick == -100 && m.lastTick == 0 && m.scaleMinimum < -100);
-  EXPECT_FALSE(std::signbit(m.lastTick));
+  EXPECT_TRUE(five.firstTick == 4.5 && five.lastTick == 5.5 && zero.firstTick == -0.5 &&
+              zero.lastTick == 0.5 && m.firstTick == -100 && m.lastTick == 0 &&
+              m.scaleMinimum < -100 && !std::signbit(m.lastTick));
 }
 
 struct Args {

@@ -5,8 +5,9 @@
 // upper normal tail,
 //   P(R > r) = k int phi(x) Q(x)^(k-1) (1 - (1 - Q(x+r)/Q(x))^(k-1)) dx,
 // and the bracket is -expm1((k-1) log1p(-Q(x+r)/Q(x))), so a tail of 1e-300
-// keeps its relative accuracy. A single 16-point rule over [-8, 8] errs by
-// about 1e-4 on these integrands (checked against mpmath), hence the panels.
+// keeps its relative accuracy. A single 16-point rule over [-8, 8] misses
+// these integrands by 2% to 90% (k = 3 to 50, r = 0.5 to 5), where the
+// panels agree with mpmath to 1e-12.
 #include "utilities/distributions/normal_range.h"
 
 #include <algorithm>
