@@ -298,3 +298,11 @@ run(2 "^$" power variance --n 10 --power 0.9 --method anova)
 run(2 "^$" power t --n 0 --power 0.9)
 run(2 "^$" power anova --n 10 --power 0.9)
 run(2 "^$" power t --n 10 --power 0.9 --null 0.5)
+# tost: the power of the difference -0.3 at n = 20 (mpmath, tests/data/
+# tost_power.csv) gives back -0.3 and its mirror; a target above the peak
+# gives one NaN row.
+run(0 "${hdr}20 -0\\.(29999999|30000000)[0-9]* 0\\.69[0-9]* NaN\n20 0\\.(29999999|30000000)[0-9]* 0\\.69[0-9]* NaN\n$"
+    power tost --lower -1 --upper 1 --n 20 --power 0.69322369510020596)
+run(0 "${hdr}10 NaN 0\\.9[0-9]* NaN\n$" power tost --lower -1 --upper 1 --n 10 --power 0.9)
+run(2 "^$" power tost --lower 1 --n 10 --power 0.9)
+run(2 "^$" power tost --lower -1 --upper 1 --n 10 --power 0.9 --paired --one-sample)
