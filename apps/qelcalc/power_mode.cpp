@@ -18,6 +18,7 @@
 #include "basic_statistics/Power.h"
 #include "basic_statistics/PowerTOST.h"
 #include "cli.h"
+#include "power_factorial_mode.h"
 #include "test_input.h"
 #include "utilities/LYNBasicTypes.h"
 
@@ -248,9 +249,16 @@ void printPowerUsage(std::ostream& out) {
          "    Effects: a difference of means (t, z, paired, welch), of proportions from the\n"
          "    null, of rates from --rate, or a ratio of variances (of sds with --ratio-sd);\n"
          "    solved effects of prop and poisson are written as proportions and rates.\n";
+  printFactorialPowerUsage(out);
 }
 
 int runPowerMode(int argc, char** argv, std::ostream& out) {
+  if (argc > 2 && isFactorialPowerDesign(argv[2])) {
+    std::ostringstream rows;
+    runFactorialPowerMode(argc, argv, rows);
+    out << rows.str();
+    return 0;
+  }
   const Arguments args = parseArguments(
       argc, argv, 2, {"two-sample", "ratio-sd", "extents", "ratio", "paired", "one-sample"});
   if (args.positional.size() != 1) throw UsageError("power takes one design (see --help)");
