@@ -318,3 +318,11 @@ run(2 "^$" power factorial --factors 4 --runs 16 --blocks 16 --reps 1 --center-p
 run(2 "^$" power factorial --factors 3 --runs 8 --reps 1 --effect 1)
 run(2 "^$" power gff --levels 3,1 --reps 5 --effect 1)
 run(2 "^$" power tost --lower -1 --upper 1 --n 10 --power 0.9 --paired --one-sample)
+
+# sort: stable multi-key order (first key most significant, minus descending);
+# ties on every key keep their input order; a header stays on top.
+file(WRITE ${WORK}/qelcalc_sort.csv "a,b,c\n1,2,3\n2,1,9\n1,1,5\n2,1,7\n1,2,3.0\n")
+run(0 "^a,b,c\n1,1,5\n1,2,3\n1,2,3\\.0\n2,1,9\n2,1,7\n$" sort ${WORK}/qelcalc_sort.csv --by 1,-3)
+run(0 "^a,b,c\n2,1,9\n1,1,5\n2,1,7\n1,2,3\n1,2,3\\.0\n$" sort ${WORK}/qelcalc_sort.csv --by 2)
+run(2 "^$" sort ${WORK}/qelcalc_sort.csv --by 5)
+run(2 "^$" sort ${WORK}/qelcalc_sort.csv --by 0)

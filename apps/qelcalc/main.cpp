@@ -11,11 +11,12 @@
 #include "distribution_mode.h"
 #include "fit_mode.h"
 #include "matrix_mode.h"
-#include "proportion_variance_mode.h"
 #include "power_mode.h"
+#include "proportion_variance_mode.h"
 #include "pvalue_mode.h"
 #include "rank_test_mode.h"
 #include "sample_mode.h"
+#include "sort_mode.h"
 #include "summary_mode.h"
 #include "table_mode.h"
 #include "ttest_mode.h"
@@ -37,6 +38,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printTableUsage(out);
   qelcalc::printMatrixUsage(out);
   qelcalc::printPowerUsage(out);
+  qelcalc::printSortUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -66,6 +68,7 @@ int main(int argc, char** argv) {
     if (mode == "table") return qelcalc::runTableMode(argc, argv, std::cout);
     if (mode == "matrix") return qelcalc::runMatrixMode(argc, argv, std::cout);
     if (mode == "power") return qelcalc::runPowerMode(argc, argv, std::cout);
+    if (mode == "sort") return qelcalc::runSortMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";
