@@ -53,6 +53,34 @@ void sortAscending(std::vector<T>& list) {
   list.swap(sorted);
 }
 
+// The root of f on [a, b] (f(a) < 0 <= f(b), both known) by the
+// Anderson-Bjorck variant of false position (Anderson and Bjorck, BIT 13
+// (1973) 253-264), which converges superlinearly where the Illinois variant
+// needs about four times the evaluations on these smooth power curves.
+// Missing values of f end the search with the missing value.
+double andersonBjorck(CmRealFunction& f, double a, double fa, double b, double fb) {
+  for (int k = 0; k < 200; ++k) {
+    const double c = b - fb * (b - a) / (fb - fa);
+    if (!(c > std::min(a, b) && c < std::max(a, b))) return std::fabs(fa) < std::fabs(fb) ? a : b;
+    const double fc = f(c);
+    if (!isNumber(fc)) return kMissing;
+    if (fc == 0.0 || std::fabs(fc) <= 1e-13 * (1.0 + std::fabs(f.mTarget)) ||
+        std::fabs(b - a) <= 1e-13 * (1.0 + std::fabs(c))) {
+      return c;
+    }
+    if ((fc < 0.0) != (fb < 0.0)) {
+      a = b;
+      fa = fb;
+    } else {
+      const double m = 1.0 - fc / fb;
+      fa *= m > 0.0 ? m : 0.5;
+    }
+    b = c;
+    fb = fc;
+  }
+  return b;
+}
+
 }  // namespace
 
 CmCmndPowerTOST::CmCmndPowerTOST()
@@ -167,12 +195,21 @@ double CmCmndPowerTOST::mComputeXForPowerAndSampleSize(double power, int n) {
 }
 
 double CmCmndPowerTOST::mCalcMeansDifferencesRootUtility(double start, int n, double power) {
+  return mSolveLeftHalf(start, kMissing, (mLowerLimit + mUpperLimit) / 2.0, n, power);
+}
+
+// The root between start and end (end at most the centre), where the power
+// rises from below the target to at least it.
+// The power at start may be passed (the missing value when not known); the
+// power at the centre is the stored one.
+double CmCmndPowerTOST::mSolveLeftHalf(double start, double startPower, double end, int n,
+                                       double power) {
   const double centre = (mLowerLimit + mUpperLimit) / 2.0;
   CmTOSTPower f(*this, n, 0.0, power, false);
-  double lo = start, hi = centre;
+  double lo = start, hi = std::min(end, centre);
   // A power of 1 at the centre makes the function flat at the bracket end:
   // pull the end in towards the start while it is still flat.
-  if (mEqualWithinFuzz(mPowerAtCenter, 1.0, kFuzz)) {
+  if (hi == centre && mEqualWithinFuzz(mPowerAtCenter, 1.0, kFuzz)) {
     for (int k = 0; k < 6; ++k) {
       const double next = lo + (hi - lo) / 10.0;
       const double p = mCalcTOSTPower(next, n);
@@ -181,11 +218,16 @@ double CmCmndPowerTOST::mCalcMeansDifferencesRootUtility(double start, int n, do
       if (!mEqualWithinFuzz(p, 1.0, kFuzz)) break;
     }
   }
-  if (mBracketFinder(&lo, &hi, f, start, centre) != 0) return kMissing;
-  if (!(lo < hi)) return lo;
-  int status = 0;
-  const double root = mRootFinder(lo, hi, f, &status);
-  return status == 0 ? root : kMissing;
+  double fLo = isNumber(startPower) ? startPower - power : f(lo);
+  double fHi = hi == centre && isNumber(mPowerAtCenter) ? mPowerAtCenter - power : f(hi);
+  if (!isNumber(fHi) || fHi < 0.0) {
+    // The end does not reach the target: widen to the centre.
+    hi = centre;
+    fHi = isNumber(mPowerAtCenter) ? mPowerAtCenter - power : f(hi);
+  }
+  if (!isNumber(fLo) || !isNumber(fHi) || fHi < 0.0) return kMissing;
+  if (fLo >= 0.0) return lo;
+  return andersonBjorck(f, lo, fLo, hi, fHi);
 }
 
 double CmCmndPowerTOST::mCalcTOSTMeansDifference(double power, int n) {
@@ -194,8 +236,9 @@ double CmCmndPowerTOST::mCalcTOSTMeansDifference(double power, int n) {
   const double centre = (mLowerLimit + mUpperLimit) / 2.0;
   mPowerAtCenter = mCalcTOSTPower(centre, n);
   if (!reaches(mPowerAtCenter, power)) return kMissing;  // above the peak
-  if (reaches(mCalcTOSTPower(mLowerLimit, n), power)) return mLowerLimit;
-  return mCalcMeansDifferencesRootUtility(mLowerLimit, n, power);
+  const double atLower = mCalcTOSTPower(mLowerLimit, n);
+  if (reaches(atLower, power)) return mLowerLimit;
+  return mSolveLeftHalf(mLowerLimit, atLower, centre, n, power);
 }
 
 void CmCmndPowerTOST::mStoreDifferencePair(int& row, int n, double d, double target) {
@@ -234,6 +277,7 @@ void CmCmndPowerTOST::mCalculateMeansDifferences() {
   // fails, every pair fails.
   if (mSampleSizeList.empty() || mPowerList.empty()) return;
   const double first = mCalcTOSTMeansDifference(mPowerList.front(), mSampleSizeList.back());
+  std::vector<double> previousRoots(mPowerList.size(), kMissing);
   for (int n : mSampleSizeList) {
     if (!isNumber(first)) {
       for (double p : mPowerList) mStoreDifferencePair(row, n, kMissing, p);
@@ -241,17 +285,25 @@ void CmCmndPowerTOST::mCalculateMeansDifferences() {
     }
     mPowerAtCenter = mCalcTOSTPower((mLowerLimit + mUpperLimit) / 2.0, n);
     const double atLower = mCalcTOSTPower(mLowerLimit, n);
-    double start = mLowerLimit;
+    double start = mLowerLimit, startPower = atLower;
     bool beyondPeak = false;
-    for (double p : mPowerList) {
+    for (std::size_t k = 0; k < mPowerList.size(); ++k) {
+      const double p = mPowerList[k];
       beyondPeak = beyondPeak || !reaches(mPowerAtCenter, p);
       double d = kMissing;
       if (!beyondPeak) {
-        // A larger power lies closer to the centre: the last root is a valid
-        // left end for the next search.
-        d = reaches(atLower, p) ? mLowerLimit : mCalcMeansDifferencesRootUtility(start, n, p);
-        if (isNumber(d)) start = d;
+        // A larger power lies closer to the centre, so the last root is a
+        // left end for the next search; a larger n reaches a power farther
+        // from the centre, so the root of the same power at the previous
+        // (smaller) n is a right end.
+        const double end = isNumber(previousRoots[k]) ? previousRoots[k] : HUGE_VAL;
+        d = reaches(atLower, p) ? mLowerLimit : mSolveLeftHalf(start, startPower, end, n, p);
+        if (isNumber(d)) {
+          start = d;
+          startPower = p;  // the root's power is the target, to the solve's tolerance
+        }
       }
+      previousRoots[k] = d;
       mStoreDifferencePair(row, n, d, p);
     }
   }

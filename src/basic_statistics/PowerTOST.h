@@ -68,6 +68,7 @@ class CmCmndPowerTOST : public CmCmndPower {
 
  protected:
   void mCalculateMeansDifferences();
+  double mSolveLeftHalf(double start, double startPower, double end, int n, double power);
   void mCalculateSampleSizes();
   bool mLimitsUsable() const;
   double mToUser(double x) const;
