@@ -216,3 +216,26 @@ TEST(TOSTPower, OneSidedSolvesReachTarget) {
 }
 
 }  // namespace
+
+namespace {
+
+TEST(TOSTPower, ScaleEndsFollowTheAlternativeAndRatio) {
+  for (int alt : {-1, 0, 1}) {
+    qel::CmCmndPowerTOST c;
+    c.mSetRatio(true);
+    c.mSetLimits(0.8, 1.25);
+    c.mSetAlternative(static_cast<qel::EAlternative>(alt));
+    double low = 0.0, high = 0.0;
+    c.mGetScaleMinMax(nullptr, nullptr, low, high);
+    if (alt < 0)
+      EXPECT_TRUE(qel::mIsNumericMissing(low));
+    else
+      EXPECT_NEAR(low, 0.8, 1e-15);
+    if (alt > 0)
+      EXPECT_TRUE(qel::mIsNumericMissing(high));
+    else
+      EXPECT_NEAR(high, 1.25, 1e-15);
+  }
+}
+
+}  // namespace
