@@ -22,3 +22,18 @@ x <- runif(1e7)
 idx <- seq(1, 1e7, by = 2)
 timeIt("range, 1e7 values", function() range(x), 10, 1e3, "ms")
 timeIt("range(x[idx]), 5e6 of 1e7", function() range(x[idx]), 10, 1e3, "ms")
+
+# Equivalence (TOST), factorial and one-way peers for bench/bench_power_tost.cpp.
+tostPower <- function(n, d, lower = -1, upper = 1, sigma = 1, level = 0.05) {
+  df <- 2 * n - 2
+  se <- sigma * sqrt(2 / n)
+  t <- qt(1 - level, df)
+  max(pt(-t, df, ncp = (d - upper) / se) - pt(t, df, ncp = (d - lower) / se), 0)
+}
+timeIt("TOST power, qt + 2 pt (n 20, d 0.3)", function() tostPower(20, 0.3), 5000)
+timeIt("TOST n, uniroot (d 0.3, power 0.8)", function()
+  ceiling(uniroot(function(n) tostPower(n, 0.3) - 0.8, c(2, 1e6), tol = 1e-8)$root), 200)
+timeIt("factorial power, qf + pf (1, 32 df)", function()
+  1 - pf(qf(0.95, 1, 32), 1, 32, ncp = 48 * 0.25), 5000)
+timeIt("power.anova.test n (4 groups)", function()
+  power.anova.test(groups = 4, between.var = 0.1, within.var = 1, power = 0.8)$n, 200)

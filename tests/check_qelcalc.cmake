@@ -347,3 +347,31 @@ run(0 "^cdf 2\\.08848758376254[0-9]*e-45\n$" range cdf 20 --k 2 --upper)
 run(0 "^inv 3\\.314493[0-9]*\n$" range inv 0.95 --k 3)
 run(2 "^$" range cdf 1 --k 1)
 run(2 "^$" range inv 0.95 --k 3 --upper)
+# tost: the power of the difference -0.3 at n = 20 (mpmath, tests/data/
+# tost_power.csv) gives back -0.3 and its mirror; a target above the peak
+# gives one NaN row.
+run(0 "${hdr}20 -0\\.(29999999|30000000)[0-9]* 0\\.69[0-9]* NaN\n20 0\\.(29999999|30000000)[0-9]* 0\\.69[0-9]* NaN\n$"
+    power tost --lower -1 --upper 1 --n 20 --power 0.69322369510020596)
+run(0 "${hdr}10 NaN 0\\.9[0-9]* NaN\n$" power tost --lower -1 --upper 1 --n 10 --power 0.9)
+run(2 "^$" power tost --lower 1 --n 10 --power 0.9)
+# factorial: a 2^3 with the six one- and two-way terms keeps 1 error df; its
+# power is R's 1 - pf(qf(0.95, 1, 1), 1, 1, ncp = 32) (tools/reference/
+# gen_factorial_power_r.R). gff: a one-way of 3 levels, n 5, maximum
+# difference 1, is power.anova.test's 0.2211398.
+set(fhdr "^reps centerpoints effect power target runs\n")
+run(0 "${fhdr}1 0 4 0\\.3428357[0-9]* NaN 8\n$"
+    power factorial --factors 3 --runs 8 --reps 1 --center-points 0 --effect 4 --terms 6)
+run(0 "^reps effect power target runs\n5 1 0\\.2211398[0-9]* NaN 15\n$"
+    power gff --levels 3 --reps 5 --effect 1)
+run(2 "^$" power factorial --factors 4 --runs 16 --blocks 16 --reps 1 --center-points 0 --effect 1)
+run(2 "^$" power factorial --factors 3 --runs 8 --reps 1 --effect 1)
+run(2 "^$" power gff --levels 3,1 --reps 5 --effect 1)
+run(2 "^$" power tost --lower -1 --upper 1 --n 10 --power 0.9 --paired --one-sample)
+
+# sort: stable multi-key order (first key most significant, minus descending);
+# ties on every key keep their input order; a header stays on top.
+file(WRITE ${WORK}/qelcalc_sort.csv "a,b,c\n1,2,3\n2,1,9\n1,1,5\n2,1,7\n1,2,3.0\n")
+run(0 "^a,b,c\n1,1,5\n1,2,3\n1,2,3\\.0\n2,1,9\n2,1,7\n$" sort ${WORK}/qelcalc_sort.csv --by 1,-3)
+run(0 "^a,b,c\n2,1,9\n1,1,5\n2,1,7\n1,2,3\n1,2,3\\.0\n$" sort ${WORK}/qelcalc_sort.csv --by 2)
+run(2 "^$" sort ${WORK}/qelcalc_sort.csv --by 5)
+run(2 "^$" sort ${WORK}/qelcalc_sort.csv --by 0)

@@ -16,7 +16,9 @@
 #include <vector>
 
 #include "basic_statistics/Power.h"
+#include "basic_statistics/PowerTOST.h"
 #include "cli.h"
+#include "power_factorial_mode.h"
 #include "test_input.h"
 #include "utilities/LYNBasicTypes.h"
 
@@ -61,12 +63,14 @@ bool allowed(const std::string& design, const std::string& name) {
   if (design == "variance") return name == "method" || name == "kurtosis";
   if (design == "poisson") return name == "rate" || name == "length";
   if (design == "welch") return name == "sd1" || name == "sd2";
+  if (design == "tost") return name == "sigma" || name == "lower" || name == "upper";
   return false;
 }
 
 struct Request {
   std::string design;
   bool hasN, hasEffect, hasPower, twoSample, ratioOfSigmas, extents;
+  bool ratio, paired, oneSample;
   double level;
   qel::EAlternative alternative;
 };
@@ -204,6 +208,26 @@ void runWelch(const Request& r, const Arguments& args, std::ostream& out) {
   }
 }
 
+// Equivalence by two one-sided tests: the interval (--lower, --upper) holds
+// differences of means, or ratios of means with --ratio (worked in logs).
+// Limits that are missing, unordered or (as ratios) not positive give NaN
+// rows, as the command does.
+void runTOST(const Request& r, const Arguments& args, std::ostream& out) {
+  if (!args.options.count("lower") || !args.options.count("upper"))
+    throw UsageError("power tost needs --lower and --upper");
+  qel::CmCmndPowerTOST c;
+  setUp(c, r, args);
+  const double sigma = numberOption(args, "sigma", 1.0);
+  if (!(sigma > 0.0) || !std::isfinite(sigma)) throw UsageError("--sigma must be positive");
+  c.mSetSigma(sigma);
+  c.mSetRatio(r.ratio);
+  c.mSetLimits(numberOption(args, "lower", 0.0), numberOption(args, "upper", 0.0));
+  c.mSetTestType(r.paired      ? qel::kTOSTPaired
+                 : r.oneSample ? qel::kTOSTOneSample
+                               : qel::kTOSTTwoSample);
+  finish(c, r, out);
+}
+
 }  // namespace
 
 void printPowerUsage(std::ostream& out) {
@@ -215,20 +239,33 @@ void printPowerUsage(std::ostream& out) {
          "                [--method chisq|bonett|levene] [--kurtosis K] [--ratio-sd] "
          "(variance)\n"
          "                [--sd1 S1] [--sd2 S2] (welch, n in each sample)  [--extents]\n"
+         "  qelcalc power tost --lower L --upper U [--ratio] [--paired|--one-sample] [--sigma S]\n"
+         "                two of --n L --effect L --power L  [--alpha] [--alternative]\n"
+         "    Equivalence by two one-sided tests on the interval (L, U) of differences (of\n"
+         "    ratios with --ratio); a solved difference comes with its mirror in the centre,\n"
+         "    and a target above the peak power gives one NaN row; n 999999: not reached.\n"
          "    Lists are comma-separated. Solves the missing one of sample size, effect and\n"
          "    power for every pair; writes \"n effect power target\" rows (NaN where none).\n"
          "    Effects: a difference of means (t, z, paired, welch), of proportions from the\n"
          "    null, of rates from --rate, or a ratio of variances (of sds with --ratio-sd);\n"
          "    solved effects of prop and poisson are written as proportions and rates.\n";
+  printFactorialPowerUsage(out);
 }
 
 int runPowerMode(int argc, char** argv, std::ostream& out) {
-  const Arguments args = parseArguments(argc, argv, 2, {"two-sample", "ratio-sd", "extents"});
+  if (argc > 2 && isFactorialPowerDesign(argv[2])) {
+    std::ostringstream rows;
+    runFactorialPowerMode(argc, argv, rows);
+    out << rows.str();
+    return 0;
+  }
+  const Arguments args = parseArguments(
+      argc, argv, 2, {"two-sample", "ratio-sd", "extents", "ratio", "paired", "one-sample"});
   if (args.positional.size() != 1) throw UsageError("power takes one design (see --help)");
   Request r;
   r.design = args.positional[0];
   const std::vector<std::string> designs = {"t",        "z",       "paired", "prop",
-                                            "variance", "poisson", "welch"};
+                                            "variance", "poisson", "welch",  "tost"};
   bool known = false;
   for (const auto& d : designs) known = known || d == r.design;
   if (!known) throw UsageError("unknown power design '" + r.design + "'");
@@ -243,6 +280,12 @@ int runPowerMode(int argc, char** argv, std::ostream& out) {
   r.twoSample = hasFlag("two-sample");
   r.ratioOfSigmas = hasFlag("ratio-sd");
   r.extents = hasFlag("extents");
+  r.ratio = hasFlag("ratio");
+  r.paired = hasFlag("paired");
+  r.oneSample = hasFlag("one-sample");
+  if ((r.ratio || r.paired || r.oneSample) && r.design != "tost")
+    throw UsageError("--ratio, --paired and --one-sample are for tost");
+  if (r.paired && r.oneSample) throw UsageError("give one of --paired and --one-sample");
   if (r.ratioOfSigmas && r.design != "variance") throw UsageError("--ratio-sd is for variance");
   if (r.twoSample && (r.design == "paired" || r.design == "welch"))
     throw UsageError("--two-sample does not apply to " + r.design);
@@ -266,6 +309,9 @@ int runPowerMode(int argc, char** argv, std::ostream& out) {
     runPoisson(r, args, rows);
   } else if (r.design == "welch") {
     runWelch(r, args, rows);
+  } else if (r.design == "tost") {
+    if (r.twoSample) throw UsageError("tost is two-sample unless --paired or --one-sample");
+    runTOST(r, args, rows);
   } else {
     runT(r, args, rows);
   }
