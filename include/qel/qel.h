@@ -16,5 +16,7 @@
 #include <qel/random.h>
 #include <qel/sampler.h>
 #include <qel/summaries.h>
+#include <qel/tabular_gof.h>
+#include <qel/axis_ticks.h>
 
 #endif
