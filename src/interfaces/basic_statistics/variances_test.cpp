@@ -125,8 +125,8 @@ double pairStandardError(VariancesTestSample const& a, VariancesTestSample const
   const double ni = a.n, nj = b.n;
   const bool pi = a.variance > 0.0, pj = b.variance > 0.0;
   if (pi && pj) {
-    const double g = (ni + nj) * (ni - 1.0 + nj - 1.0) / ((ni - 1.0) * (nj - 1.0)) *
-                     pooledKurtosisTerm(a, b);
+    const double g =
+        (ni + nj) * (ni - 1.0 + nj - 1.0) / ((ni - 1.0) * (nj - 1.0)) * pooledKurtosisTerm(a, b);
     const double d = g - ((ni - 3.0) / ni / (ni - 1.0) + (nj - 3.0) / nj / (nj - 1.0));
     return d >= 0.0 ? std::sqrt(d) : kNaN;
   }
@@ -304,8 +304,8 @@ double PerformMCTwoSample(VariancesTest* test, double confidence) {
     } else {
       auto side = [&](double n1, double n2, double ratio) {
         const double z = orNaN(SolvePValueEquation(n1, n2, ratio, 1.0, se));
-        if (!std::isnan(z)) return std::isinf(z) ? (z > 0 ? 0.0 : 1.0)
-                                                 : NormalCdf(z, 0.0, 1.0, true);
+        if (!std::isnan(z))
+          return std::isinf(z) ? (z > 0 ? 0.0 : 1.0) : NormalCdf(z, 0.0, 1.0, true);
         const double top = mPValueEquationBranchTop(n1, n2, se);
         if (n1 < n2 && CmTwoSamplePValueFunction(n1, n2, se, ratio, 1.0)(top) > 0.0)
           return NormalCdf(top, 0.0, 1.0, true);
@@ -348,8 +348,7 @@ int PerformMultipleLevene(VariancesTest* test) {
     double** design = v1::experimental::MakeDesignMatrix(sizes.data(), k, &status);
     if (!design) return status;
     const int code = v1::experimental::PerformLeveneMethod(
-        design, static_cast<unsigned>(N), k, y.data(), &test->leveneStatistic,
-        &test->levenePValue);
+        design, static_cast<unsigned>(N), k, y.data(), &test->leveneStatistic, &test->levenePValue);
     v1::experimental::DeleteAugmentedDesignMatrix(&design, k + 1);
     return code;
   } catch (const std::bad_alloc&) {
@@ -366,9 +365,9 @@ int runGeneral(VariancesTest* test, double confidence) {
   int code = qelOk;
   for (unsigned i = 0; i < k; ++i) {
     s[i].thirdWorkValue = s[i].variance;
-    const int c = PerformBonettMethod(&s[i].lowerLimit, &s[i].upperLimit, &s[i].thirdWorkValue,
-                                      test->individualConfidence, s[i].data, s[i].n,
-                                      kIntervalTwoSided);
+    const int c =
+        PerformBonettMethod(&s[i].lowerLimit, &s[i].upperLimit, &s[i].thirdWorkValue,
+                            test->individualConfidence, s[i].data, s[i].n, kIntervalTwoSided);
     code = std::max(code, c);
   }
   double z = kNaN;
