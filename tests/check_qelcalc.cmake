@@ -347,3 +347,15 @@ run(0 "^cdf 2\\.08848758376254[0-9]*e-45\n$" range cdf 20 --k 2 --upper)
 run(0 "^inv 3\\.314493[0-9]*\n$" range inv 0.95 --k 3)
 run(2 "^$" range cdf 1 --k 1)
 run(2 "^$" range inv 0.95 --k 3 --upper)
+
+# test variances: the groups of the other group tests; --normal gives
+# Bartlett's test (F for two groups) without Levene's fields.
+run(0 "^method multiple-comparisons\nlevene_statistic [0-9.]+\nlevene_p 0\\.[0-9]+\nstatistic NaN\np [0-9.e-]+\nindividual_confidence 0\\.98333[0-9]*\ngroups 3\n"
+    test variances ${WORK}/qelcalc_groups.csv)
+run(0 "^method Bartlett\nlevene_statistic NaN\nlevene_p NaN\nstatistic [0-9.]+\np 0\\.[0-9]+\n"
+    test variances ${WORK}/qelcalc_groups.csv --normal)
+run(0 "^method F\nlevene_statistic NaN\nlevene_p NaN\nstatistic [0-9.]+\np [0-9.e-]+\nindividual_confidence 0\\.9[45][0-9]*\n" test variances ${WORK}/qelcalc_groups.csv
+    --columns 1,2 --normal --confidence 0.9)
+run(2 "^$" test variances ${WORK}/qelcalc_groups.csv --confidence 1)
+run(2 "^$" test variances ${WORK}/qelcalc_groups.csv --columns 2)
+run(2 "^$" test variances ${WORK}/qelcalc_groups.csv --upper)
