@@ -30,6 +30,10 @@ CASES = {
     # unequal sizes: the lower-limit equation of each pair, both ways
     "mixed5": [[1.5, 2.25, 3.0, 6.5, 4.0], [2.0, 9.0, 3.5, 1.0], [10.0, 11.0, 10.5, 12.0, 10.25],
                [0.5, 8.0, 4.0, 2.0], [3.0, 1.0, 4.0, 1.5, 5.0]],
+    # a wide small sample against a tight larger one: 1 lies below every
+    # lower limit of their ratio, and the branch top bounds the quantile
+    "wide3": [[0.0, 50.0, 100.0, 150.0], [1.0, 1.1, 1.2, 1.05, 1.15], [2.0, 3.0, 4.0, 5.0, 6.0]],
+    "two_wide": [[0.0, 50.0, 100.0, 150.0], [1.0, 1.1, 1.2, 1.05, 1.15]],
     # a constant sample: finite V through the zero-variance cases
     "zero3": [[1.5, 2.25, 3.0, 6.5, 4.0], [7.0, 7.0, 7.0, 7.0, 7.0], [2.0, 9.0, 3.5, 1.0, 7.25]],
     # two samples: Bonett's two-sided test on V_1 + V_2

@@ -89,6 +89,18 @@ double rangeUpperTail(double z, unsigned k) {
   }
 }
 
+// The quantile at which Bonett's lower limit of the variance ratio r of
+// sizes n1, n2 meets 1. When 1 lies below every lower limit (possible for
+// n1 < n2) there is no root; the top of the falling branch then bounds the
+// quantile from below, as in the two-sample test, rather than leaving the
+// pair without evidence.
+double lowerLimitQuantile(double n1, double n2, double r, double se) {
+  const double z = orNaN(SolvePValueEquation(n1, n2, r, 1.0, se));
+  if (!std::isnan(z) || !(n1 < n2) || !positiveFinite(se)) return z;
+  const double top = mPValueEquationBranchTop(n1, n2, se);
+  return CmTwoSamplePValueFunction(n1, n2, se, r, 1.0)(top) > 0.0 ? top : kNaN;
+}
+
 // Multiple comparison limits of each variance, n > z required.
 void comparisonLimits(VariancesTest* test, double z) {
   VariancesTestSample* s = test->samples;
@@ -285,8 +297,8 @@ void CalcPForMulSample(VariancesTest* test) {
           const double z = kSqrt2 * std::fabs(std::log(r)) / se;
           p1 = p2 = rangeUpperTail(z, k);
         } else {
-          const double z1 = orNaN(SolvePValueEquation(s[i].n, s[j].n, r, 1.0, se)) * kSqrt2;
-          const double z2 = orNaN(SolvePValueEquation(s[j].n, s[i].n, 1.0 / r, 1.0, se)) * kSqrt2;
+          const double z1 = lowerLimitQuantile(s[i].n, s[j].n, r, se) * kSqrt2;
+          const double z2 = lowerLimitQuantile(s[j].n, s[i].n, 1.0 / r, se) * kSqrt2;
           p1 = rangeUpperTail(z1, k);
           p2 = rangeUpperTail(z2, k);
         }
@@ -315,13 +327,9 @@ double PerformMCTwoSample(VariancesTest* test, double confidence) {
       p = std::min(1.0, 2.0 * NormalCdf(std::fabs(std::log(r)) / se, 0.0, 1.0, true));
     } else {
       auto side = [&](double n1, double n2, double ratio) {
-        const double z = orNaN(SolvePValueEquation(n1, n2, ratio, 1.0, se));
-        if (!std::isnan(z))
-          return std::isinf(z) ? (z > 0 ? 0.0 : 1.0) : NormalCdf(z, 0.0, 1.0, true);
-        const double top = mPValueEquationBranchTop(n1, n2, se);
-        if (n1 < n2 && CmTwoSamplePValueFunction(n1, n2, se, ratio, 1.0)(top) > 0.0)
-          return NormalCdf(top, 0.0, 1.0, true);
-        return 1.0;
+        const double z = lowerLimitQuantile(n1, n2, ratio, se);
+        if (std::isnan(z)) return 1.0;
+        return std::isinf(z) ? (z > 0.0 ? 0.0 : 1.0) : NormalCdf(z, 0.0, 1.0, true);
       };
       p = std::min(1.0, 2.0 * std::min(side(s[0].n, s[1].n, r), side(s[1].n, s[0].n, 1.0 / r)));
     }
