@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "interfaces/basic_statistics/variances_test.h"
 #include "reference_data.h"
 
 namespace {
@@ -65,8 +66,16 @@ TEST(VariancesMultiTest, MatchesR) {
       EXPECT_LT(relativeError(normal.test.mainStatistic, v[1]), 1e-11);
       EXPECT_LT(relativeError(normal.test.mainPValue, v[2]), 1e-9);
       EXPECT_TRUE(std::isnan(normal.test.leveneStatistic) && std::isnan(normal.test.levenePValue));
-      const Outcome general = run(xs, 0.95, false);
-      ASSERT_EQ(general.code, 0);
+      // Levene's step alone for many samples: the k(k-1)/2 comparisons of
+      // the general form are checked below on smaller k.
+      Outcome general = normal;
+      if (k < 130) {
+        general = run(xs, 0.95, false);
+        ASSERT_EQ(general.code, 0);
+      } else {
+        general.test.samples = general.samples.data();
+        ASSERT_EQ(qel::v0::PerformMultipleLevene(&general.test), 0);
+      }
       EXPECT_LT(relativeError(general.test.leveneStatistic, v[3]), 1e-11);
       EXPECT_LT(relativeError(general.test.levenePValue, v[4]), 1e-9);
     } else {
