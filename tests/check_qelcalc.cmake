@@ -375,3 +375,15 @@ run(0 "^a,b,c\n1,1,5\n1,2,3\n1,2,3\\.0\n2,1,9\n2,1,7\n$" sort ${WORK}/qelcalc_so
 run(0 "^a,b,c\n2,1,9\n1,1,5\n2,1,7\n1,2,3\n1,2,3\\.0\n$" sort ${WORK}/qelcalc_sort.csv --by 2)
 run(2 "^$" sort ${WORK}/qelcalc_sort.csv --by 5)
 run(2 "^$" sort ${WORK}/qelcalc_sort.csv --by 0)
+
+# test variances: the groups of the other group tests; --normal gives
+# Bartlett's test (F for two groups) without Levene's fields.
+run(0 "^method multiple-comparisons\nlevene_statistic [0-9.]+\nlevene_p 0\\.[0-9]+\nstatistic NaN\np [0-9.e-]+\nindividual_confidence 0\\.98333[0-9]*\ngroups 3\n"
+    test variances ${WORK}/qelcalc_groups.csv)
+run(0 "^method Bartlett\nlevene_statistic NaN\nlevene_p NaN\nstatistic [0-9.]+\np 0\\.[0-9]+\n"
+    test variances ${WORK}/qelcalc_groups.csv --normal)
+run(0 "^method F\nlevene_statistic NaN\nlevene_p NaN\nstatistic [0-9.]+\np [0-9.e-]+\nindividual_confidence 0\\.9[45][0-9]*\n" test variances ${WORK}/qelcalc_groups.csv
+    --columns 1,2 --normal --confidence 0.9)
+run(2 "^$" test variances ${WORK}/qelcalc_groups.csv --confidence 1)
+run(2 "^$" test variances ${WORK}/qelcalc_groups.csv --columns 2)
+run(2 "^$" test variances ${WORK}/qelcalc_groups.csv --upper)

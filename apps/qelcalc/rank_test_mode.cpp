@@ -6,7 +6,9 @@
 
 #include <qel/rank_tests.h>
 #include <qel/sign_tests.h>
+#include <qel/variances_test.h>
 
+#include <algorithm>
 #include <cmath>
 #include <limits>
 #include <map>
@@ -478,11 +480,52 @@ int runFriedman(const Arguments& args, std::ostream& out) {
   return 0;
 }
 
+// Equality of the variances of k groups: Bartlett's test (F for two groups)
+// with --normal, otherwise the multiple comparison test and Levene's test.
+int runVariances(const Arguments& args, std::ostream& out) {
+  std::set<std::string> allowed = kGroupOptions;
+  allowed.insert("confidence");
+  checkOptions(args, "variances", allowed, {"normal"});
+  const Groups groups = gatherGroups(args, false);
+  requireGroupCount(groups, "variances", false);
+  const double confidence = numberOption(args, "confidence", 0.95);
+  if (!(confidence > 0.0 && confidence < 1.0)) {
+    throw UsageError("--confidence must lie strictly between 0 and 1");
+  }
+  const bool normal = std::find(args.flags.begin(), args.flags.end(), "normal") != args.flags.end();
+  std::vector<qel::v0::VariancesTestSample> records(groups.samples.size());
+  for (std::size_t g = 0; g < records.size(); ++g) {
+    records[g].data = groups.samples[g].data();
+    records[g].n = static_cast<unsigned int>(groups.samples[g].size());
+  }
+  qel::v0::VariancesTest r;
+  r.samples = records.data();
+  r.k = static_cast<unsigned int>(records.size());
+  checkCode(qel::v0::RunVariancesTest(&r, confidence, normal));
+  out << "method " << (normal ? (r.k == 2 ? "F" : "Bartlett") : "multiple-comparisons") << "\n";
+  writeField(out, "levene_statistic", r.leveneStatistic);
+  writeField(out, "levene_p", r.levenePValue);
+  writeField(out, "statistic", r.mainStatistic);
+  writeField(out, "p", r.mainPValue);
+  writeField(out, "individual_confidence", r.individualConfidence);
+  out << "groups " << r.k << "\n";
+  for (std::size_t g = 0; g < records.size(); ++g) {
+    const std::string prefix = groupName(g);
+    out << prefix << "label " << groups.labels[g] << "\n" << prefix << "n " << records[g].n << "\n";
+    writeField(out, prefix + "variance", records[g].variance);
+    writeField(out, prefix + "lower", records[g].lowerLimit);
+    writeField(out, prefix + "upper", records[g].upperLimit);
+    writeField(out, prefix + "mc_lower", records[g].thirdWorkValue);
+    writeField(out, prefix + "mc_upper", records[g].fourthWorkValue);
+  }
+  return 0;
+}
+
 }  // namespace
 
 bool isRankTest(const std::string& name) {
   return name == "sign" || name == "wilcoxon" || name == "runs" || name == "mann-whitney" ||
-         name == "kruskal-wallis" || name == "mood" || name == "friedman";
+         name == "kruskal-wallis" || name == "mood" || name == "friedman" || name == "variances";
 }
 
 int runRankTest(const Arguments& args, std::ostream& out) {
@@ -493,6 +536,7 @@ int runRankTest(const Arguments& args, std::ostream& out) {
   if (name == "mann-whitney") return runMannWhitney(args, out);
   if (name == "kruskal-wallis") return runKruskalWallis(args, out);
   if (name == "mood") return runMood(args, out);
+  if (name == "variances") return runVariances(args, out);
   return runFriedman(args, out);
 }
 
@@ -511,6 +555,12 @@ void printRankTestUsage(std::ostream& out) {
          "    Groups are several files (column C of each), columns of one table (default:\n"
          "    columns 1 and 2 for mann-whitney, every column otherwise), or the values of\n"
          "    column V split by the labels of column G.\n"
+         "  qelcalc test variances FILE|- [FILE2 ...] [group options as above]\n"
+         "                [--normal] [--confidence 0.95]\n"
+         "    Equal variances of k groups: with --normal Bartlett's test (F for two groups)\n"
+         "    and chi-square limits; otherwise a multiple comparison test on Bonett's\n"
+         "    method with Levene's test (medians). Limits of each variance at the\n"
+         "    confidence 1 - (1 - C)/k; mc_lower/mc_upper: the comparison limits.\n"
          "  qelcalc test friedman FILE|- [--columns C1,C2,...]\n"
          "    Friedman test of a blocks x treatments table: one row a block, one column a\n"
          "    treatment (default every column).\n";

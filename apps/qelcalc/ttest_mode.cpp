@@ -161,7 +161,7 @@ void printTestUsage(std::ostream& out) {
 }
 
 int runTestMode(int argc, char** argv, std::ostream& out) {
-  const Arguments args = parseArguments(argc, argv, 2, {"pooled", "approximate", "levene"});
+  const Arguments args = parseArguments(argc, argv, 2, {"pooled", "approximate", "levene", "normal"});
   if (args.positional.empty()) throw UsageError("test takes a test name and a data file");
   const std::string& name = args.positional[0];
   if (isRankTest(name)) return runRankTest(args, out);

@@ -17,6 +17,7 @@
 #include <qel/sampler.h>
 #include <qel/summaries.h>
 #include <qel/tabular_gof.h>
+#include <qel/variances_test.h>
 #include <qel/axis_ticks.h>
 
 #endif
