@@ -181,23 +181,10 @@ TEST(ExportedFamilies, DoublePrecisionFromBodyToFarTails) {
 TEST(ExportedFamilies, ArrayFormsRepeatTheScalarForms) {
   const std::vector<double> x = {-2.0, 0.0, 0.3, 1.0, 2.5, 7.0, 1.23456e30};
   const std::vector<double> p = {0.0, 1e-6, 0.25, 0.5, 0.9, 1.0};
-  const std::map<std::string, std::vector<double>> parameters = {
-      {"Normal", {0.5, 2.0}},
-      {"LogNormal", {0.5, 0.75, 1.0}},
-      {"HalfNormal", {2.0, -1.0}},
-      {"Exponential", {3.0, 0.5}},
-      {"Weibull", {1.7, 2.5, -1.0}},
-      {"LargestExtremeValue", {1.0, 2.0}},
-      {"SmallestExtremeValue", {1.0, 2.0}},
-      {"Laplace", {-2.0, 0.5}},
-      {"Gamma", {2.5, 1.5, 1.0}},
-      {"Beta", {2.0, 5.0}},
-      {"Lambda", {0.14, 1.0, 2.0}},
-      {"Poisson", {3.5}},
-      {"NegBinomial", {0.4, 3.0}},
-      {"Geometric", {0.25}},
-      {"Hypergeometric", {40.0, 15.0, 10.0}},
-      {"IntegerUniform", {-2.0, 7.0}}};
+  // The parameters of each family's first reference row.
+  std::map<std::string, std::vector<double>> parameters;
+  for (const auto& row : qeltest::loadReferenceData("exported_families.csv", 2))
+    parameters.emplace(row.text[0], std::vector<double>(&row.numbers[1], &row.numbers[4]));
   for (const auto& family : exported()) {
     SCOPED_TRACE(family.first);
     const double* params = parameters.at(family.first).data();
