@@ -9,7 +9,6 @@
 
 #include <algorithm>
 #include <cmath>
-#include <cstdio>
 #include <set>
 #include <string>
 
@@ -34,20 +33,18 @@ int run(const std::string& call, double a0, double a1, double a2, double a3, dou
 }
 
 // A discrete quantile: status 0, k exact, and the fraction's error times the
-// mass at k over p (weight) within the tolerance. Returns that error.
-double checkDiscrete(int status, const double* o, double k, double f, double weight,
-                     const std::string& where, double tol = kTolerance) {
+// mass at k over p (weight) within the tolerance.
+void checkDiscrete(int status, const double* o, double k, double f, double weight,
+                   const std::string& where, double tol = kTolerance) {
   EXPECT_EQ(status, 0) << where;
   EXPECT_EQ(o[0], k) << where;
   EXPECT_GE(o[1], 0.0) << where;
   EXPECT_LT(o[1], 1.0) << where;
-  const double e = std::fabs(o[1] - f) * weight;
-  EXPECT_LE(e, tol) << where << ": fraction " << o[1] << " vs " << f;
-  return e;
+  EXPECT_LE(std::fabs(o[1] - f) * weight, tol) << where << ": fraction " << o[1] << " vs " << f;
 }
 
 TEST(ElvQuantiles, NormalAllThreeForms) {
-  double worst = 0.0, o[3];
+  double o[3];
   for (const auto& row : loadReferenceData("elv_normal_quantiles.csv", 0)) {
     const double p = row.numbers[0], z = row.numbers[1];
     const std::string where = at(row, "elv_normal_quantiles.csv");
@@ -55,7 +52,6 @@ TEST(ElvQuantiles, NormalAllThreeForms) {
     const double tol = 1e-9 * std::max(1.0, std::fabs(z));
     ASSERT_LE(run("normal_upper_quant", p, 0, 0, 0, o, where), 1);
     EXPECT_NEAR(o[0], z, tol) << where;
-    if (z != 0.0) worst = std::max(worst, relativeError(o[0], z));
     ASSERT_LE(run("normal_lower_quant", p, 0, 0, 0, o, where), 1);
     EXPECT_NEAR(o[0], -z, tol) << where;
     ASSERT_LE(run("inv_normal_df", p, 0, 0, 0, o, where), 1);
@@ -67,11 +63,10 @@ TEST(ElvQuantiles, NormalAllThreeForms) {
       EXPECT_NEAR(o[0], z, 1e-9 * std::max(1.0, z) + 1e-16 / (p * std::max(z, 1.0))) << where;
     }
   }
-  std::printf("[ accuracy ] normal quantile largest relative error %.3g\n", worst);
 }
 
 TEST(ElvQuantiles, GammaAndChiSquare) {
-  double worst = 0.0, worstCornishFisher = 0.0, o[3];
+  double o[3];
   int rows = 0;
   for (const auto& row : loadReferenceData("elv_quantiles.csv", 1)) {
     const std::string& kind = row.text[0];
@@ -92,20 +87,16 @@ TEST(ElvQuantiles, GammaAndChiSquare) {
         continue;
       }
       ASSERT_EQ(status, 0) << where;
-      const double e = relativeError(o[0], scale * q) * sensitivity;
       // Beyond a shape of 10000 Cornish-Fisher stands without Newton steps.
-      EXPECT_LE(e, a > 10000.0 ? 1e-8 : kTolerance) << where << ": " << o[0] << " vs " << q;
-      double& slot = a > 10000.0 ? worstCornishFisher : worst;
-      slot = std::max(slot, e);
+      EXPECT_LE(relativeError(o[0], scale * q) * sensitivity, a > 10000.0 ? 1e-8 : kTolerance)
+          << where << ": " << o[0] << " vs " << q;
     }
   }
   EXPECT_GT(rows, 200);
-  std::printf("[ accuracy ] gamma/chi2 quantiles %.3g (Cornish-Fisher alone %.3g)\n", worst,
-              worstCornishFisher);
 }
 
 TEST(ElvQuantiles, BetaReachesEveryRegion) {
-  double worst = 0.0, o[3];
+  double o[3];
   std::set<long long> methods;
   for (const auto& row : loadReferenceData("elv_beta_quant.csv", 1)) {
     const std::string where = at(row, "elv_beta_quant.csv");
@@ -128,9 +119,7 @@ TEST(ElvQuantiles, BetaReachesEveryRegion) {
     const bool approximate = ELVmethod == 71 || ELVmethod == 72;
     EXPECT_LE(e, approximate ? 1e-3 : kTolerance)
         << where << " method " << ELVmethod << ": " << q << " vs " << x;
-    if (!approximate) worst = std::max(worst, e);
   }
-  std::printf("[ accuracy ] beta quantiles (probability) %.3g\n", worst);
   for (long long m :
        {11, 12, 20, 31, 32, 33, 41, 42, 43, 44, 51, 52, 61, 62, 71, 72, 81, 82, 83, 91, 92, 93}) {
     EXPECT_TRUE(methods.count(m)) << "region " << m << " not reached";
@@ -138,7 +127,7 @@ TEST(ElvQuantiles, BetaReachesEveryRegion) {
 }
 
 TEST(ElvQuantiles, F) {
-  double worst = 0.0, o[3];
+  double o[3];
   for (const auto& row : loadReferenceData("elv_F_quant.csv", 1)) {
     const std::string where = at(row, "elv_F_quant.csv");
     const double reference = row.numbers[3];
@@ -153,13 +142,11 @@ TEST(ElvQuantiles, F) {
     const double e = std::fabs(o[0] - reference) * row.numbers[4];
     const bool approximate = ELVmethod == 71 || ELVmethod == 72;
     EXPECT_LE(e, approximate ? 1e-3 : kTolerance) << where << ": " << o[0] << " vs " << reference;
-    if (!approximate) worst = std::max(worst, e);
   }
-  std::printf("[ accuracy ] F quantiles (probability) %.3g\n", worst);
 }
 
 TEST(ElvQuantiles, PoissonBinomialAndHypergeometric) {
-  double worst[3] = {0, 0, 0}, o[3];
+  double o[3];
   int rows[3] = {0, 0, 0};
   for (const auto& row : loadReferenceData("elv_quantiles.csv", 1)) {
     const std::string& kind = row.text[0];
@@ -167,7 +154,7 @@ TEST(ElvQuantiles, PoissonBinomialAndHypergeometric) {
     const std::string where = at(row, "elv_quantiles.csv");
     const auto& v = row.numbers;  // p, m, k, mass/p, f
     const int status = run(kind + "_quant", v[0], v[1], 0, 0, o, where);
-    worst[0] = std::max(worst[0], checkDiscrete(status, o, v[2], v[4], v[3], where));
+    checkDiscrete(status, o, v[2], v[4], v[3], where);
     ++rows[0];
   }
   for (const auto& row : loadReferenceData("elv_binomial_quant.csv", 1)) {
@@ -175,7 +162,7 @@ TEST(ElvQuantiles, PoissonBinomialAndHypergeometric) {
     if (v[2] == 0.0 || v[2] == 1.0) continue;
     const std::string where = at(row, "elv_binomial_quant.csv");
     const int status = run("binomial_" + row.text[0] + "_quant", v[1], v[0], v[2], 0, o, where);
-    worst[1] = std::max(worst[1], checkDiscrete(status, o, v[3], v[4], v[5] / v[0], where));
+    checkDiscrete(status, o, v[3], v[4], v[5] / v[0], where);
     ++rows[1];
   }
   for (const auto& row : loadReferenceData("elv_hypergeo_quantiles.csv", 0)) {
@@ -187,18 +174,13 @@ TEST(ElvQuantiles, PoissonBinomialAndHypergeometric) {
       double m[3];
       run("hypergeo_df", o[0], v[1], v[2], v[3], m, where);
       // f is p minus a tail over the mass at k: the tails' 1e-8 over p.
-      const double e =
-          checkDiscrete(status, o, v[4 + 2 * upper], v[5 + 2 * upper], m[2] / v[0], where, 1e-8);
-      worst[2] = std::max(worst[2], e);
+      checkDiscrete(status, o, v[4 + 2 * upper], v[5 + 2 * upper], m[2] / v[0], where, 1e-8);
     }
     ++rows[2];
   }
   EXPECT_GT(rows[0], 100);
   EXPECT_GT(rows[1], 50);
-  std::printf(
-      "[ accuracy ] discrete quantile fractions (relative to p): Poisson %.3g, binomial %.3g, "
-      "hypergeometric %.3g\n",
-      worst[0], worst[1], worst[2]);
+  EXPECT_GT(rows[2], 20);
 }
 
 }  // namespace

@@ -48,12 +48,6 @@ unsigned size(const std::vector<double>& x) {
   return static_cast<unsigned>(x.size());
 }
 
-// The running mean of terms of size near n, and the final -(S + n), cost
-// digits as n grows; the normal distribution function brings its own error.
-double statisticTolerance(unsigned) {
-  return 2e-10;
-}
-
 // The statistic of each family, its parameters in front of the reference
 // value in the row.
 using ADTest = int (*)(double const*, double const*, double*, double*, unsigned);
@@ -66,15 +60,24 @@ const std::map<std::string, std::pair<ADTest, int>> kADTests = {
     {"ad_exponential", {exponentialAD, 1}},
     {"ad_weibull", {qel::v0::RunLynWeibullADTest, 2}}};
 
+// The statistic to 2e-10 (the running mean of terms near n and the final
+// -(S + n) cost digits; the normal distribution function brings its own
+// error). The bimodal sample's statistics lie beyond the approximations: the
+// P-value is the bound of the last piece, with its warning.
 TEST(AndersonDarling, StatisticAgainstTheDefiningSum) {
   int checked = 0;
+  const std::map<std::string, double> bounds = {{"ad_normal", 0.005}, {"ad_weibull", 0.01}};
   for (const auto& [quantity, test] : kADTests) {
     for (const auto& row : rows(quantity)) {
       const auto& x = sample(row);
       double a2 = 0, p = 0;
-      test.first(x.data(), row.numbers.data(), &a2, &p, size(x));
-      EXPECT_LE(relativeError(a2, row.numbers[test.second]), statisticTolerance(size(x)))
+      const int code = test.first(x.data(), row.numbers.data(), &a2, &p, size(x));
+      EXPECT_LE(relativeError(a2, row.numbers[test.second]), 2e-10)
           << quantity << " " << row.text[0];
+      if (row.text[0] == "bimodal") {
+        EXPECT_EQ(code, qel::qelWarnADPValueUpperBound) << quantity;
+        EXPECT_EQ(p, bounds.at(quantity));
+      }
       ++checked;
     }
   }
@@ -82,21 +85,6 @@ TEST(AndersonDarling, StatisticAgainstTheDefiningSum) {
 }
 
 TEST(AndersonDarling, LargeStatisticsGiveBounds) {
-  const auto& x = samples().at("bimodal");
-  for (const auto& row : rows("ad_normal")) {
-    if (row.text[0] != "bimodal") continue;
-    double a2 = 0, p = 0;
-    EXPECT_EQ(qel::v1::RunLynNormalADTest(x.data(), row.numbers.data(), &a2, &p, size(x)),
-              qel::qelWarnADPValueUpperBound);
-    EXPECT_EQ(p, 0.005);
-  }
-  for (const auto& row : rows("ad_weibull")) {
-    if (row.text[0] != "bimodal") continue;
-    double a2 = 0, p = 0;
-    EXPECT_EQ(qel::v0::RunLynWeibullADTest(x.data(), row.numbers.data(), &a2, &p, size(x)),
-              qel::qelWarnADPValueUpperBound);
-    EXPECT_EQ(p, 0.01);
-  }
   int status = 0;
   EXPECT_EQ(qel::v1::ExponentialADPValue(50.0, &status, 10), 0.0025);
   EXPECT_EQ(status, qel::qelWarnADPValueUpperBound);

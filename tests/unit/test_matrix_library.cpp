@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <functional>
 #include <limits>
 #include <random>
 #include <sstream>
@@ -119,39 +120,28 @@ TEST(MatrixOperators, ResultKindsAndWords) {
   EXPECT_LE(maxDifference(c, SlowMatrixMultiply(other, other.transpose())), 1e-13);
   EXPECT_NEAR(mQuadraticForm(s, Vec{1, 0, 0, 0, 2}), s(0, 0) + 4 * s(0, 4) + 4 * s(4, 4), 1e-14);
 
-  const Mat wrong(4, 4, 1.0);
-  EXPECT_EQ(failureText([&] { a + DMat(4); }), "matrix addition : row counts are different");
-  EXPECT_EQ(failureText([&] {
-              Mat(5, 4, 0.0).ConvertToSmatrix();
-            }).find("assertion failed: (rows == cols) "),
-            0u);
-  EXPECT_EQ(failureText([&] { u + UMat(3); }),
-            "upper matrix element wise op : row counts are different");
-  EXPECT_EQ(failureText([&] { d - DMat(2); }),
-            "diagonal matrix elementwise op : row counts are different");
-  EXPECT_EQ(failureText([&] {
-              Mat m(5, 4, 0.0);
-              m += d;
-            }),
-            "matrix += diagonal : col counts are different");
-  EXPECT_EQ(failureText([&] { a* wrong; }), "Matrix multiplication: incompatible orders");
-  EXPECT_EQ(failureText([&] { a* Vec(3); }), "matrix and vector must be of same order");
-  EXPECT_EQ(failureText([&] {
-              Mat m(3, 2, 0.0);
-              m += Vec(3);
-            }),
-            "op+= matrix and vector must be of same order");
-  EXPECT_EQ(failureText([&] {
-              Mat m(3, 1, 0.0);
-              m -= Vec(2);
-            }),
-            "op-= matrix and vector must be of same order");
-  EXPECT_EQ(failureText([&] { mQuadraticForm(Mat(2, 3, 0.0), Vec(3)); }),
-            "matrix::quadratic form is only defined for square matrices");
-  EXPECT_EQ(failureText([&] { mQuadraticForm(s, Vec(4)); }),
-            "matrix::matrix and vector have incompatible dimensions");
-  EXPECT_EQ(failureText([&] { DotProduct(a, 0, 1, 6); }),
-            "matrix::number of products greater than dimension");
+  // Shapes that do not fit: the words of each operation (exact, or the
+  // assertion's leading words).
+  Mat m52(5, 4, 0.0), m32(3, 2, 0.0), m31(3, 1, 0.0);
+  const std::vector<std::pair<std::function<void()>, std::string>> failures = {
+      {[&] { a + DMat(4); }, "matrix addition : row counts are different"},
+      {[&] { m52.ConvertToSmatrix(); }, "assertion failed: (rows == cols) "},
+      {[&] { u + UMat(3); }, "upper matrix element wise op : row counts are different"},
+      {[&] { d - DMat(2); }, "diagonal matrix elementwise op : row counts are different"},
+      {[&] { m52 += d; }, "matrix += diagonal : col counts are different"},
+      {[&] { a* Mat(4, 4, 1.0); }, "Matrix multiplication: incompatible orders"},
+      {[&] { a* Vec(3); }, "matrix and vector must be of same order"},
+      {[&] { m32 += Vec(3); }, "op+= matrix and vector must be of same order"},
+      {[&] { m31 -= Vec(2); }, "op-= matrix and vector must be of same order"},
+      {[&] { mQuadraticForm(Mat(2, 3, 0.0), Vec(3)); },
+       "matrix::quadratic form is only defined for square matrices"},
+      {[&] { mQuadraticForm(s, Vec(4)); },
+       "matrix::matrix and vector have incompatible dimensions"},
+      {[&] { DotProduct(a, 0, 1, 6); }, "matrix::number of products greater than dimension"}};
+  for (const auto& [fn, words] : failures) {
+    const std::string text = failureText(fn);
+    EXPECT_TRUE(text == words || (words.back() == ' ' && text.rfind(words, 0) == 0)) << text;
+  }
 }
 
 TEST(MatrixDecompositions, SingularityEdgesAndBadInput) {

@@ -115,48 +115,34 @@ TEST(Rows, RandomOperationsMatchVectorModel) {
   }
 }
 
+// The compressed flag itself (contents after every operation are the model
+// test's): which sets take the compressed form, and equality across forms.
 TEST(Rows, CompressedFormCases) {
   CbRows r;
   r.mInitialize({1, 2, 3});
   EXPECT_TRUE(r.mIsUseAllRows());
   r.mInitialize({1, 3});
   EXPECT_FALSE(r.mIsUseAllRows());
-
   r.mUseAllRows(5);
   r.mSetRow(2, 3);
   EXPECT_TRUE(r.mIsUseAllRows());
-  r.mSetRow(2, 4);
-  EXPECT_EQ(rowsOf(r), (std::vector<int>{1, 2, 4, 4, 5}));
 
-  CbRows pushed;
-  pushed.mPushBack(2);
-  EXPECT_EQ(rowsOf(pushed), std::vector<int>{2});
   CbRows ascending;
   for (int i = 1; i <= 3; ++i) ascending.mPushBack(i);
   EXPECT_TRUE(ascending.mIsUseAllRows());
-  EXPECT_EQ(ascending.mGetRowCt(), 3);
 
-  CbRows a, b;
-  a.mInitialize({1, 2});
-  b.mInitialize({2, 3});
-  EXPECT_EQ(a.mAppendRows(b), 1);
-  EXPECT_EQ(rowsOf(a), (std::vector<int>{1, 2, 3}));
-
-  CbRows twoFive, three;
-  twoFive.mInitialize({2, 5});
+  CbRows list, three;
   three.mUseAllRows(3);
-  EXPECT_EQ(twoFive.mFilterRowsExclude(three), 1);
-  EXPECT_EQ(rowsOf(twoFive), std::vector<int>{5});
-
-  CbRows list;
   list.mInitialize({1, 2, 4});
   list.mSetRow(2, 3);
   EXPECT_TRUE(list == three);
   EXPECT_FALSE(list.mIsUseAllRows());
 
+  CbRows twoFive;
+  twoFive.mInitialize({2, 5});
   std::vector<bool> flags(6, false);
   twoFive.mGetRowFlags(6, flags);
-  EXPECT_EQ(flags, (std::vector<bool>{false, false, false, false, true, false}));
+  EXPECT_EQ(flags, (std::vector<bool>{false, true, false, false, true, false}));
 }
 
 TEST(Rows, MissingValueFilters) {
