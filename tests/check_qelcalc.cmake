@@ -306,3 +306,52 @@ run(0 "${hdr}20 -0\\.(29999999|30000000)[0-9]* 0\\.69[0-9]* NaN\n20 0\\.(2999999
 run(0 "${hdr}10 NaN 0\\.9[0-9]* NaN\n$" power tost --lower -1 --upper 1 --n 10 --power 0.9)
 run(2 "^$" power tost --lower 1 --n 10 --power 0.9)
 run(2 "^$" power tost --lower -1 --upper 1 --n 10 --power 0.9 --paired --one-sample)
+
+# curvefit: a straight line through five points (R: lm(y ~ x)), a fit with
+# no term, and bad input.
+file(WRITE ${WORK}/qelcalc_curvefit.txt "x,y\n1,2.1\n2,3.9\n\n3 6.2\n4\t7.8\n5,10.1\n")
+run(0 "^n 5\ndegree 1\nintercept 0\\.0(49999999999|500000000000)[0-9]*\nx\\^1 1\\.9(8999999999|9000000000)[0-9]*\nresidual_sd 0\\.188856206322[0-9]*\nr_squared 0\\.99730532890097[0-9]*\ncode 0\n$"
+    curvefit ${WORK}/qelcalc_curvefit.txt)
+run(0 "^n 5\ndegree 0\nintercept NaN\nresidual_sd NaN\nr_squared NaN\ncode 30019 [^\n]*\n$"
+    curvefit ${WORK}/qelcalc_curvefit.txt --degree 0 --no-intercept)
+run(0 "^  qelcalc curvefit" curvefit --help)
+run(2 "^$" curvefit ${WORK}/qelcalc_curvefit.txt --degree 1.5)
+run(2 "^$" curvefit ${WORK}/qelcalc_bad.txt)
+# gof and ticks: the chi-square test of counts (R: chisq.test(c(30, 70),
+# p = c(0.2, 0.8)) gives X-squared 6.25, P 0.01241933065155) and an axis.
+file(WRITE ${WORK}/qelcalc_counts.txt "30\n70\n")
+run(0 "^category 1 20 5\ncategory 2 80 1\\.25\nstatistic 6\\.25\ndf 1\np 0\\.0124193306515[0-9]*\n$"
+    gof ${WORK}/qelcalc_counts.txt --proportions 0.2,0.8)
+run(2 "^$" gof ${WORK}/qelcalc_counts.txt --proportions 0.2)
+run(2 "^$" gof ${WORK}/qelcalc_bad.txt)
+run(0 "^first 0\nlast 10\nscale_min -0\\.188\nscale_max 10\\.18[0-9]*\nincrement 2\ncount 6\nticks 0 2 4 6 8 10\n$"
+    ticks 0.3 9.7)
+run(0 "^first -100\nlast 0\n.*count 6\nticks -100 -80 -60 -40 -20 0\n$" ticks -100 1)
+run(0 "^first 1\nlast 9\n" ticks 0.3 9.7 --limits 0.5,100)
+run(2 "^$" ticks 1 2 --limits a,b)
+run(2 "^$" ticks 1 2 --ticks 4)
+run(2 "^$" ticks 1)
+
+# quad and sint: the 4-point Gauss-Legendre rule (published constants), the
+# 3-point Hermite rule (nodes 0 and +-sqrt(3/2)), sign levels for n = 20
+# (tools/reference/gen_sint.py: d 6, levels 0.958610534668, 0.884681701660).
+run(0 "^0\\.861136311594052[0-9]* 0\\.347854845137453[0-9]*\n0\\.339981043584856[0-9]* 0\\.652145154862546[0-9]*\n$"
+    quad legendre 4)
+run(0 "^-1\\.22474487139158[0-9]* 0\\.29540897515091[0-9]*\n0 1\\.18163590060367[0-9]*\n1\\.22474487139158[0-9]* 0\\.29540897515091[0-9]*\n$"
+    quad hermite 3)
+run(0 "^kind 0\nd 6\nlevel_d 0\\.9586105346679[0-9]*\nlevel_d_plus_1 0\\.884681701660[0-9]*\nlambda 0\\.2352342158[0-9]*\n$"
+    sint 20 --confidence 0.95)
+run(2 "^$" quad laguerre 2 --alpha -1)
+run(2 "^$" quad hermite 2 --alpha 1)
+run(2 "^$" quad cheb 3)
+run(2 "^$" quad legendre 0)
+run(2 "^$" sint 20)
+run(2 "^$" sint 20 --confidence 1.5)
+
+# range: R's ptukey(3.5, 3, Inf) = 0.964442958136556, qtukey(0.95, 3, Inf) =
+# 3.31449316; for k = 2, P(R > 20) = erfc(10) = 2.088487583762545e-45.
+run(0 "^cdf 0\\.9644429581[0-9]*\n$" range cdf 3.5 --k 3)
+run(0 "^cdf 2\\.08848758376254[0-9]*e-45\n$" range cdf 20 --k 2 --upper)
+run(0 "^inv 3\\.314493[0-9]*\n$" range inv 0.95 --k 3)
+run(2 "^$" range cdf 1 --k 1)
+run(2 "^$" range inv 0.95 --k 3 --upper)

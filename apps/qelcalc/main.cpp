@@ -7,13 +7,16 @@
 #include <string>
 
 #include "cli.h"
+#include "curvefit_mode.h"
 #include "describe_mode.h"
 #include "distribution_mode.h"
 #include "fit_mode.h"
 #include "matrix_mode.h"
 #include "proportion_variance_mode.h"
 #include "power_mode.h"
+#include "gof_mode.h"
 #include "pvalue_mode.h"
+#include "quad_mode.h"
 #include "rank_test_mode.h"
 #include "sample_mode.h"
 #include "summary_mode.h"
@@ -33,10 +36,16 @@ void printUsage(std::ostream& out) {
   qelcalc::printRankTestUsage(out);
   qelcalc::printProportionVarianceUsage(out);
   qelcalc::printFitUsage(out);
+  qelcalc::printCurveFitUsage(out);
   qelcalc::printSummaryUsage(out);
   qelcalc::printTableUsage(out);
   qelcalc::printMatrixUsage(out);
   qelcalc::printPowerUsage(out);
+  qelcalc::printGofUsage(out);
+  qelcalc::printTicksUsage(out);
+  qelcalc::printQuadUsage(out);
+  qelcalc::printSintUsage(out);
+  qelcalc::printRangeUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -61,11 +70,17 @@ int main(int argc, char** argv) {
     if (mode == "ttest") return qelcalc::runTTestMode(argc, argv, std::cout);
     if (mode == "test") return qelcalc::runTestMode(argc, argv, std::cout);
     if (mode == "fit") return qelcalc::runFitMode(argc, argv, std::cout);
+    if (mode == "curvefit") return qelcalc::runCurveFitMode(argc, argv, std::cout);
     if (mode == "summary") return qelcalc::runSummaryMode(argc, argv, std::cout);
     if (mode == "pplot") return qelcalc::runPPlotMode(argc, argv, std::cout);
     if (mode == "table") return qelcalc::runTableMode(argc, argv, std::cout);
     if (mode == "matrix") return qelcalc::runMatrixMode(argc, argv, std::cout);
     if (mode == "power") return qelcalc::runPowerMode(argc, argv, std::cout);
+    if (mode == "gof") return qelcalc::runGofMode(argc, argv, std::cout);
+    if (mode == "ticks") return qelcalc::runTicksMode(argc, argv, std::cout);
+    if (mode == "quad") return qelcalc::runQuadMode(argc, argv, std::cout);
+    if (mode == "sint") return qelcalc::runSintMode(argc, argv, std::cout);
+    if (mode == "range") return qelcalc::runRangeMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

@@ -133,6 +133,56 @@ class CmSubsetsOfNChooseKWithReplacement {
   int mIndex;
 };
 
+// Gaussian quadrature by the method of Golub and Welsch (Math. Comp. 23
+// (1969) 221): the nodes are the eigenvalues of the symmetric tridiagonal
+// Jacobi matrix of the orthogonal polynomials, the weights mu0 times the
+// squared first components of its normalised eigenvectors. False when the
+// eigensystem fails (or alpha <= -1 for Laguerre); the vectors are then
+// empty.
+//
+// Legendre (weight 1 on [-1, 1], mu0 = 2): the n/2 positive nodes in
+// descending order with their weights, each pair averaged with its mirror
+// image; an odd n leaves out its middle node 0.
+bool mGaussianQuadratureWeights(unsigned n, std::vector<double>& nodes,
+                                std::vector<double>& weights);
+// Hermite (weight exp(-x^2), mu0 = sqrt(pi)): all n nodes ascending, or with
+// half the n/2 positive nodes descending.
+bool mGaussHermiteQuadratureWeights(unsigned n, std::vector<double>& nodes,
+                                    std::vector<double>& weights, bool half);
+// Generalised Laguerre (weight x^alpha exp(-x) on (0, inf), mu0 =
+// Gamma(alpha + 1)): n nodes ascending.
+bool mGaussLaguerreQuadratureWeights(unsigned n, std::vector<double>& nodes,
+                                     std::vector<double>& weights, double alpha);
+
+class CmRealFunction;
+// Integral of f over [a, b]: h times the sum over the stored node-weight
+// pairs of w (f(c + h x) + f(c - h x)), c = (a + b)/2, h = (b - a)/2. For
+// n = 16 the classic 16-point table, without eigenvalues; otherwise the
+// pairs of mGaussianQuadratureWeights (the missing value if that fails).
+double mGaussianIntegration(double a, double b, CmRealFunction& f, unsigned n);
+double mGaussianIntegration(double a, double b, std::vector<double> const& nodes,
+                            std::vector<double> const& weights, CmRealFunction& f);
+// Plain weighted sums sum w f(x) of the Hermite and Laguerre rules (the rule
+// of n points, or caller-supplied tables).
+double mGaussHermiteIntegration(CmRealFunction& f, unsigned n);
+double mGaussHermiteIntegration(std::vector<double> const& nodes,
+                                std::vector<double> const& weights, CmRealFunction& f);
+double mGaussLaguerreIntegration(CmRealFunction& f, unsigned n, double alpha);
+double mGaussLaguerreIntegration(std::vector<double> const& nodes,
+                                 std::vector<double> const& weights, CmRealFunction& f);
+
+// Sign confidence levels with nonlinear interpolation (Hettmansperger and
+// Sheather, 1986). levels gets the achieved confidences {a, a'} of the
+// order-statistic intervals of depth d and d + 1 around the confidence
+// (binomial law, its continuity-corrected normal form above n = 50), lambda
+// the interpolation weight; kind 1 when even the widest interval falls
+// short ({a}, d 1, lambda 0), 2 when the walk reached d = n/2, else 0.
+void mSint(int n, double confidence, std::vector<double>& levels, int* d, int* kind,
+           double* lambda);
+// Pointer form: levels receives at most two values.
+void SINT(const int* n, const double* confidence, double* levels, int* d, int* kind,
+          double* lambda);
+
 }  // namespace qel
 
 #endif

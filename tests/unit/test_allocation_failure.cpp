@@ -419,3 +419,20 @@ TEST(AllocationFailure, AllRowsFormNeverAllocates) {
 }
 
 }  // namespace
+
+#include <qel/curve_fit.h>
+
+namespace {
+
+// Every allocation of the curve fit in turn: 30001 with every output NaN.
+TEST(AllocationFailure, CurveFitReportsOutOfMemory) {
+  const double x[] = {0.0, 1.0, 2.0, 3.0, 4.0, 5.0}, y[] = {1.0, 2.5, 2.9, 4.2, 5.1, 5.8};
+  double c[5], r2 = 0.0;
+  const int allocations = failEachAllocation(
+      [&] { return qel::v1::RunLynGrCurveFit(c, &r2, x, y, 6, 3, 0.0, true); },
+      [&](int k) { EXPECT_TRUE(nan({c[0], c[1], c[2], c[3], c[4], r2})) << "allocation " << k; });
+  EXPECT_GT(allocations, 6);  // the column array and five columns at least
+  EXPECT_TRUE(std::isfinite(c[3]) && r2 > 0.9);
+}
+
+}  // namespace

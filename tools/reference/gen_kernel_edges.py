@@ -67,8 +67,10 @@ case("gamma", "inv", 0.001, (0.01, 1, 7), 0)
 case("chisq", "inv", 0, (4, 0), 0)
 case("chisq", "inv", 1, (4, 0), MISSING)
 case("chisq", "inv", 1, (4, 2), MISSING)
-case("normal", "inv", 1e-320, (0, 1), MISSING)  # below the lower tail at -36
-case("lognormal", "inv", 1e-320, (0, 1, 0), MISSING)
+# A subnormal probability still has its quantile (about -38.27).
+z_tiny = mp.findroot(lambda z: mp.ncdf(z) / mpf(1e-320) - 1, -38.3)
+case("normal", "inv", 1e-320, (0, 1), z_tiny)
+case("lognormal", "inv", 1e-320, (0, 1, 0), exp(z_tiny))
 case("chisq", "lower", 1, (-3, 0), MISSING)  # a failed ELV call
 case("gamma", "lower", 1, (-2, 1, 0), MISSING)
 # Tukey lambda: lambda > 0 ends at -+1/lambda; a negative lambda refuses p = 0.

@@ -7,11 +7,15 @@
 // Array form: one state switch serves the whole column. Each element is read
 // before it is written and no other element is touched, so out may equal in.
 //
+// Both armed frames ask the ELV routines for tails down to the smallest
+// normal double (limits.h).
+//
 // Bare frame: the kernel alone, no state call and no translation.
 #ifndef QEL_SRC_INTERFACES_MATH_FRAMES_H
 #define QEL_SRC_INTERFACES_MATH_FRAMES_H
 
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/elv/limits.h"
 
 namespace qel {
 namespace frame {
@@ -22,6 +26,7 @@ inline double missingToNaN(double result) {
 
 template <class Kernel, class X, class... Params>
 double armed(Kernel kernel, X x, Params... params) {
+  const elv::DeepTailScope deep;
   SetLynFpuStates();
   const double result = kernel(x, params...);
   ResetFpuStates();
@@ -32,6 +37,7 @@ double armed(Kernel kernel, X x, Params... params) {
 template <class Kernel, class... Params>
 void armedArray(Kernel kernel, double* out, const double* in, unsigned long count,
                 Params... params) {
+  const elv::DeepTailScope deep;
   SetLynFpuStates();
   for (unsigned long i = 0; i < count; ++i) out[i] = missingToNaN(kernel(in[i], params...));
   ResetFpuStates();

@@ -5,10 +5,12 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/LYNBasicTypes.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -39,9 +41,7 @@ double mBetaPdf(double x, double a, double b) {
     return b == 1.0 ? a : 0.0;
   }
   try {
-    return mExponential((a - 1.0) * mLog(x, true) + (b - 1.0) * std::log1p(-x) + mLogGamma(a + b) -
-                            mLogGamma(a) - mLogGamma(b),
-                        true);
+    return saddle::betaDensity(x, a, b);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -56,12 +56,19 @@ double mBetaCdf(double x, double a, double b, bool upperTail) {
 }
 
 double mBetaInvCdf(double p, double a, double b) {
+  if (!mPositiveShapes(a, b)) return mGetMissingValueCode();
   if (p == 0.0) return 0.0;
   if (p == 1.0) return 1.0;
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_beta_lower_quant(p, a, b, &q) : elv_beta_upper_quant(1.0 - p, a, b, &q);
-  return ElvFailed(status) ? mGetMissingValueCode() : q;
+  const TailPair tails = [a, b](double x, double* lower, double* upper) {
+    double density = 0.0;
+    return !ElvFailed(elv_beta_df(x, a, b, lower, upper, &density));
+  };
+  if (!ElvFailed(status)) return mPolishedQuantile(tails, p, TailSupport::Unit, q);
+  // Beyond the routines' range of tails: the smaller tail in logarithms.
+  return mTailQuantile(tails, p, TailSupport::Unit, a / (a + b));
 }
 
 // --- F ---------------------------------------------------------------------
@@ -81,13 +88,7 @@ double CmFCdf::operator()(double x) {
 double mFPdf(double x, double df1, double df2) {
   if (x <= 0.0) return 0.0;
   try {
-    const double a = df1 / 2.0;
-    const double b = df2 / 2.0;
-    const double c = a + b;
-    const double ratio = df1 / df2;
-    return mExponential(mLogGamma(c) - mLogGamma(a) - mLogGamma(b) + a * mLog(ratio, true) +
-                            (a - 1.0) * mLog(x, true) - c * std::log1p(x * ratio),
-                        true);
+    return saddle::fDensity(x, df1, df2);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -118,22 +119,37 @@ double mFCdf(double x, double df1, double df2, double noncentrality, bool upperT
 }
 
 double mFInvCdf(double p, double df1, double df2, double noncentrality) {
+  if (!mPositiveShapes(df1, df2) || !std::isgreaterequal(noncentrality, 0.0)) {
+    return mGetMissingValueCode();
+  }
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
   if (noncentrality == 0.0) {
+    // P(F <= x) = I_w(df1/2, df2/2), w = df1 x/(df2 + df1 x), and
+    // P(F > x) = I_y(df2/2, df1/2), y = 1 - w: the tails of the central law
+    // for every x, however large or small.
+    // The beta argument is taken below 1/2, where it carries no rounding
+    // of a difference from 1.
+    const TailPair tails = [df1, df2](double x, double* lower, double* upper) {
+      const double w = df1 * x / (df2 + df1 * x);
+      double density = 0.0;
+      if (w <= 0.5) return !ElvFailed(elv_beta_df(w, df1 / 2.0, df2 / 2.0, lower, upper, &density));
+      const double y = df2 / (df2 + df1 * x);
+      return !ElvFailed(elv_beta_df(y, df2 / 2.0, df1 / 2.0, upper, lower, &density));
+    };
     double q = 0.0;
     const ElvStatus status =
         p <= 0.5 ? elv_F_lower_quant(p, df1, df2, &q) : elv_F_upper_quant(1.0 - p, df1, df2, &q);
-    return ElvFailed(status) ? mGetMissingValueCode() : q;
+    if (!ElvFailed(status)) return mPolishedQuantile(tails, p, TailSupport::Positive, q);
+    return mTailQuantile(tails, p, TailSupport::Positive, 1.0);
   }
-  try {
-    CmFCdf f(df1, df2, noncentrality, p);
-    int status = 0;
-    return mRootFinder(0.0, std::fmin(kSearchLimit, kLargestFArgument), f, &status);
-  } catch (const std::runtime_error&) {
-    return mGetMissingValueCode();
-  }
+  // The noncentral law: the smaller tail, solved in logarithms from about
+  // the mean.
+  const TailPair tails = [df1, df2, noncentrality](double x, double* lower, double* upper) {
+    return mFCdf(x, df1, df2, noncentrality, lower, upper);
+  };
+  return mTailQuantile(tails, p, TailSupport::Positive, 1.0 + noncentrality / df1);
 }
 
 double mFPValue(double x, double df1, double df2, EAlternative alternative) {

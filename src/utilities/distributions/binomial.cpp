@@ -12,22 +12,19 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/discrete_rules.h"
-#include "utilities/elv/wrappers.h"
-#include "utilities/special_functions/incomplete_beta.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/wrappers.h"
+#include "utilities/special_functions/incomplete_beta.h"
 
 namespace qel {
 
 namespace {
-
-// ln(1 - p) for 0 < p < 1, without the rounding of 1 - p for small p.
-double logComplement(double p) {
-  return p < 0.5 ? std::log1p(-p) : mLog(1.0 - p, true);
-}
 
 // P(X <= k), 0 <= k < n, by the incomplete beta ratio.
 double binomialLowerTailByBeta(double k, double n, double p) {
@@ -42,8 +39,7 @@ double mBinomialPdf(double x, int n, double p) {
   if (p == 0.0) return k == 0.0 ? 1.0 : 0.0;
   if (p == 1.0) return k == n ? 1.0 : 0.0;
   if (k < 0.0 || k > n) return 0.0;
-  const int j = static_cast<int>(k);
-  return mExponential(mLogNChooseK(n, j) + k * mLog(p, true) + (n - k) * logComplement(p), true);
+  return saddle::binomialMass(k, n, p, 1.0 - p);
 }
 
 double mBinomialCdf(double x, double n, double p, bool upperTail) {
@@ -74,7 +70,15 @@ double mBinomialInvCdf(double p, int n, double prob) {
   const ElvStatus status = lowerRoutine
                                ? elv_binomial_lower_quant(p, trials, prob, &k, &fraction)
                                : elv_binomial_upper_quant(1.0 - p, trials, prob, &k, &fraction);
-  if (ElvFailed(status)) return mGetMissingValueCode();
+  if (ElvFailed(status)) {
+    // Beyond the routines' range of tails: a search on the smaller tail.
+    const TailPair tails = [n, prob](double j, double* lower, double* above) {
+      *lower = mBinomialCdf(j, n, prob, false);
+      *above = mBinomialCdf(j + 1.0, n, prob, true);
+      return !mIsNumericMissing(*lower) && !mIsNumericMissing(*above);
+    };
+    return mDiscreteTailQuantile(tails, p, 0.0, std::floor(n * prob), n);
+  }
   return discrete::correctedQuantile(static_cast<double>(k), fraction, lowerRoutine);
 }
 

@@ -3,15 +3,19 @@
 // Quantiles come from the ELV quantile routines, which work from the nearer
 // tail. A quantile whose lower tail misses p by more than 1e-9 p is refined
 // by regula falsi (Illinois) on the distribution function, started on a
-// bracket [0, q] that doubles until it holds p. The noncentral chi-square has
-// no quantile routine: there the search runs from [0, 1e30].
+// bracket [0, q] that doubles until it holds p. Beyond the routines' range of
+// tails, and for the noncentral chi-square, which has no quantile routine,
+// the smaller tail is solved in logarithms (tail_quantile.h).
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/LYNBasicTypes.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -37,15 +41,46 @@ double searchUpwardFromZero(CmRealFunction& f, double start) {
   return mRootFinder(x1, x2, f, &status);
 }
 
-// The standard gamma quantile by the ELV routine for the nearer tail.
-double gammaQuantileFromElv(double p, double shape) {
+// The ELV quantile routines take tails from 1e-12 on; beyond, the answer is
+// searched from the quantile at that limit.
+constexpr double kElvSmallestTail = 1e-12;
+
+double clampToElvRange(double p) {
+  return p <= 0.5 ? std::fmax(p, kElvSmallestTail) : std::fmin(p, 1.0 - kElvSmallestTail);
+}
+
+bool farBeyondElvRange(double p) {
+  return p > 0.0 && p < 1.0 && (p < kElvSmallestTail || 1.0 - p < kElvSmallestTail);
+}
+
+double gammaElvQuantile(double p, double shape) {
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_gamma_lower_quant(p, shape, &q) : elv_gamma_upper_quant(1.0 - p, shape, &q);
   return ElvFailed(status) ? mGetMissingValueCode() : q;
 }
 
+// The standard gamma quantile by the ELV routine for the nearer tail; tails
+// beyond its range by the tail search started from its range limit.
+double gammaQuantileFromElv(double p, double shape) {
+  if (!mPositiveShapes(shape)) return mGetMissingValueCode();
+  const TailPair tails = [shape](double x, double* lower, double* upper) {
+    double density = 0.0;
+    return !ElvFailed(elv_gamma_df(x, shape, lower, upper, &density));
+  };
+  if (!farBeyondElvRange(p)) {
+    return mPolishedQuantile(tails, p, TailSupport::Positive, gammaElvQuantile(p, shape));
+  }
+  double start = gammaElvQuantile(clampToElvRange(p), shape);
+  if (mIsNumericMissing(start) || !(start > 0.0)) start = shape;
+  return mTailQuantile(tails, p, TailSupport::Positive, start);
+}
+
 double chiSqQuantileFromElv(double p, double df) {
+  if (farBeyondElvRange(p) || elv::elvPrecision() == elv::ElvPrecision::Full) {
+    const double half = gammaQuantileFromElv(p, df / 2.0);
+    return mIsNumericMissing(half) ? half : 2.0 * half;
+  }
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_chi2_lower_quant(p, df, &q) : elv_chi2_upper_quant(1.0 - p, df, &q);
@@ -104,10 +139,8 @@ double CmChiSqCdf::operator()(double x) {
 
 double mGammaPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
-  double lower = 0.0, upper = 0.0, density = 0.0;
-  const double z = (x - threshold) / scale;
-  if (ElvFailed(elv_gamma_df(z, shape, &lower, &upper, &density))) return mGetMissingValueCode();
-  return density / scale;
+  // Loader's saddle-point form keeps the density's digits for large shapes.
+  return saddle::gammaDensity((x - threshold) / scale, shape) / scale;
 }
 
 double mGammaCdf(double x, double shape, double scale, double threshold, bool upperTail) {
@@ -144,13 +177,7 @@ double mGammaInvCdfByRootFinder(double p, double shape, double start) {
 
 double mChiSqPdf(double x, double df) {
   if (x <= 0.0) return 0.0;
-  try {
-    const double h = df / 2.0;
-    return mExponential(-mLogGamma(h) - h * std::log(2.0) + (h - 1.0) * mLog(x, true) - x / 2.0,
-                        true);
-  } catch (const std::runtime_error&) {
-    return 0.0;
-  }
+  return saddle::gammaDensity(x / 2.0, df / 2.0) / 2.0;
 }
 
 bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double* upper) {
@@ -177,10 +204,17 @@ double mChiSqCdf(double x, double df, double noncentrality, bool upperTail) {
 }
 
 double mChiSqInvCdf(double p, double df, double noncentrality) {
+  if (!mPositiveShapes(df) || !std::isgreaterequal(noncentrality, 0.0)) {
+    return mGetMissingValueCode();
+  }
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
   if (noncentrality == 0.0) return centralChiSqQuantile(p, df);
-  return mChiSqInvCdfByRootFinder(p, df, noncentrality, kNoncentralSearchStart);
+  // The smaller tail, solved in logarithms from the mean.
+  const TailPair tails = [df, noncentrality](double x, double* lower, double* upper) {
+    return mChiSqCdf(x, df, noncentrality, lower, upper);
+  };
+  return mTailQuantile(tails, p, TailSupport::Positive, df + noncentrality);
 }
 
 double mChiSqInvCdfByRootFinder(double p, double df, double noncentrality, double start) {

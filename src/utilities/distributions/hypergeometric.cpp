@@ -10,12 +10,14 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/discrete_rules.h"
-#include "utilities/elv/wrappers.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/wrappers.h"
 
 namespace qel {
 
@@ -43,12 +45,7 @@ double mHypergeometricPdf(double x, int N, int M, int n) {
   if (!discrete::massPoint(x, &k)) return 0.0;
   const Support s = supportOf(N, M, n);
   if (k < s.lo || k > s.hi) return 0.0;
-  const int j = static_cast<int>(k);
-  try {
-    return mExponential(mLogNChooseK(M, j) + mLogNChooseK(N - M, n - j) - mLogNChooseK(N, n), true);
-  } catch (const std::runtime_error&) {
-    return 0.0;
-  }
+  return saddle::hypergeometricMass(k, N, M, n);
 }
 
 // The upper tail is P(X > k) + P(X = k).
@@ -81,7 +78,15 @@ double mHypergeometricInvCdf(double p, int N, int M, int n) {
   const ElvStatus status = lowerRoutine
                                ? elv_hypergeo_lower_quant(p, uN, uM, un, &k, &fraction)
                                : elv_hypergeo_upper_quant(1.0 - p, uN, uM, un, &k, &fraction);
-  if (ElvFailed(status)) return mGetMissingValueCode();
+  if (ElvFailed(status)) {
+    // Beyond the routines' range of tails: a search on the smaller tail.
+    const TailPair tails = [N, M, n](double j, double* lower, double* above) {
+      *lower = mHypergeometricCdf(j, N, M, n, false);
+      *above = mHypergeometricCdf(j + 1.0, N, M, n, true);
+      return !mIsNumericMissing(*lower) && !mIsNumericMissing(*above);
+    };
+    return mDiscreteTailQuantile(tails, p, s.lo, s.lo, s.hi);
+  }
   return discrete::correctedQuantile(static_cast<double>(k), fraction, lowerRoutine);
 }
 

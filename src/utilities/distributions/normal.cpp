@@ -1,15 +1,19 @@
 // Normal, log-normal and half-normal distributions on the ELV normal
-// routines. The quantile falls back on a search of the distribution function
-// over [-36, 0] where the ELV inverse refuses p (below its smallest
-// admissible probability).
+// routines. At full precision the tails and the quantile come straight from
+// the double-precision normal tail and AS 241 (normal_precise.h), over the
+// whole range of doubles. The historical setting goes through the ELV
+// routines, and its quantile falls back on a search of the distribution
+// function over [-36, 0] where the ELV inverse refuses p.
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/CheckedFunctions.h"
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/elv/normal_precise.h"
+#include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/LYNBasicTypes.h"
-#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 
@@ -19,6 +23,9 @@ constexpr double kSearchLowerEnd = -36.0;
 
 // The standard normal quantile, or the missing value.
 double standardNormalQuantile(double p) {
+  if (elv::elvPrecision() == elv::ElvPrecision::Full && p > 0.0 && p < 1.0) {
+    return elv::normalQuantile(p);
+  }
   double z = 0.0;
   if (!ElvFailed(elv_inv_normal_df(p, &z))) return z;
   double lower = 0.0, upper = 0.0;
@@ -64,6 +71,19 @@ bool mNormalCdf(double x, double mean, double sigma, double* lower, double* uppe
   }
   if (x == mean) {
     *lower = *upper = 0.5;
+    return true;
+  }
+  if (elv::elvPrecision() == elv::ElvPrecision::Full) {
+    // Both tails straight from the double-precision tail, which also serves
+    // the tails below the ELV routine's underflow limit.
+    const double z = (x - mean) / sigma;
+    if (std::isnan(z)) {
+      *lower = *upper = mGetMissingValueCode();
+      return false;
+    }
+    const double small = elv::normalUpperTail(std::fabs(z));
+    *(z >= 0.0 ? upper : lower) = small;
+    *(z >= 0.0 ? lower : upper) = 1.0 - small;
     return true;
   }
   if (ElvFailed(elv_normal_df((x - mean) / sigma, lower, upper))) {

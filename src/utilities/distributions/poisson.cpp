@@ -7,10 +7,12 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/discrete_rules.h"
-#include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -18,11 +20,7 @@ namespace qel {
 double mPoissonPdf(double x, double mean) {
   double k;
   if (!discrete::massPoint(x, &k) || k < 0.0) return 0.0;
-  try {
-    return mExponential(-mean + k * mLog(mean, true) - mLogGamma(k + 1.0), true);
-  } catch (const std::runtime_error&) {
-    return 0.0;
-  }
+  return saddle::poissonMass(k, mean);
 }
 
 // The upper tail P(X >= k) is P(X > k - 1).
@@ -46,7 +44,15 @@ double mPoissonInvCdf(double p, double mean) {
   const bool lowerRoutine = p <= 0.5;
   const ElvStatus status = lowerRoutine ? elv_poisson_lower_quant(p, mean, &k, &fraction)
                                         : elv_poisson_upper_quant(1.0 - p, mean, &k, &fraction);
-  if (ElvFailed(status)) return mGetMissingValueCode();
+  if (ElvFailed(status)) {
+    // Beyond the routines' range of tails: a search on the smaller tail.
+    const TailPair tails = [mean](double j, double* lower, double* above) {
+      *lower = mPoissonCdf(j, mean, false);
+      *above = mPoissonCdf(j + 1.0, mean, true);
+      return !mIsNumericMissing(*lower) && !mIsNumericMissing(*above);
+    };
+    return mDiscreteTailQuantile(tails, p, 0.0, std::floor(mean), 4.0e9);
+  }
   if (k == 0) return 0.0;
   return discrete::correctedQuantile(static_cast<double>(k), fraction, lowerRoutine);
 }

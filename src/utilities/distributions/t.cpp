@@ -3,15 +3,18 @@
 // The noncentral density has no short closed form; it comes from the
 // recurrence between distribution functions of the noncentral t,
 //   f(x; df, d) = df/x (F(x sqrt((df + 2)/df); df + 2, d) - F(x; df, d)).
-// The noncentral quantile is a bracketed search started from the normal
-// approximation with the exact mean and variance of the noncentral t.
+// The noncentral quantile solves the smaller tail in logarithms
+// (tail_quantile.h), started from the mean of the noncentral t.
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/LYNBasicTypes.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -27,10 +30,31 @@ constexpr int kElvDomainStatus = 3;
 
 // The central t quantile by the ELV routine for the nearer tail.
 double centralTQuantile(double p, double df) {
+  if (!mPositiveShapes(df)) return mGetMissingValueCode();
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_t_lower_quant(p, df, &q) : elv_t_upper_quant(1.0 - p, df, &q);
-  return ElvFailed(status) ? mGetMissingValueCode() : q;
+  if (!(p > 0.0 && p < 1.0)) return ElvFailed(status) ? mGetMissingValueCode() : q;
+  const TailPair tails = [df](double x, double* lower, double* upper) {
+    return mTCdf(x, df, 0.0, lower, upper);
+  };
+  if (!ElvFailed(status)) return mPolishedQuantile(tails, p, TailSupport::RealLine, q);
+  // Beyond the routines' range of tails: the smaller tail in logarithms.
+  return mTailQuantile(tails, p, TailSupport::RealLine, p < 0.5 ? -1.0 : 1.0);
+}
+
+// Beyond |t| = 1e100 the routine answers exact 0 and 1 from |t| = 6.7e143
+// on; the tail is there K n^((n+1)/2) |t|^-n / n with K the density's
+// constant (saddle_density.h), the next term being smaller by n(n+1)/(2 t^2).
+constexpr double kFarT = 1e100;
+constexpr double kElvMaxDf = 189812530.0;
+
+double centralTFarTail(double t, double n) {
+  const double u = (n + 1.0) / 2.0, v = n / 2.0;
+  const double logK = saddle::stirlerr(u) - saddle::stirlerr(v) - saddle::bd0(v, u) -
+                      0.918938533204672741780329736406;
+  const double logTail = logK + u * std::log(n) - n * std::log(t) - std::log(n);
+  return logTail < -708.39 ? 0.0 : std::exp(logTail);
 }
 
 // The starting bracket of the noncentral quantile search.
@@ -72,7 +96,8 @@ double CmTCdf::operator()(double x) {
 
 double mTPdf(double x, double df, double noncentrality) {
   try {
-    if (noncentrality == 0.0 || x == 0.0) {
+    if (noncentrality == 0.0) return saddle::tDensity(x, df);
+    if (x == 0.0) {
       const double a = (df + 1.0) / 2.0;
       const double b = df / 2.0;
       return mExponential(mLogGamma(a) - mLogGamma(b) - 0.5 * mLog(mGetPi() * df, true) -
@@ -93,6 +118,13 @@ bool mTCdf(double x, double df, double noncentrality, double* lower, double* upp
   if (mIsNumericMissing(x)) {
     *lower = *upper = missing;
     return false;
+  }
+  if (noncentrality == 0.0 && std::fabs(x) > kFarT && df > 0.0 && df <= kElvMaxDf &&
+      elv::elvPrecision() == elv::ElvPrecision::Full) {
+    const double tail = centralTFarTail(std::fabs(x), df);
+    *(x < 0.0 ? lower : upper) = tail;
+    *(x < 0.0 ? upper : lower) = 1.0 - tail;
+    return true;
   }
   const ElvStatus status = elv_t_ncdf(x, df, noncentrality, lower, upper);
   if (!ElvFailed(status)) return true;
@@ -121,17 +153,17 @@ double mTCdf(double x, double df, double noncentrality, bool upperTail) {
 }
 
 double mTInvCdf(double p, double df, double noncentrality) {
+  if (!mPositiveShapes(df) || std::isnan(noncentrality)) return mGetMissingValueCode();
   if (p == 0.0 || p == 1.0) return mGetMissingValueCode();
   if (noncentrality == 0.0) return centralTQuantile(p, df);
   try {
+    // The smaller tail, solved in logarithms from the normal approximation.
     double x1 = 0.0, x2 = 0.0;
-    startingBracket(p, df, noncentrality, &x1, &x2);
-    CmTCdf f(df, noncentrality, p);
-    if (mBracketFinder(&x1, &x2, f, -kSearchLimit, kSearchLimit) != 0) {
-      return mGetMissingValueCode();
-    }
-    int status = 0;
-    return mRootFinder(x1, x2, f, &status);
+    startingBracket(0.5, df, noncentrality, &x1, &x2);
+    const TailPair tails = [df, noncentrality](double x, double* lower, double* upper) {
+      return mTCdf(x, df, noncentrality, lower, upper);
+    };
+    return mTailQuantile(tails, p, TailSupport::RealLine, x1);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   } catch (const std::invalid_argument&) {

@@ -11,7 +11,9 @@
 #include <cerrno>
 #include <cmath>
 
+#include "utilities/distributions/saddle_density.h"
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -102,6 +104,15 @@ double exps(double x) {
 // x^(a-1) e^-x / Gamma(a) = exp(d + a u - ln_scaled_gamma(a) - u), d = a - x,
 // u = ln(x/a).
 void lnpgamma(double* out, double a, double x) {
+  if (qel::elv::elvPrecision() == qel::elv::ElvPrecision::Full && a >= 1.0 && x > 0.5 * a &&
+      x < 2.0 * a) {
+    // Loader's saddle-point form (2000): the deviance a ln(a/x) + x - a and
+    // Stirling's error term are each formed without cancellation, where
+    // d + a u below cancels to the rounding of a near the mode.
+    *out = -qel::saddle::bd0(a, x) - qel::saddle::stirlerr(a) - 0.918938533204672741780329736406 +
+           0.5 * std::log(a) - std::log(x);
+    return;
+  }
   const double d = a - x;
   double u;
   if ((a < 1.0 && x > 1.0) || (a > 1.0 && x < 1.0)) {

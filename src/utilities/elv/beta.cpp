@@ -19,13 +19,15 @@
 #include <utility>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
 using namespace qel::elv;
 
 constexpr long kBetaSeriesCap = 1000000;
-constexpr int kContinuedFractionSteps = 80;
+// Enough for a gap of 2e-15 at the slowest admissible convergence.
+constexpr int kContinuedFractionSteps = 400;
 constexpr int kPowerSeriesTerms = 30;
 constexpr double kEulerGamma = 0.5772156649015329;
 constexpr double kZeta2 = 1.6449340668482264;
@@ -67,7 +69,7 @@ double tailBorder(double a, double b) {
     v -= a * std::log(b);
   }
   if (v >= a * -kLn2) return 0.5;
-  if (v < kUnderflowLog * a) return 0.0;
+  if (v < underflowLog() * a) return 0.0;
   return std::exp(v / a);
 }
 
@@ -90,7 +92,7 @@ int beta_Iabx(double* out, double a, double b, double x) {
     const double ratio = (b - n) / (a + n) * y;
     if (ratio < -0.5) break;
     term *= ratio;
-    if (std::fabs(term) < kSeriesCutoff) {
+    if (std::fabs(term) < seriesCutoff()) {
       finite = true;
       break;
     }
@@ -107,7 +109,7 @@ int beta_Iabx(double* out, double a, double b, double x) {
   // Hypergeometric form: positive terms, geometric tail with ratio x.
   term = 1.0;
   n = 0;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     ++n;
     if (n >= kBetaSeriesCap) return seriesFailed(name);
     term *= (a + b + n - 1.0) * x / (a + n);
@@ -131,7 +133,7 @@ int beta_Jabx(double* out, double a, double b, double x) {
     ++n;
     if (n >= kBetaSeriesCap) return seriesFailed(name);
     term *= (a - n) / (b + n) * u;
-    if (term < kSeriesCutoff) {
+    if (term < seriesCutoff()) {
       finite = true;
       break;
     }
@@ -195,7 +197,7 @@ int beta_J_complete(double* out, double a, double b, double x) {
       }
       pair[half] = A / B;
     }
-    if (std::fabs(pair[1] - pair[0]) < kSeriesCutoff * pair[1]) {
+    if (std::fabs(pair[1] - pair[0]) < fractionGap() * pair[1]) {
       *out = 0.5 * (pair[0] + pair[1]);
       ELVmethod = 1;
       ELVsteps2 = step;
@@ -222,7 +224,7 @@ double beta_ps(double x, double a, double b) {
   double term = std::exp(a * lnbx) * (b - 1.0) * x / (1.0 + a);
   double s = term;
   int i = 2;
-  for (; i <= kPowerSeriesTerms && std::fabs(term) > kSeriesCutoff; ++i) {
+  for (; i <= kPowerSeriesTerms && std::fabs(term) > seriesCutoff(); ++i) {
     term *= -((b - i) / i) * ((a + i - 1.0) / (a + i)) * x;
     s += term;
   }
@@ -292,23 +294,23 @@ void beta_df(double x, double a, double b, double* lower, double* upper, double*
     if (a < 1.0 && b * x < 1.0) {
       const double S = beta_ps(x, a, b);
       const double d = beta_lntab(a, b);
-      up = (logOrLow(S) - ln_gamma(a) - d >= kUnderflowLog) ? S / Gamma(a) / std::exp(d) : 0.0;
+      up = (logOrLow(S) - ln_gamma(a) - d >= underflowLog()) ? S / Gamma(a) / std::exp(d) : 0.0;
       ELVmethod += 50;
     } else {
       const double L = lp + std::log1p(-x) - std::log(b);
       const double r = ((a - 1.0) / (1.0 + b)) * (1.0 - x) / x;
       double J;
-      if (L >= kUnderflowLog) {
+      if (L >= underflowLog()) {
         if (beta_Jabx(&J, a, b, x) != 0) goto seriesFailure;
         up = std::exp(L) * J;
         ELVmethod += 60;
-      } else if (a <= 1.0 || (r < 1.0 && L - std::log1p(-r) < kUnderflowLog)) {
+      } else if (a <= 1.0 || (r < 1.0 && L - std::log1p(-r) < underflowLog())) {
         code = 1;
         ELVmethod = 70;
       } else {
         if (beta_Jabx(&J, a, b, x) != 0) goto seriesFailure;
         const double logUpper = logOrLow(J) + L;
-        if (logUpper < kUnderflowLog) {
+        if (logUpper < underflowLog()) {
           code = 1;
           ELVmethod += 80;
         } else {
@@ -321,22 +323,22 @@ void beta_df(double x, double a, double b, double* lower, double* upper, double*
   } else {
     const double r = ((b - 1.0) / (1.0 + a)) * x / (1.0 - x);
     double I;
-    if (lp >= kUnderflowLog) {
+    if (lp >= underflowLog()) {
       if (beta_Iabx(&I, a, b, x) != 0) goto seriesFailure;
-      if (logOrLow(I) + lp < kUnderflowLog) {
+      if (logOrLow(I) + lp < underflowLog()) {
         code = 1;
         ELVmethod = 15;
       } else {
         lo = *density * I;
         ELVmethod = 10;
       }
-    } else if (b <= 1.0 || (r < 1.0 && lp - std::log1p(-r) < kUnderflowLog)) {
+    } else if (b <= 1.0 || (r < 1.0 && lp - std::log1p(-r) < underflowLog())) {
       code = 1;
       ELVmethod = 20;
     } else {
       if (beta_Iabx(&I, a, b, x) != 0) goto seriesFailure;
       const double logLower = logOrLow(I) + lp;
-      if (logLower < kUnderflowLog) {
+      if (logLower < underflowLog()) {
         code = 1;
         ELVmethod = 30;
       } else {

@@ -14,6 +14,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -217,7 +218,7 @@ int beta_newton(double* x, char mode, double target, double a, double b) {
     const double r = tail / density;
     const double step = mode == 'L' ? (target - lower) / density : (upper - target) / density;
     const double scale = point > r ? point : r;
-    if (std::fabs(step) <= kSeriesCutoff * scale) {
+    if (std::fabs(step) <= stepLimit() * scale) {
       // The last correction is below the tolerance; applying it costs
       // nothing and halves the remaining digits of error.
       const double last = point + step;

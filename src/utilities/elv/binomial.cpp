@@ -14,6 +14,7 @@
 #include <utility>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -30,7 +31,7 @@ template <class Ratio>
 int scaledSum(const char* name, long available, double* out, Ratio ratio) {
   double term = 1.0;
   long n = 0;
-  while (n < available && term >= kSeriesCutoff) {
+  while (n < available && term >= seriesCutoff()) {
     if (n + 1 >= kMaxCount) {
       ELVsteps1 = 0;
       ELVexit(name, 4, 'F');
@@ -234,16 +235,16 @@ void binomial_df(long k, long n, double prob, double* lower, double* upper, doub
   double S;
   if (m - 1.0 >= k) {
     const double r = k / (n - k + 1.0) * (q / prob);
-    if (lm >= kUnderflowLog) {
+    if (lm >= underflowLog()) {
       if (binomial_Jk(k, n, &S, prob) != 0) goto seriesFailure;
       lo = cellMass * S;
       ELVmethod += 10;
-    } else if (lm - std::log1p(-r) < kUnderflowLog) {
+    } else if (lm - std::log1p(-r) < underflowLog()) {
       code = 1;
       ELVmethod += 11;
     } else {
       if (binomial_Jk(k, n, &S, prob) != 0) goto seriesFailure;
-      if (std::log(S) + lm < kUnderflowLog) {
+      if (std::log(S) + lm < underflowLog()) {
         code = 1;
         ELVmethod += 12;
       } else {
@@ -256,17 +257,17 @@ void binomial_df(long k, long n, double prob, double* lower, double* upper, doub
     // ln r by sums of logarithms: r itself may lie below the normal doubles,
     // which the armed state reads as 0.
     const double logR = std::log((n - k) / (k + 1.0)) + std::log(prob) - std::log(q);
-    const double r = std::exp(logR < kUnderflowLog ? kUnderflowLog : logR);
-    if (lm >= kUnderflowLog) {
+    const double r = std::exp(logR < underflowLog() ? underflowLog() : logR);
+    if (lm >= underflowLog()) {
       if (binomial_Ik(k, n, &S, prob) != 0) goto seriesFailure;
       up = cellMass * S;
       ELVmethod += 20;
-    } else if (lm + logR - std::log1p(-r) < kUnderflowLog) {
+    } else if (lm + logR - std::log1p(-r) < underflowLog()) {
       code = 1;
       ELVmethod += 21;
     } else {
       if (binomial_Ik(k, n, &S, prob) != 0) goto seriesFailure;
-      if (std::log(S) + lm < kUnderflowLog) {
+      if (std::log(S) + lm < underflowLog()) {
         code = 1;
         ELVmethod += 22;
       } else {

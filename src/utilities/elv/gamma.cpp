@@ -17,6 +17,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -24,7 +25,8 @@ using namespace qel::elv;
 
 constexpr long kIaxCap = 1000001;
 constexpr long kJaxCap = 1000000;
-constexpr int kContinuedFractionSteps = 80;
+// Enough for a gap of 2e-15 at the slowest admissible convergence.
+constexpr int kContinuedFractionSteps = 400;
 constexpr int kPowerSeriesTerms = 40;
 
 }  // namespace
@@ -36,7 +38,7 @@ extern "C" {
 int gamma_Iax(double* out, double a, double x) {
   double term = 1.0;
   long n = 0;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     ++n;
     if (n >= kIaxCap) {
       ELVsteps1 = 0;
@@ -60,7 +62,7 @@ int gamma_Iax(double* out, double a, double x) {
 int gamma_Jax(double* out, double a, double x) {
   double term = 1.0;
   long n = 0;
-  while (n + 1 <= a - 1.0 && term >= kSeriesCutoff) {
+  while (n + 1 <= a - 1.0 && term >= seriesCutoff()) {
     ++n;
     if (n >= kJaxCap) {
       ELVsteps1 = 0;
@@ -70,7 +72,7 @@ int gamma_Jax(double* out, double a, double x) {
     term *= (a - n) / x;
   }
   double sum = 1.0;
-  if (term < kSeriesCutoff) {
+  if (term < seriesCutoff()) {
     ELVmethod = 0;
   } else {
     n = static_cast<long>(std::floor(a));
@@ -110,7 +112,7 @@ int gamma_J_complete(double* out, double x, double a) {
       B2 *= 1e-100;
     }
     const double odd = A1 / B1, even = A2 / B2;
-    if ((even - odd) / odd < kSeriesCutoff) {
+    if ((even - odd) / odd < fractionGap()) {
       *out = 0.5 * (odd + even);
       ELVmethod = 1;
       ELVsteps2 = n;
@@ -132,7 +134,7 @@ double gamma_ps(double x, double a) {
   double term = std::pow(x, 1.0 + a) / (1.0 + a);
   double s = term;
   int i = 2;
-  for (; i <= kPowerSeriesTerms && std::fabs(term) > kSeriesCutoff; ++i) {
+  for (; i <= kPowerSeriesTerms && std::fabs(term) > seriesCutoff(); ++i) {
     term *= (-x / i) * ((a + i - 1.0) / (a + i));
     s += term;
   }
@@ -184,16 +186,16 @@ void gamma_df(double x, double a, double* lower, double* upper, double* density)
   if (x > border) {
     if (a < 1.0 && x < 1.0) {
       const double S = gamma_ps(x, a);
-      *upper = (std::log(S) - ln_gamma(a) >= kUnderflowLog) ? S / Gamma(a) : 0.0;
+      *upper = (std::log(S) - ln_gamma(a) >= underflowLog()) ? S / Gamma(a) : 0.0;
       *lower = 1.0 - *upper;
       ELVmethod = 50;
-    } else if (lp >= kUnderflowLog) {
+    } else if (lp >= underflowLog()) {
       double J;
       if (gamma_Jax(&J, a, x) != 0) goto seriesFailure;
       *upper = *density * J;
       *lower = 1.0 - *upper;
       ELVmethod += 60;
-    } else if (a <= 1.0 || lp - std::log(1.0 - (a - 1.0) / x) < kUnderflowLog) {
+    } else if (a <= 1.0 || lp - std::log(1.0 - (a - 1.0) / x) < underflowLog()) {
       *lower = 1.0;
       *upper = 0.0;
       code = 1;
@@ -202,7 +204,7 @@ void gamma_df(double x, double a, double* lower, double* upper, double* density)
       double J;
       if (gamma_Jax(&J, a, x) != 0) goto seriesFailure;
       const double logUpper = std::log(J) + lp;
-      if (logUpper < kUnderflowLog) {
+      if (logUpper < underflowLog()) {
         *lower = 1.0;
         *upper = 0.0;
         code = 1;
@@ -215,12 +217,12 @@ void gamma_df(double x, double a, double* lower, double* upper, double* density)
     }
   } else {
     const double L = std::log(x / a) + lp;
-    if (L >= kUnderflowLog) {
+    if (L >= underflowLog()) {
       double I;
       if (gamma_Iax(&I, a, x) != 0) goto seriesFailure;
       *lower = std::exp(L) * I;
       ELVmethod = 10;
-    } else if (L - std::log(1.0 - x / (1.0 + a)) < kUnderflowLog) {
+    } else if (L - std::log(1.0 - x / (1.0 + a)) < underflowLog()) {
       *lower = 0.0;
       code = 1;
       ELVmethod = 20;
@@ -228,7 +230,7 @@ void gamma_df(double x, double a, double* lower, double* upper, double* density)
       double I;
       if (gamma_Iax(&I, a, x) != 0) goto seriesFailure;
       const double logLower = std::log(I) + L;
-      if (logLower < kUnderflowLog) {
+      if (logLower < underflowLog()) {
         *lower = 0.0;
         code = 1;
         ELVmethod = 30;
@@ -255,7 +257,7 @@ int gamma_newton(double* x, char mode, double target, double a) {
   ELVstartup(name);
   double step = 0.0, scale = -1.0;
   for (long counter = 1; counter <= 35; ++counter) {
-    if (std::fabs(step) < kSeriesCutoff * scale) {
+    if (std::fabs(step) < stepLimit() * scale) {
       // The last correction is below the step limit; applying it costs
       // nothing and, Newton's convergence being quadratic, leaves an error
       // far below it.
@@ -281,7 +283,7 @@ int gamma_newton(double* x, char mode, double target, double a) {
     }
     scale = *x > r ? *x : r;
   }
-  if (std::fabs(step) < kSeriesCutoff * scale) {
+  if (std::fabs(step) < stepLimit() * scale) {
     *x += step;
     ELVsteps1 = 36;
     ELVexit(name, 0, 'N');
@@ -339,13 +341,13 @@ void gamma_upper_quant(double p, double a, double* q) {
       // Near 0, P(a,q) is q^a / Gamma(1+a): solve q^a = (1-p) Gamma(1+a),
       // with ln Gamma(1+a) = log(1 - a gammod(a)).
       const double s = (logs(-p) + logs(-gammod(a) * a)) / a;
-      if (s < kUnderflowLog) {
+      if (s < underflowLog()) {
         *q = 0.0;
         method = 2;
         code = 1;
       } else {
         *q = std::exp(s);
-        if (*q < kSeriesCutoff) {
+        if (*q < seriesCutoff()) {
           method = 3;
         } else {
           code = gamma_newton(q, 'U', p, a);
@@ -387,13 +389,13 @@ void gamma_lower_quant(double p, double a, double* q) {
   if (a <= 1.0) {
     // Near 0, P(a,q) is q^a / Gamma(1+a).
     const double s = (std::log(p) + logs(-gammod(a) * a)) / a;
-    if (s < kUnderflowLog) {
+    if (s < underflowLog()) {
       *q = 0.0;
       method = 1;
       code = 1;
     } else {
       *q = std::exp(s);
-      if (*q < kSeriesCutoff) {
+      if (*q < seriesCutoff()) {
         method = 2;
       } else {
         code = gamma_newton(q, 'L', p, a);

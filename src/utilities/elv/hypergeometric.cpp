@@ -14,6 +14,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -59,7 +60,7 @@ DirectTail directTail(bool above, unsigned long k, unsigned long N, unsigned lon
   auto runSeries = [&]() {
     return above ? hyper_Ik(k, N, M, n, &series) : hyper_Jk(k, N, M, n, &series);
   };
-  if (lm >= kUnderflowLog) {
+  if (lm >= underflowLog()) {
     if (runSeries() != 0) return DirectTail{-1.0, 4, base};
     tail.value = mass * series;
     tail.method = base;
@@ -72,10 +73,10 @@ DirectTail directTail(bool above, unsigned long k, unsigned long N, unsigned lon
   const double r = above ? upRatio(dk + 1.0, dN, dM, dn) : downRatio(dk, dN, dM, dn);
   double bound = lm;
   if (r > 0.0 && r < 1.0) bound = above ? lm + std::log(r / (1.0 - r)) : lm - std::log1p(-r);
-  if (bound < kUnderflowLog) return DirectTail{0.0, 1, base + 1};
+  if (bound < underflowLog()) return DirectTail{0.0, 1, base + 1};
   if (runSeries() != 0) return DirectTail{-1.0, 4, base + 1};
   const double logTail = std::log(series) + lm;
-  if (logTail < kUnderflowLog) return DirectTail{0.0, 1, base + 2};
+  if (logTail < underflowLog()) return DirectTail{0.0, 1, base + 2};
   return DirectTail{std::exp(logTail), 0, base + 3};
 }
 
@@ -117,7 +118,7 @@ int hyper_Ik(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
   // Forward pass: the number of terms until one falls below the cut-off.
   double term = 1.0, i = static_cast<double>(k);
   long length = 0;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     if (length >= kSeriesCap) {
       *out = -1.0;
       ELVexit("hyper_Ik", 4, 'F');
@@ -147,7 +148,7 @@ int hyper_Jk(unsigned long k, unsigned long N, unsigned long M, unsigned long n,
   const double lowest = std::max(0.0, dn - (dN - dM));
   double term = 1.0, i = static_cast<double>(k) + 1.0;
   long length = 0;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     if (length >= kSeriesCap) {
       *out = -1.0;
       ELVexit("hyper_Jk", 4, 'F');

@@ -10,6 +10,29 @@ namespace elv {
 
 // A logarithm below this counts as underflowed to 0.
 constexpr double kUnderflowLog = -662.34472;
+// The logarithm of the smallest normal double: the underflow limit on a
+// thread that asked for deep tails.
+constexpr double kDeepUnderflowLog = -708.3964185322641;
+
+// Deep tails: the exported distribution functions answer tails down to the
+// smallest normal double, below the routines' own underflow limit (where a
+// direct call reports an exact 0 with code 1). Set per thread by a scope.
+inline thread_local bool deepTails = false;
+
+inline double underflowLog() {
+  return deepTails ? kDeepUnderflowLog : kUnderflowLog;
+}
+
+class DeepTailScope {
+ public:
+  DeepTailScope() : saved_(deepTails) { deepTails = true; }
+  ~DeepTailScope() { deepTails = saved_; }
+  DeepTailScope(const DeepTailScope&) = delete;
+  DeepTailScope& operator=(const DeepTailScope&) = delete;
+
+ private:
+  bool saved_;
+};
 // A logarithm above this counts as overflowed (Gamma, expansions).
 constexpr double kOverflowLog = 709.78271;
 // Largest shape parameter, Poisson mean or sample size.
@@ -22,10 +45,8 @@ constexpr double kMaxDf = 189812530.0;
 constexpr double kWidthFactor = 6.1738;
 // A distribution argument below this counts as 0.
 constexpr double kTinyArgument = 2.2250738585072014e-288;
-// Term cut-off of the scaled series, relative step limit of Newton.
-constexpr double kSeriesCutoff = 1e-9;
-// Tail probability and relative stop limit of the Poisson-mixture sums.
-constexpr double kMixtureStop = 5e-10;
+// The term cut-off, Newton step limit and mixture stop are the precision
+// setting of precision.h.
 // Admissible probability argument of the quantile functions.
 constexpr double kMinQuantileP = 1e-12;
 constexpr double kMaxQuantileP = 0.5;
@@ -46,7 +67,7 @@ inline bool anyNan(double a, double b, double c) {
 
 // Exponential of a logarithm that may lie below the underflow limit.
 inline double expOrZero(double logValue) {
-  return logValue < kUnderflowLog ? 0.0 : std::exp(logValue);
+  return logValue < underflowLog() ? 0.0 : std::exp(logValue);
 }
 
 }  // namespace elv

@@ -6,6 +6,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/precision.h"
 
 namespace qel {
 namespace elv {
@@ -47,7 +48,7 @@ MixtureResult ended(MixtureResult result, MixtureEnd end, double sum) {
 }
 
 bool restNegligible(double ratio, double term, double sum) {
-  return ratio < 1.0 && term / (1.0 - ratio) / sum < kMixtureStop;
+  return ratio < 1.0 && term / (1.0 - ratio) / sum < mixtureStop();
 }
 
 }  // namespace
@@ -55,14 +56,16 @@ bool restNegligible(double ratio, double term, double sum) {
 long descendingMixtureStart(double L) {
   long k = 0;
   double f = 0.0;
-  poisson_upper_quant(&k, &f, kMixtureStop, L);
+  ELVstartup("poisson_upper_quant");
+  poissonUpperQuantile(&k, &f, mixtureStop(), L);
   return ELVerrno >= 2 ? -1 : k;
 }
 
 long ascendingMixtureStart(double L) {
   long k = 0;
   double f = 0.0;
-  poisson_lower_quant(&k, &f, kMixtureStop, L);
+  ELVstartup("poisson_lower_quant");
+  poissonLowerQuantile(&k, &f, mixtureStop(), L);
   return ELVerrno >= 2 ? -1 : k;
 }
 
@@ -89,7 +92,7 @@ MixtureResult descendingMixtureSum(const MixtureComponents& components, long k,
   }
   result.peak = result.last = j;
   const double logPeak = logPeakTerm(components, j, factor, settings);
-  if (logPeak < kUnderflowLog) return ended(result, MixtureEnd::Underflow, 0.0);
+  if (logPeak < underflowLog()) return ended(result, MixtureEnd::Underflow, 0.0);
 
   // Stage two: sum below the peak.
   double term = std::exp(logPeak);
@@ -132,7 +135,7 @@ MixtureResult ascendingMixtureSum(const MixtureComponents& components, long k,
   }
   result.peak = result.last = j;
   const double logPeak = logPeakTerm(components, j, factor, settings);
-  if (logPeak < kUnderflowLog) return ended(result, MixtureEnd::Underflow, 0.0);
+  if (logPeak < underflowLog()) return ended(result, MixtureEnd::Underflow, 0.0);
 
   // Stage two: sum above the peak.
   double term = std::exp(logPeak);

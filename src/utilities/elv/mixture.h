@@ -10,7 +10,7 @@
 // terms passed in units of the current term, so that nothing underflows
 // before the peak is known. Stage two takes the logarithm of the peak term
 // (an underflowing peak ends the sum with 0) and sums away from the peak until
-// the rest is below 5e-10 of the sum. A sum that passes a given limit ends at
+// the rest is below the mixture stop of the sum (precision.h). A sum that passes a given limit ends at
 // once, so that the caller can compute the smaller, complementary tail.
 #ifndef QEL_SRC_UTILITIES_ELVMIXTURE_H
 #define QEL_SRC_UTILITIES_ELVMIXTURE_H
@@ -56,10 +56,16 @@ struct MixtureResult {
 };
 
 // Start indices: the descending sum starts at the largest k with
-// P(K > k) <= 5e-10, the ascending one at the smallest k with
-// P(K <= k) > 5e-10, K Poisson with mean L. -1 when the quantile failed.
+// P(K > k) <= the mixture stop, the ascending one at the smallest k with
+// P(K <= k) > the mixture stop, K Poisson with mean L. -1 when the quantile
+// failed.
 long descendingMixtureStart(double L);
 long ascendingMixtureStart(double L);
+
+// The Poisson quantile searches behind poisson_upper_quant and
+// poisson_lower_quant, for any p in (0, 0.5] (no range code).
+void poissonUpperQuantile(long* k, double* f, double p, double m);
+void poissonLowerQuantile(long* k, double* f, double p, double m);
 
 // Sum over j from k down to 0; the series is taken at index k+1.
 MixtureResult descendingMixtureSum(const MixtureComponents& components, long k,

@@ -1,11 +1,16 @@
 // Standard normal distribution function for the ELV routines. Both tails are
-// computed: the smaller one directly as erfc(|x|/sqrt 2)/2, where erfc(z) is
-// the upper tail of the gamma law of shape 1/2 at z^2, and the larger as its
-// complement. The inverse over the whole open interval rides on the upper
-// quantile of normal_quantile.cpp.
+// computed: the smaller one directly as erfc(|x|/sqrt 2)/2 and the larger as
+// its complement. At full precision erfc comes from the scaled complementary
+// error function with an exact exponent (normal_precise.cpp); the historical
+// setting takes erfc(z) as the upper tail of the gamma law of shape 1/2 at z^2. The inverse over
+// the whole open interval rides on the upper quantile of normal_quantile.cpp.
 #include <qel/elv.h>
 
+#include <cmath>
+
 #include "utilities/elv/limits.h"
+#include "utilities/elv/normal_precise.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -36,7 +41,17 @@ void normal_df(double x, double* lower, double* upper) {
     ELVexit("normal_df", 2, 'F');
     return;
   }
-  if (x >= 0.0) {
+  if (elvPrecision() == ElvPrecision::Full) {
+    // The routine keeps its documented limits: erfc is 0 beyond 26.5694, and
+    // a tail below the underflow limit is an exact 0 with code 1.
+    double small = std::fabs(x) / kSqrt2 > kErfcZero ? 0.0 : normalUpperTail(std::fabs(x));
+    if (small > 0.0 && small < kTinyArgument) {
+      small = 0.0;
+      ELVexit("normal_df", 1, 'N');
+    }
+    *(x >= 0.0 ? upper : lower) = small;
+    *(x >= 0.0 ? lower : upper) = 1.0 - small;
+  } else if (x >= 0.0) {
     *upper = 0.5 * erfcByGamma(x / kSqrt2);
     *lower = 1.0 - *upper;
   } else {

@@ -1,12 +1,16 @@
-// Normal quantiles for the ELV routines: the starting value of algorithm
-// AS 111 (Beasley & Springer, 1977), refined by Newton's method on the gamma
-// law of shape 1/2, since P(Z > z) = Q(1/2, z^2/2)/2 for z >= 0.
+// Normal quantiles for the ELV routines. At full precision algorithm AS 241
+// (Wichura 1988, normal_precise.cpp); the historical setting takes the
+// starting value of algorithm AS 111 (Beasley & Springer, 1977), refined by
+// Newton's method on the gamma law of shape 1/2, since
+// P(Z > z) = Q(1/2, z^2/2)/2 for z >= 0.
 #include <qel/elv.h>
 
 #include <cerrno>
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/normal_precise.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -17,6 +21,11 @@ constexpr double kMinNormalP = 1e-100;
 // The positive z with upper tail p, under the routine name of the caller's
 // frame; range checked by the caller.
 void upperNormalQuantile(double p, double* z) {
+  if (elvPrecision() == ElvPrecision::Full) {
+    *z = -normalQuantile(p);
+    ELVexit("normal_upper_quant", 0, 'N');
+    return;
+  }
   const double d = 1.0 - 2.0 * p;
   if (d <= 1e-5) {
     *z = 1.2533141373155003 * d;  // sqrt(pi/2) (1 - 2p): linear near the centre

@@ -10,6 +10,8 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/mixture.h"
+#include "utilities/elv/precision.h"
 
 namespace {
 
@@ -25,7 +27,7 @@ extern "C" {
 int poisson_Ik(long k, double* out, double m) {
   double term = m / (k + 1.0);
   long n = 1;
-  while (term >= kSeriesCutoff) {
+  while (term >= seriesCutoff()) {
     if (n + 1 >= kMaxCount) {
       ELVsteps1 = 0;
       ELVexit("poisson_Ik", 4, 'F');
@@ -46,7 +48,7 @@ int poisson_Ik(long k, double* out, double m) {
 int poisson_Jk(long k, double* out, double m) {
   double term = 1.0;
   long n = 0;
-  while (n < k && term >= kSeriesCutoff) {
+  while (n < k && term >= seriesCutoff()) {
     if (n + 1 >= kMaxCount) {
       ELVsteps1 = 0;
       ELVexit("poisson_Jk", 4, 'F');
@@ -86,21 +88,21 @@ void poisson_df(long k, double m, double* lower, double* upper, double* mass) {
   if (k > m - 1.0) {
     // Upper tail P(X > k) = mass I.
     double I;
-    if (lm >= kUnderflowLog) {
+    if (lm >= underflowLog()) {
       if (poisson_Ik(k, &I, m) != 0) goto seriesFailure;
       *upper = *mass * I;
       ELVmethod = 20;
     } else {
       // I is at most r/(1-r), r = m/(k+1): a bound decides underflow early.
       const double r = m / (k + 1.0);
-      if (lm + std::log(r / (1.0 - r)) < kUnderflowLog) {
+      if (lm + std::log(r / (1.0 - r)) < underflowLog()) {
         *upper = 0.0;
         code = 1;
         ELVmethod = 21;
       } else {
         if (poisson_Ik(k, &I, m) != 0) goto seriesFailure;
         const double logUpper = std::log(I) + lm;
-        if (logUpper < kUnderflowLog) {
+        if (logUpper < underflowLog()) {
           *upper = 0.0;
           code = 1;
           ELVmethod = 22;
@@ -114,18 +116,18 @@ void poisson_df(long k, double m, double* lower, double* upper, double* mass) {
   } else {
     // Lower tail P(X <= k) = mass J, J at most 1/(1 - k/m).
     double J;
-    if (lm >= kUnderflowLog) {
+    if (lm >= underflowLog()) {
       if (poisson_Jk(k, &J, m) != 0) goto seriesFailure;
       *lower = *mass * J;
       ELVmethod = 10;
-    } else if (lm - std::log(1.0 - k / m) < kUnderflowLog) {
+    } else if (lm - std::log(1.0 - k / m) < underflowLog()) {
       *lower = 0.0;
       code = 1;
       ELVmethod = 11;
     } else {
       if (poisson_Jk(k, &J, m) != 0) goto seriesFailure;
       const double logLower = std::log(J) + lm;
-      if (logLower < kUnderflowLog) {
+      if (logLower < underflowLog()) {
         *lower = 0.0;
         code = 1;
         ELVmethod = 12;
@@ -163,12 +165,33 @@ extern "C" {
 
 // Largest k with P(X > k) <= p, and f = (p - P(X > k))/P(X = k).
 void poisson_upper_quant(long* k, double* f, double p, double m) {
-  static const char* const name = "poisson_upper_quant";
-  ELVstartup(name);
+  ELVstartup("poisson_upper_quant");
   if (quantileArgumentsRefused(p, m)) {
-    ELVexit(name, 2, 'F');
+    ELVexit("poisson_upper_quant", 2, 'F');
     return;
   }
+  qel::elv::poissonUpperQuantile(k, f, p, m);
+}
+
+// Smallest k with P(X <= k) > p, and f = (p - P(X < k))/P(X = k).
+void poisson_lower_quant(long* k, double* f, double p, double m) {
+  ELVstartup("poisson_lower_quant");
+  if (quantileArgumentsRefused(p, m)) {
+    ELVexit("poisson_lower_quant", 2, 'F');
+    return;
+  }
+  qel::elv::poissonLowerQuantile(k, f, p, m);
+}
+
+}  // extern "C"
+
+namespace qel {
+namespace elv {
+
+// The quantile searches without the range check of the probability (the
+// mixture sums ask for tails far below 1e-12); p must lie in (0, 0.5].
+void poissonUpperQuantile(long* k, double* f, double p, double m) {
+  static const char* const name = "poisson_upper_quant";
   double start;
   if (m < 5e-13) {
     start = 0.0;
@@ -208,14 +231,8 @@ void poisson_upper_quant(long* k, double* f, double p, double m) {
   ELVexit(name, 0, 'N');
 }
 
-// Smallest k with P(X <= k) > p, and f = (p - P(X < k))/P(X = k).
-void poisson_lower_quant(long* k, double* f, double p, double m) {
+void poissonLowerQuantile(long* k, double* f, double p, double m) {
   static const char* const name = "poisson_lower_quant";
-  ELVstartup(name);
-  if (quantileArgumentsRefused(p, m)) {
-    ELVexit(name, 2, 'F');
-    return;
-  }
   long j;
   double mass, r;
   if (m <= 36.0) {
@@ -254,4 +271,5 @@ void poisson_lower_quant(long* k, double* f, double p, double m) {
   ELVexit(name, 0, 'N');
 }
 
-}  // extern "C"
+}  // namespace elv
+}  // namespace qel

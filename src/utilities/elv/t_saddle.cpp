@@ -60,7 +60,7 @@ struct Integrand {
   }
   double scaled(double s) const {
     const double v = logValue(s) - logScale;
-    return v < kUnderflowLog ? 0.0 : std::exp(v);
+    return v < underflowLog() ? 0.0 : std::exp(v);
   }
 };
 
@@ -131,7 +131,7 @@ double t_saddle_integral(double t, double df, double delta) {
   const double logConstant = std::log(2.0) + std::log(halfDf) - ln_scaled_gamma(halfDf);
   if (!(sum > 0.0)) return 0.0;
   const double logResult = logConstant + f.logScale + std::log(sum);
-  if (logResult < kUnderflowLog) return 0.0;
+  if (logResult < underflowLog()) return 0.0;
   const double result = std::exp(logResult);
   return result > 1.0 ? 1.0 : result;
 }

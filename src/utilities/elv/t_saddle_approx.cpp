@@ -112,7 +112,7 @@ double t_saddle_approx(double t, double df, double delta) {
   // double range their logarithm fails the underflow test and they are
   // dropped, leaving the leading term (z is then tiny and P near 1/2).
   Coefficients c{0.0, 0.0};
-  if (4.0 * std::log(u) > kUnderflowLog) c = coefficients(p, r, u, W);
+  if (4.0 * std::log(u) > underflowLog()) c = coefficients(p, r, u, W);
   const NormalTail tail = normalTail(z);
   const double bracket = 1.0 + c.c1 / sqrtDf * tail.g + c.c2 / df * (1.0 - z * tail.g);
   const double A = (12.0 * k * k - 21.0 * k + 10.0) / (12.0 * k * k * k);
@@ -125,7 +125,7 @@ double t_saddle_approx(double t, double df, double delta) {
                          0.5 * std::log(2.0 * M_PI / df) + std::log(W / u) - 0.5 * std::log(k) +
                          std::log(correction);
   const double logResult = logLead + tail.logQ + std::log(bracket);
-  if (logResult < kUnderflowLog) return 0.0;
+  if (logResult < underflowLog()) return 0.0;
   const double result = std::exp(logResult);
   return result > 1.0 ? 1.0 : result;
 }

@@ -1,0 +1,105 @@
+// Double-precision normal tail and quantile (see normal_precise.h).
+//
+// Tail: P(Z > x) = erfc(x/sqrt 2)/2 = exp(-x^2/2) erfcx(x/sqrt 2)/2, with the
+// scaled complement erfcx of ACM TOMS 708 (DiDonato & Morris 1992). The
+// exponent is where a far tail loses its digits: x^2/2 near 700 carries a
+// rounding error of 700 ulp into exp. As in Cody's ANORM (ACM TOMS 715),
+// x is split into a head with four fractional bits, whose square is exact,
+// and a small rest: x^2 = h^2 + (x - h)(x + h), the second term being small
+// enough that its rounding error is negligible.
+//
+// Quantile: algorithm AS 241 (PPND16) of Wichura, Applied Statistics 37
+// (1988) 477-484, coefficients as published; rational approximations in
+// q = p - 1/2 near the centre and in r = sqrt(-ln min(p, 1-p)) in the tails.
+#include "utilities/elv/normal_precise.h"
+
+#include <cmath>
+
+#include "utilities/special_functions/transcendental.h"
+
+namespace qel {
+namespace elv {
+
+namespace {
+
+constexpr double kInvSqrt2 = 0.70710678118654752440;
+// Beyond this P(Z > x) is below the smallest subnormal double.
+constexpr double kTailZero = 38.6;
+
+double horner(const double* c, int n, double t) {
+  double s = c[n - 1];
+  for (int i = n - 2; i >= 0; --i) s = s * t + c[i];
+  return s;
+}
+
+// AS 241 coefficients, lowest power first; the denominators' leading 1 is
+// written out.
+const double kA[8] = {3.3871328727963666080e+00, 1.3314166789178437745e+02,
+                      1.9715909503065514427e+03, 1.3731693765509461125e+04,
+                      4.5921953931549871457e+04, 6.7265770927008700853e+04,
+                      3.3430575583588128105e+04, 2.5090809287301226727e+03};
+const double kB[8] = {1.0,
+                      4.2313330701600911252e+01,
+                      6.8718700749205790830e+02,
+                      5.3941960214247511077e+03,
+                      2.1213794301586595867e+04,
+                      3.9307895800092710610e+04,
+                      2.8729085735721942674e+04,
+                      5.2264952788528545610e+03};
+const double kC[8] = {1.42343711074968357734e+00, 4.63033784615654529590e+00,
+                      5.76949722146069140550e+00, 3.64784832476320460504e+00,
+                      1.27045825245236838258e+00, 2.41780725177450611770e-01,
+                      2.27238449892691845833e-02, 7.74545014278341407640e-04};
+const double kD[8] = {1.0,
+                      2.05319162663775882187e+00,
+                      1.67638483018380384940e+00,
+                      6.89767334985100004550e-01,
+                      1.48103976427480074590e-01,
+                      1.51986665636164571966e-02,
+                      5.47593808499534494600e-04,
+                      1.05075007164441684324e-09};
+const double kE[8] = {6.65790464350110377720e+00, 5.46378491116411436990e+00,
+                      1.78482653991729133580e+00, 2.96560571828504891230e-01,
+                      2.65321895265761230930e-02, 1.24266094738807843860e-03,
+                      2.71155556874348757815e-05, 2.01033439929228813265e-07};
+const double kF[8] = {1.0,
+                      5.99832206555887937690e-01,
+                      1.36929880922735805310e-01,
+                      1.48753612908506148525e-02,
+                      7.86869131145613259100e-04,
+                      1.84631831751005468180e-05,
+                      1.42151175831644588870e-07,
+                      2.04426310338993978564e-15};
+
+}  // namespace
+
+double normalUpperTail(double x) {
+  const double z = x * kInvSqrt2;
+  if (z <= 0.5) return 0.5 * erfc1(0, z);
+  if (x > kTailZero) return 0.0;
+  const double head = std::trunc(x * 16.0) / 16.0;
+  const double rest = (x - head) * (x + head);
+  return 0.5 * std::exp(-0.5 * head * head) * std::exp(-0.5 * rest) * erfc1(1, z);
+}
+
+double normalQuantile(double p) {
+  const double q = p - 0.5;
+  if (std::fabs(q) <= 0.425) {
+    const double r = 0.180625 - q * q;
+    return q * horner(kA, 8, r) / horner(kB, 8, r);
+  }
+  const double small = q < 0.0 ? p : 1.0 - p;
+  double r = std::sqrt(-std::log(small));
+  double z;
+  if (r <= 5.0) {
+    r -= 1.6;
+    z = horner(kC, 8, r) / horner(kD, 8, r);
+  } else {
+    r -= 5.0;
+    z = horner(kE, 8, r) / horner(kF, 8, r);
+  }
+  return q < 0.0 ? -z : z;
+}
+
+}  // namespace elv
+}  // namespace qel
