@@ -355,3 +355,15 @@ run(0 "^cdf 2\\.08848758376254[0-9]*e-45\n$" range cdf 20 --k 2 --upper)
 run(0 "^inv 3\\.314493[0-9]*\n$" range inv 0.95 --k 3)
 run(2 "^$" range cdf 1 --k 1)
 run(2 "^$" range inv 0.95 --k 3 --upper)
+
+# group: a missing cell is a group of its own, last; frequencies and a
+# weighted mean; defined order; all combinations with an empty group.
+file(WRITE ${WORK}/qelcalc_group.csv "g,h,v,f\n2,8,1.5,1\n1,7,2,2\n2,7,3.5,1\n*,7,4,1\n,8,5,3\n1,8,*,1\n")
+run(0 "^1 2 2\n2 2 2\\.5\n\\* 2 4\\.5\n$" group ${WORK}/qelcalc_group.csv --by 1 --value-column 3)
+run(0 "^1 7 2 2\n1 8 1 NaN\n2 7 1 3\\.5\n2 8 1 1\\.5\n\\* 7 1 4\n\\* 8 3 5\n$"
+    group ${WORK}/qelcalc_group.csv --by 1,2 --all-combinations --value-column 3 --freq 4)
+run(0 "^2 2\n1 2\n\\* 2\n$" group ${WORK}/qelcalc_group.csv --by 1 --order defined --levels 2)
+run(0 "^1 0\n2 1\n3 0\n4 2\n5 2\n6 1\n$" group ${WORK}/qelcalc_group.csv --by 1 --order defined --levels 2 --indicators)
+run(2 "^$" group ${WORK}/qelcalc_group.csv --by 9)
+run(2 "^$" group ${WORK}/qelcalc_group.csv --by 1 --order sideways)
+run(2 "^$" group ${WORK}/qelcalc_group.csv)

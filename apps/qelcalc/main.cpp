@@ -15,6 +15,7 @@
 #include "proportion_variance_mode.h"
 #include "power_mode.h"
 #include "gof_mode.h"
+#include "group_mode.h"
 #include "pvalue_mode.h"
 #include "quad_mode.h"
 #include "rank_test_mode.h"
@@ -46,6 +47,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printQuadUsage(out);
   qelcalc::printSintUsage(out);
   qelcalc::printRangeUsage(out);
+  qelcalc::printGroupUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -81,6 +83,7 @@ int main(int argc, char** argv) {
     if (mode == "quad") return qelcalc::runQuadMode(argc, argv, std::cout);
     if (mode == "sint") return qelcalc::runSintMode(argc, argv, std::cout);
     if (mode == "range") return qelcalc::runRangeMode(argc, argv, std::cout);
+    if (mode == "group") return qelcalc::runGroupMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";
