@@ -3,6 +3,7 @@
 
 #include <cstddef>
 
+#include "proxies/value_index.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace qel {
@@ -34,16 +35,21 @@ void CmDistinctValues<T>::mFindDistinctValues(const CmColumnVar<T>* column, cons
   const std::vector<T>* data = dataOf(column);
   const long long length = data != nullptr ? static_cast<long long>(data->size()) : 0;
   const int count = rows.mGetRowCt();
-  // try_emplace looks the value up first and allocates a node only for a
-  // value not yet present.
-  int next = 0;
+  // A flat hash finds the distinct values in one pass; only they go into
+  // the map, in the order first met.
+  CmValueIndex seen;
+  std::vector<T> firstMet;
   for (int i = 0; i < count; ++i) {
     const int row = rows.mGetRow(i);
     if (row < 1 || row > length) continue;
     const T value = (*data)[static_cast<std::size_t>(row - 1)];
-    const auto placed = mMap.try_emplace(value, -1);
-    if (mode == eFirstEncounteredSortOrder && placed.second) placed.first->second = next++;
+    bool inserted = false;
+    seen.mFindOrInsert(value, &inserted);
+    if (inserted) firstMet.push_back(value);
   }
+  int next = 0;
+  for (const T& value : firstMet)
+    mMap.emplace(value, mode == eFirstEncounteredSortOrder ? next++ : -1);
   if (mode == eValueListSortOrder && column->mGetOrdering() != nullptr) {
     for (const T& value : *column->mGetOrdering()) {
       const auto found = mMap.find(value);

@@ -14,6 +14,7 @@
 #include <limits>
 #include <utility>
 
+#include "proxies/value_index.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace qel {
@@ -218,26 +219,25 @@ void CmGrouping<T>::mBuildSortKeys(const CbRows& rows, std::vector<std::vector<i
       for (std::size_t r = 0; r < placed.size(); ++r)
         order[at(placed[r].second)] = static_cast<int>(r);
     }
+    // Each row's value to its place, through a flat hash of the distinct
+    // values (inserted in subscript order, so that ids are subscripts).
+    std::vector<T> values;
+    distinct.mGetDistinctValues(values);
+    CmValueIndex index;
+    bool inserted = false;
+    for (const T& value : values) index.mFindOrInsert(value, &inserted);
     const std::vector<T>& data = *mColumns[c]->mGetDataValues();
     std::vector<int>& rank = ranks[c];
     rank.resize(at(n));
-    // Sorted or clustered columns repeat values: remember the last look-up.
-    T last = 0;
-    int lastRank = -1;
-    for (int p = 0; p < n; ++p) {
-      const T value = data[at(rows.mGetRow(p) - 1)];
-      if (lastRank < 0 || !(value == last)) {
-        last = value;
-        lastRank = order[at(distinct.mGetSubscript(value))];
-      }
-      rank[at(p)] = lastRank;
-    }
+    for (int p = 0; p < n; ++p) rank[at(p)] = order[at(index.mFind(data[at(rows.mGetRow(p) - 1)]))];
   }
 }
 
 template <typename T>
 void CmGrouping<T>::mSortPositions(const std::vector<std::vector<int>>& ranks,
-                                   std::vector<int>& order) const {
+                                   std::vector<int>& order,
+                                   std::vector<std::uint64_t>& sortedKeys) const {
+  sortedKeys.clear();
   const std::size_t n = ranks.empty() ? 0 : ranks.front().size();
   std::uint64_t range = 1;
   bool fits = true;
@@ -267,6 +267,8 @@ void CmGrouping<T>::mSortPositions(const std::vector<std::vector<int>>& ranks,
   }
   if (range <= 4 * static_cast<std::uint64_t>(n) + 4096) {
     countingSort(combined, range, order);
+    sortedKeys.resize(n);
+    for (std::size_t p = 0; p < n; ++p) sortedKeys[p] = combined[at(order[p])];
     return;
   }
   std::vector<std::pair<std::uint64_t, int>> pairs(n);
@@ -274,7 +276,11 @@ void CmGrouping<T>::mSortPositions(const std::vector<std::vector<int>>& ranks,
   mMergeSort(pairs, [](const std::pair<std::uint64_t, int>& a,
                        const std::pair<std::uint64_t, int>& b) { return a.first < b.first; });
   order.resize(n);
-  for (std::size_t p = 0; p < n; ++p) order[p] = pairs[p].second;
+  sortedKeys.resize(n);
+  for (std::size_t p = 0; p < n; ++p) {
+    order[p] = pairs[p].second;
+    sortedKeys[p] = pairs[p].first;
+  }
 }
 
 template <typename T>
@@ -296,14 +302,20 @@ int CmGrouping<T>::mFindRowNumbersForGroups(const CbRows& rows, bool useRowNumbe
   std::vector<std::vector<int>> ranks;
   mBuildSortKeys(rows, ranks);
   std::vector<int> order;
-  mSortPositions(ranks, order);
+  std::vector<std::uint64_t> sortedKeys;
+  mSortPositions(ranks, order, sortedKeys);
 
   const std::size_t columns = mColumns.size();
   std::size_t start = 0;
   while (start < order.size()) {
     const std::size_t first = at(order[start]);
     std::size_t end = start + 1;
-    while (end < order.size()) {
+    // Equal combined places are equal values; without them (places beyond
+    // 64 bits) the columns are compared one by one.
+    if (!sortedKeys.empty()) {
+      while (end < order.size() && sortedKeys[end] == sortedKeys[start]) ++end;
+    }
+    while (sortedKeys.empty() && end < order.size()) {
       const std::size_t next = at(order[end]);
       std::size_t c = columns;
       while (c-- > 0 && ranks[c][next] == ranks[c][first]) {

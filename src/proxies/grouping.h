@@ -6,6 +6,7 @@
 #define QEL_SRC_PROXIES_GROUPING_H
 
 #include <cstddef>
+#include <cstdint>
 #include <vector>
 
 #include "proxies/Frequencies.h"
@@ -176,7 +177,8 @@ class CmGrouping {
  private:
   int mFindRowNumbersForGroups(const CbRows& rows, bool useRowNumbers);
   void mBuildSortKeys(const CbRows& rows, std::vector<std::vector<int>>& ranks);
-  void mSortPositions(const std::vector<std::vector<int>>& ranks, std::vector<int>& order) const;
+  void mSortPositions(const std::vector<std::vector<int>>& ranks, std::vector<int>& order,
+                      std::vector<std::uint64_t>& sortedKeys) const;
   bool mValidGroup(int group) const { return group >= 0 && group < mGroupCount; }
 
   std::vector<const CmColumnVar<T>*> mColumns;

@@ -43,10 +43,11 @@ struct Model {
 Model model(const std::vector<std::vector<double>>& data, const std::vector<int>& modes,
             const std::vector<std::vector<double>>& lists, const std::vector<int>& rows, bool all) {
   const std::size_t nc = data.size();
+  std::vector<std::vector<double>> seqs(nc);
+  for (std::size_t c = 0; c < nc; ++c)
+    for (int r : rows) seqs[c].push_back(data[c][r - 1]);
   auto key = [&](int row, bool wholeColumn, std::size_t c) {
-    std::vector<double> seq;
-    for (int r : rows) seq.push_back(data[c][r - 1]);
-    return keyOf(data[c][row - 1], modes[c], wholeColumn ? data[c] : seq, lists[c]);
+    return keyOf(data[c][row - 1], modes[c], wholeColumn ? data[c] : seqs[c], lists[c]);
   };
   std::vector<int> sorted = rows;
   std::stable_sort(sorted.begin(), sorted.end(), [&](int a, int b) {
@@ -88,6 +89,42 @@ Model model(const std::vector<std::vector<double>>& data, const std::vector<int>
   return m;
 }
 
+// Groups, their order, values and members against the model; mGetGroup
+// against the indicators on every row.
+void checkAgainstModel(const std::vector<std::vector<double>>& data, const std::vector<int>& modes,
+                       const std::vector<std::vector<double>>& lists, const std::vector<Col>& cols,
+                       const std::vector<int>& rows, int order, bool all, int trial) {
+  std::vector<const Col*> ptrs;
+  for (const Col& c : cols) ptrs.push_back(&c);
+  CbRows set;
+  set.mInitialize(rows);
+  Grouping grouping;
+  if (order == 0) grouping.mUseNaturalOrder();
+  if (order == 1) grouping.mUseFirstEncounteredOrder();
+  ASSERT_EQ(grouping.mFindGrouping(ptrs, set, false, all, true), 0);
+  const Model m = model(data, modes, lists, rows, all);
+  ASSERT_EQ(grouping.mGetNumberOfGroups(), int(m.values.size())) << trial;
+  std::vector<int> indicators, members;
+  grouping.mGetGroupIndicators(indicators);
+  for (int gr = 0; gr < grouping.mGetNumberOfGroups(); ++gr) {
+    Tuple values;
+    grouping.mGetValues(gr, values);
+    grouping.mGetRowsInGroup(gr, members);
+    EXPECT_EQ(values, m.values[gr]) << trial << " group " << gr;
+    EXPECT_EQ(members, m.members[gr]) << trial << " group " << gr;
+  }
+  for (int r : rows) {
+    const int gr = grouping.mGetGroup(r);
+    ASSERT_EQ(gr, indicators[r - 1]) << trial << " row " << r;
+    ASSERT_GE(gr, 0);
+    EXPECT_EQ(m.members[gr].size(),
+              std::size_t(std::count(indicators.begin(), indicators.end(), gr)));
+  }
+  CbRows recovered;
+  grouping.mRecoverRowsToUse(recovered);
+  ASSERT_EQ(recovered.mGetRowCt(), int(rows.size()));
+}
+
 TEST(Grouping, AgreesWithPlainModelOnRandomColumns) {
   std::mt19937 g(25);
   const double missing = qel::mGetMissingValueCode();
@@ -97,7 +134,6 @@ TEST(Grouping, AgreesWithPlainModelOnRandomColumns) {
     std::vector<std::vector<double>> data(nc, std::vector<double>(n)), lists(nc);
     std::vector<int> modes(nc);
     std::vector<Col> cols(nc);
-    std::vector<const Col*> ptrs;
     for (int c = 0; c < nc; ++c) {
       const int k = 1 + int(g() % 5);
       for (auto& v : data[c]) v = g() % 9 == 0 ? missing : 0.5 * double(g() % k) - 1;
@@ -108,39 +144,31 @@ TEST(Grouping, AgreesWithPlainModelOnRandomColumns) {
       modes[c] = order == 0 ? 0 : order == 1 ? 1 : int(g() % 3);
       cols[c] = Col(&data[c], qel::EDefinedSortOrder(modes[c]));
       if (modes[c] == 2) cols[c].mSetSortOrder(&lists[c]);
-      ptrs.push_back(&cols[c]);
     }
     std::vector<int> rows;
-    CbRows set;
     const int kind = trial % 4;  // all rows, compressed prefix, ascending, shuffled subset
     for (int r = 1; r <= n; ++r)
       if (kind < 2 ? (kind == 0 || r <= (n + 1) / 2) : g() % 3 != 0) rows.push_back(r);
     if (kind == 3) std::shuffle(rows.begin(), rows.end(), g);
-    set.mInitialize(rows);
-    Grouping grouping;
-    if (order == 0) grouping.mUseNaturalOrder();
-    if (order == 1) grouping.mUseFirstEncounteredOrder();
-    ASSERT_EQ(grouping.mFindGrouping(ptrs, set, false, all, true), 0);
-    const Model m = model(data, modes, lists, rows, all);
-    ASSERT_EQ(grouping.mGetNumberOfGroups(), int(m.values.size())) << trial;
-    std::vector<int> indicators, members;
-    grouping.mGetGroupIndicators(indicators);
-    for (int gr = 0; gr < grouping.mGetNumberOfGroups(); ++gr) {
-      Tuple values;
-      grouping.mGetValues(gr, values);
-      grouping.mGetRowsInGroup(gr, members);
-      ASSERT_EQ(values, m.values[gr]) << trial << " group " << gr;
-      ASSERT_EQ(members, m.members[gr]) << trial << " group " << gr;
+    checkAgainstModel(data, modes, lists, cols, rows, order, all, trial);
+  }
+}
+
+// Many distinct values: the combined places exceed the counting range (two
+// columns) or 64 bits (six columns), so the other sort paths run.
+TEST(Grouping, ManyDistinctValuesAgreeWithPlainModel) {
+  std::mt19937 g(26);
+  for (const int nc : {2, 6}) {
+    const int n = 3000;
+    std::vector<std::vector<double>> data(nc, std::vector<double>(n)), lists(nc);
+    std::vector<Col> cols;
+    for (int c = 0; c < nc; ++c) {
+      for (auto& v : data[c]) v = double(g() % (c == 0 && nc == 2 ? 50 : 3000));
+      cols.emplace_back(&data[c], qel::eNaturalSortOrder);
     }
-    for (int r : rows) {
-      ASSERT_EQ(grouping.mGetGroup(r), indicators[r - 1]) << trial << " row " << r;
-      ASSERT_EQ(
-          m.members[grouping.mGetGroup(r)].size(),
-          std::size_t(std::count(indicators.begin(), indicators.end(), grouping.mGetGroup(r))));
-    }
-    CbRows recovered;
-    grouping.mRecoverRowsToUse(recovered);
-    ASSERT_EQ(recovered.mGetRowCt(), int(rows.size()));
+    std::vector<int> rows(n);
+    for (int r = 0; r < n; ++r) rows[r] = n - r;
+    checkAgainstModel(data, std::vector<int>(nc, 0), lists, cols, rows, 0, false, nc);
   }
 }
 
