@@ -29,6 +29,12 @@ int CmDistinctValues<T>::mMode() const {
 
 template <typename T>
 void CmDistinctValues<T>::mFindDistinctValues(const CmColumnVar<T>* column, const CbRows& rows) {
+  mFindDistinctValues(column, rows, nullptr);
+}
+
+template <typename T>
+void CmDistinctValues<T>::mFindDistinctValues(const CmColumnVar<T>* column, const CbRows& rows,
+                                              std::vector<int>* positionSubscripts) {
   mColumn = column;
   const int mode = mMode();
   mMap.clear();
@@ -39,13 +45,16 @@ void CmDistinctValues<T>::mFindDistinctValues(const CmColumnVar<T>* column, cons
   // the map, in the order first met.
   CmValueIndex seen;
   std::vector<T> firstMet;
+  if (positionSubscripts != nullptr)
+    positionSubscripts->assign(static_cast<std::size_t>(count), -1);
   for (int i = 0; i < count; ++i) {
     const int row = rows.mGetRow(i);
     if (row < 1 || row > length) continue;
     const T value = (*data)[static_cast<std::size_t>(row - 1)];
     bool inserted = false;
-    seen.mFindOrInsert(value, &inserted);
+    const int id = seen.mFindOrInsert(value, &inserted);
     if (inserted) firstMet.push_back(value);
+    if (positionSubscripts != nullptr) (*positionSubscripts)[static_cast<std::size_t>(i)] = id;
   }
   int next = 0;
   for (const T& value : firstMet)
@@ -60,6 +69,14 @@ void CmDistinctValues<T>::mFindDistinctValues(const CmColumnVar<T>* column, cons
     for (auto& entry : mMap) {
       if (entry.second < 0) entry.second = next++;
     }
+  }
+  if (positionSubscripts != nullptr) {
+    // First-met ids to subscripts; skipped rows keep the unknown subscript.
+    std::vector<int> subscriptOfId(firstMet.size());
+    for (std::size_t id = 0; id < firstMet.size(); ++id)
+      subscriptOfId[id] = mMap.find(firstMet[id])->second;
+    for (int& s : *positionSubscripts)
+      s = s < 0 ? unknownSubscript() : subscriptOfId[static_cast<std::size_t>(s)];
   }
   mColumn = column;
 }

@@ -36,6 +36,10 @@ class CmDistinctValues {
   // Rows outside the column (below 1 or beyond its length) are skipped.
   void mFindDistinctValues(const CmColumnVar<T>* column, const CbRows& rows);
   void mFindDistinctValues(const CmColumnVar<T>* column);
+  // The main form that also gives the subscript of the value at each
+  // position of rows, in the same pass.
+  void mFindDistinctValues(const CmColumnVar<T>* column, const CbRows& rows,
+                           std::vector<int>* positionSubscripts);
   void mFindDistinctValues(const CmColumnVar<T>* column, const std::vector<int>& rows);
 
   int mGetDistinctValueCt() const { return static_cast<int>(mMap.size()); }

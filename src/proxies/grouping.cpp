@@ -79,13 +79,22 @@ std::vector<double> wholeColumnSubscripts(const CmColumnVar<double>* column,
 
 // Stable counting sort of positions 0 .. n - 1 by keys below range.
 void countingSort(const std::vector<std::uint64_t>& keys, std::uint64_t range,
-                  std::vector<int>& order) {
+                  std::vector<int>& order, std::vector<std::uint64_t>& sortedKeys) {
   std::vector<int> starts(static_cast<std::size_t>(range) + 1, 0);
   for (const auto key : keys) ++starts[static_cast<std::size_t>(key) + 1];
   for (std::size_t k = 1; k < starts.size(); ++k) starts[k] += starts[k - 1];
   order.assign(keys.size(), 0);
   for (std::size_t p = 0; p < keys.size(); ++p)
     order[at(starts[static_cast<std::size_t>(keys[p])]++)] = static_cast<int>(p);
+  // Bucket k now ends at starts[k]: the sorted keys without a gather.
+  sortedKeys.resize(keys.size());
+  std::size_t from = 0;
+  for (std::size_t k = 0; k + 1 < starts.size(); ++k) {
+    const auto to = static_cast<std::size_t>(starts[k]);
+    std::fill(sortedKeys.begin() + static_cast<std::ptrdiff_t>(from),
+              sortedKeys.begin() + static_cast<std::ptrdiff_t>(to), static_cast<std::uint64_t>(k));
+    from = to;
+  }
 }
 
 }  // namespace
@@ -147,10 +156,14 @@ int CmGrouping<T>::mFindGrouping(const std::vector<const CmColumnVar<T>*>& colum
     CmDistinctValues<T> distinct;
     if (mNatural) distinct.mUseNaturalOrder();
     if (mFirstEncountered) distinct.mUseFirstEncounteredOrder();
-    distinct.mFindDistinctValues(column, usable);
+    mSubscriptsOfPositions.emplace_back();
+    distinct.mFindDistinctValues(column, usable, &mSubscriptsOfPositions.back());
     mDistinct.push_back(std::move(distinct));
   }
-  return mFindRowNumbersForGroups(usable, useRowNumbers);
+  const int code = mFindRowNumbersForGroups(usable, useRowNumbers);
+  mSubscriptsOfPositions.clear();
+  mSubscriptsOfPositions.shrink_to_fit();
+  return code;
 }
 
 template <typename T>
@@ -194,7 +207,6 @@ int CmGrouping<T>::mFindGrouping(const CmColumnVar<T>* column, bool unused, bool
 
 template <typename T>
 void CmGrouping<T>::mBuildSortKeys(const CbRows& rows, std::vector<std::vector<int>>& ranks) {
-  const int n = rows.mGetRowCt();
   mOrder.assign(mColumns.size(), {});
   ranks.assign(mColumns.size(), {});
   for (std::size_t c = 0; c < mColumns.size(); ++c) {
@@ -205,8 +217,10 @@ void CmGrouping<T>::mBuildSortKeys(const CbRows& rows, std::vector<std::vector<i
     // Natural and list orders are the subscript order itself. First-encounter
     // order follows the whole column (a value first met before the row set
     // begins still comes first), while the subscripts follow the row set:
-    // the groups are placed by the whole column's subscripts, ranked.
-    if (modeOf(mColumns[c], mNatural, mFirstEncountered) == eFirstEncounteredSortOrder) {
+    // the groups are placed by the whole column's subscripts, ranked. Over
+    // rows 1 .. m the two orders agree.
+    if (modeOf(mColumns[c], mNatural, mFirstEncountered) == eFirstEncounteredSortOrder &&
+        !rows.mIsUseAllRows()) {
       CmDistinctValues<T> whole;
       whole.mUseFirstEncounteredOrder();
       whole.mFindDistinctValues(mColumns[c]);
@@ -219,17 +233,10 @@ void CmGrouping<T>::mBuildSortKeys(const CbRows& rows, std::vector<std::vector<i
       for (std::size_t r = 0; r < placed.size(); ++r)
         order[at(placed[r].second)] = static_cast<int>(r);
     }
-    // Each row's value to its place, through a flat hash of the distinct
-    // values (inserted in subscript order, so that ids are subscripts).
-    std::vector<T> values;
-    distinct.mGetDistinctValues(values);
-    CmValueIndex index;
-    bool inserted = false;
-    for (const T& value : values) index.mFindOrInsert(value, &inserted);
-    const std::vector<T>& data = *mColumns[c]->mGetDataValues();
-    std::vector<int>& rank = ranks[c];
-    rank.resize(at(n));
-    for (int p = 0; p < n; ++p) rank[at(p)] = order[at(index.mFind(data[at(rows.mGetRow(p) - 1)]))];
+    // Each position's subscript (found with the distinct values) to its place.
+    std::vector<int>& rank = mSubscriptsOfPositions[c];
+    for (int& r : rank) r = order[at(r)];
+    ranks[c].swap(rank);
   }
 }
 
@@ -266,9 +273,7 @@ void CmGrouping<T>::mSortPositions(const std::vector<std::vector<int>>& ranks,
       combined[p] = combined[p] * k + static_cast<std::uint64_t>(ranks[c][p]);
   }
   if (range <= 4 * static_cast<std::uint64_t>(n) + 4096) {
-    countingSort(combined, range, order);
-    sortedKeys.resize(n);
-    for (std::size_t p = 0; p < n; ++p) sortedKeys[p] = combined[at(order[p])];
+    countingSort(combined, range, order, sortedKeys);
     return;
   }
   std::vector<std::pair<std::uint64_t, int>> pairs(n);

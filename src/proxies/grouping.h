@@ -193,6 +193,8 @@ class CmGrouping {
   // subscripts of its values (column after column).
   std::vector<std::vector<int>> mOrder;
   std::vector<int> mGroupSubscripts;
+  // Scratch of mFindGrouping: the subscript at each row position, per column.
+  std::vector<std::vector<int>> mSubscriptsOfPositions;
 };
 
 extern template class CmGrouping<double>;
