@@ -367,3 +367,11 @@ run(0 "^1 0\n2 1\n3 0\n4 2\n5 2\n6 1\n$" group ${WORK}/qelcalc_group.csv --by 1 
 run(2 "^$" group ${WORK}/qelcalc_group.csv --by 9)
 run(2 "^$" group ${WORK}/qelcalc_group.csv --by 1 --order sideways)
 run(2 "^$" group ${WORK}/qelcalc_group.csv)
+
+# ranks: R's rank(c(3, NA, 1, 3, 2), na.last = "keep") is 3.5 NA 1 3.5 2;
+# rank(-x, ties.method = "last", na.last = "keep") is 2 NA 4 1 3.
+file(WRITE ${WORK}/qelcalc_ranks.txt "3\n*\n1\n3\n2\n")
+run(0 "^3\\.5\n\\*\n1\n3\\.5\n2\n$" ranks ${WORK}/qelcalc_ranks.txt)
+run(0 "^2\n\\*\n4\n1\n3\n$" ranks ${WORK}/qelcalc_ranks.txt --descending --ties first)
+run(2 "^$" ranks ${WORK}/qelcalc_ranks.txt --ties x)
+run(2 "^$" ranks ${WORK}/qelcalc_bad.txt)
