@@ -206,6 +206,14 @@ TEST(Grouping, DocumentedSmallCases) {
   EXPECT_EQ(grouping.mGetGroupSize(0), 0);  // (1, 5) does not occur
   EXPECT_EQ(grouping.mGetGroupSize(3), 1);  // (2, 5) is row 1
   EXPECT_EQ(grouping.mGetGroup(2), 1);
+  // NaN cells form one group, after every number; look-ups still agree.
+  const std::vector<double> withNaN{NAN, 2, NAN, 1};
+  Col cn(&withNaN, qel::eNaturalSortOrder);
+  ASSERT_EQ(grouping.mFindGrouping(&cn, false, false, true), 0);
+  ASSERT_EQ(grouping.mGetNumberOfGroups(), 3);
+  EXPECT_EQ(grouping.mGetGroupSize(2), 2);
+  EXPECT_EQ(grouping.mGetGroup(3), 2);
+  EXPECT_EQ(grouping.mGetGroup(4), 0);
   // No rows: no groups.
   CbRows none;
   EXPECT_EQ(grouping.mFindGrouping(&ca, none, false, true, true), 0);
