@@ -259,6 +259,27 @@ TEST(Grouping, MergeSortIsStableInBothDirections) {
   }
 }
 
+// The index sort on columns: list order on the first column (values outside
+// the list after it, ascending), natural on the second, ties in index order.
+TEST(Grouping, IndexedSortByColumnsMatchesStableSortModel) {
+  std::mt19937 g(12);
+  const std::vector<double> list{2, 0};
+  for (int n = 0; n < 60; ++n) {
+    std::vector<double> a(n), b(n);
+    for (int i = 0; i < n; ++i) a[i] = double(g() % 4), b[i] = double(g() % 3);
+    Col ca(&a, qel::eNaturalSortOrder), cb(&b, qel::eNaturalSortOrder);
+    ca.mSetSortOrder(&list);
+    std::vector<int> index(n), expected(n);
+    for (int i = 0; i < n; ++i) index[i] = expected[i] = i;
+    qel::mIndexedSortByCols({&ca, &cb}, index, {true, true}, false, false);
+    std::stable_sort(expected.begin(), expected.end(), [&](int i, int j) {
+      return std::make_pair(keyOf(a[i], 2, a, list), b[i]) <
+             std::make_pair(keyOf(a[j], 2, a, list), b[j]);
+    });
+    ASSERT_EQ(index, expected) << n;
+  }
+}
+
 TEST(DistinctValues, SubscriptsLookUpsAndCopies) {
   const std::vector<double> data{5, 2, 5, 9, 2, 7};
   const std::vector<double> list{9, 4, 5};
