@@ -15,9 +15,11 @@
 #include "power_mode.h"
 #include "gof_mode.h"
 #include "proportion_variance_mode.h"
+#include "group_mode.h"
 #include "pvalue_mode.h"
 #include "quad_mode.h"
 #include "rank_test_mode.h"
+#include "ranks_mode.h"
 #include "sample_mode.h"
 #include "sort_mode.h"
 #include "summary_mode.h"
@@ -48,6 +50,8 @@ void printUsage(std::ostream& out) {
   qelcalc::printSintUsage(out);
   qelcalc::printRangeUsage(out);
   qelcalc::printSortUsage(out);
+  qelcalc::printGroupUsage(out);
+  qelcalc::printRanksUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -84,6 +88,8 @@ int main(int argc, char** argv) {
     if (mode == "sint") return qelcalc::runSintMode(argc, argv, std::cout);
     if (mode == "range") return qelcalc::runRangeMode(argc, argv, std::cout);
     if (mode == "sort") return qelcalc::runSortMode(argc, argv, std::cout);
+    if (mode == "group") return qelcalc::runGroupMode(argc, argv, std::cout);
+    if (mode == "ranks") return qelcalc::runRanksMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

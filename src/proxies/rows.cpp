@@ -7,6 +7,7 @@
 #include <cstddef>
 #include <limits>
 
+#include "proxies/column_variable.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace qel {
@@ -248,6 +249,13 @@ int CmRows::mFilterExcludeMissings(const std::vector<const std::vector<double>*>
   }
   *this = kept;
   return mRowCount;
+}
+
+int CmRows::mFilterExcludeMissingVariables(const std::vector<const CmColumnVar<double>*>& columns) {
+  std::vector<const std::vector<double>*> data;
+  data.reserve(columns.size());
+  for (const auto* column : columns) data.push_back(column ? column->mGetDataValues() : nullptr);
+  return mFilterExcludeMissings(data);
 }
 
 int CmRows::mInitializeWithNonMissings(const std::vector<double>* column) {

@@ -5,9 +5,13 @@
 #ifndef QEL_SRC_PROXIES_ROWS_H
 #define QEL_SRC_PROXIES_ROWS_H
 
+#include <type_traits>
 #include <vector>
 
 namespace qel {
+
+template <typename T>
+class CmColumnVar;
 
 class CbRows {
  public:
@@ -77,10 +81,22 @@ class CmRows : public CbRows {
   // holds the missing value. Returns the new count.
   int mFilterExcludeMissings(const std::vector<double>* column);
   int mFilterExcludeMissings(const std::vector<const std::vector<double>*>& columns);
+  // The same on the data of column variables (a null variable reads no data).
+  // A template only so that a braced list of data columns, which could also
+  // name a vector of variables by its iterator-pair constructor, keeps
+  // choosing the form above.
+  template <typename Column,
+            typename = std::enable_if_t<std::is_same<Column, CmColumnVar<double>>::value>>
+  int mFilterExcludeMissings(const std::vector<const Column*>& columns) {
+    return mFilterExcludeMissingVariables(columns);
+  }
 
   // The rows 1 .. m (m the shortest length) at which no column is missing.
   int mInitializeWithNonMissings(const std::vector<double>* column);
   int mInitializeWithNonMissings(const std::vector<const std::vector<double>*>& columns);
+
+ private:
+  int mFilterExcludeMissingVariables(const std::vector<const CmColumnVar<double>*>& columns);
 };
 
 }  // namespace qel

@@ -154,6 +154,29 @@ bool mGaussHermiteQuadratureWeights(unsigned n, std::vector<double>& nodes,
 bool mGaussLaguerreQuadratureWeights(unsigned n, std::vector<double>& nodes,
                                      std::vector<double>& weights, double alpha);
 
+// Ranks of the selected (1-based) rows of values. out is resized to the
+// data and filled with the missing value, then each ranked row gets its rank
+// at row - 1; outRows gets the row numbers in ascending order of value
+// (stable). With averageTies a run of equal values at positions i .. j - 1
+// (from 0) shares the rank (i + j + 1)/2, otherwise every row is its own run
+// (ties by row order). Descending ranks are count + 1 minus the ascending
+// ones. The missing value is ranked as the number it is; NaN cells and rows
+// outside the data are left out and keep the missing value.
+void mComputeRanks(const std::vector<double>& values, const CbRows& rows, std::vector<double>& out,
+                   CbRows& outRows, bool averageTies, bool ascending);
+void mComputeRanks(const std::vector<double>& values, std::vector<double>& out, CbRows& outRows,
+                   bool averageTies, bool ascending);
+void mComputeRanks(const std::vector<double>& values, const CbRows& rows, std::vector<double>& out,
+                   bool averageTies, bool ascending);
+void mComputeRanks(const std::vector<double>& values, std::vector<double>& out, bool averageTies,
+                   bool ascending);
+// Re-ranks after mComputeRanks so that missing values count for nothing: in
+// each group of equal rank (walked from the smallest rank), the m rows that
+// are not missing get 0.5 (2c + m + 1), c the non-missing rows of the groups
+// before; missing rows get the missing value.
+void mAdjustRanksForMisingValues(const std::vector<double>& values, const CbRows& sortedRows,
+                                 std::vector<double>& ranks);
+
 class CmRealFunction;
 // Integral of f over [a, b]: h times the sum over the stored node-weight
 // pairs of w (f(c + h x) + f(c - h x)), c = (a + b)/2, h = (b - a)/2. For
