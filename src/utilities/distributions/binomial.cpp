@@ -12,13 +12,13 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/discrete_rules.h"
-#include "utilities/elv/wrappers.h"
-#include "utilities/special_functions/incomplete_beta.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/elv/wrappers.h"
+#include "utilities/special_functions/incomplete_beta.h"
 
 namespace qel {
 

@@ -8,15 +8,16 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/standardize.h"
 
 namespace qel {
 
 double mCauchyPdf(double x, double location, double scale) {
-  const double z = (x - location) / scale;
+  const double z = mStandardize(x, location, scale);
   const double pi = mGetPi();
   if (std::fabs(z) <= 1.0) return 1.0 / (pi * scale * (1.0 + z * z));
   // 1/(1 + z^2) = w^2/(1 + w^2) with w = 1/z: no overflow of z^2.
@@ -37,7 +38,7 @@ double standardCauchyLowerTail(double z) {
 }  // namespace
 
 double mCauchyCdf(double x, double location, double scale, bool upperTail) {
-  const double z = (x - location) / scale;
+  const double z = mStandardize(x, location, scale);
   return standardCauchyLowerTail(upperTail ? -z : z);
 }
 

@@ -8,10 +8,11 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/standardize.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/LYNBasicTypes.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -105,7 +106,7 @@ double CmChiSqCdf::operator()(double x) {
 double mGammaPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
-  const double z = (x - threshold) / scale;
+  const double z = mStandardize(x, threshold, scale);
   if (ElvFailed(elv_gamma_df(z, shape, &lower, &upper, &density))) return mGetMissingValueCode();
   return density / scale;
 }
@@ -113,7 +114,7 @@ double mGammaPdf(double x, double shape, double scale, double threshold) {
 double mGammaCdf(double x, double shape, double scale, double threshold, bool upperTail) {
   if (x < threshold) return upperTail ? 1.0 : 0.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
-  const double z = (x - threshold) / scale;
+  const double z = mStandardize(x, threshold, scale);
   if (ElvFailed(elv_gamma_df(z, shape, &lower, &upper, &density))) return mGetMissingValueCode();
   return upperTail ? upper : lower;
 }

@@ -10,12 +10,12 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/discrete_rules.h"
-#include "utilities/elv/wrappers.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/elv/wrappers.h"
 
 namespace qel {
 
@@ -53,7 +53,7 @@ double mHypergeometricPdf(double x, int N, int M, int n) {
 
 // The upper tail is P(X > k) + P(X = k).
 double mHypergeometricCdf(double x, int N, int M, int n, bool upperTail) {
-  const double k = discrete::cdfPoint(x);
+  const double k = upperTail ? discrete::upperPoint(x) : discrete::cdfPoint(x);
   const Support s = supportOf(N, M, n);
   if (k < s.lo) return upperTail ? 1.0 : 0.0;
   if (k > s.hi) return upperTail ? 0.0 : 1.0;

@@ -10,10 +10,10 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/discrete_rules.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -81,7 +81,7 @@ double mNegBinomialPdf(double x, double p, double r) {
 }
 
 double mNegBinomialCdf(double x, double p, double r, bool upperTail) {
-  const double k = discrete::cdfPoint(x);
+  const double k = upperTail ? discrete::upperPoint(x) : discrete::cdfPoint(x);
   if (!upperTail) {
     if (k < r) return 0.0;
     if (isGeometric(r)) return oneMinusComplementPower(p, k);

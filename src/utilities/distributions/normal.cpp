@@ -5,11 +5,12 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/CheckedFunctions.h"
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/standardize.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/LYNBasicTypes.h"
-#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 
@@ -50,7 +51,7 @@ double CmStandardNormalCdf::operator()(double x) {
 
 double mNormalPdf(double x, double mean, double sigma) {
   try {
-    const double z = (x - mean) / sigma;
+    const double z = mStandardize(x, mean, sigma);
     return mExponential(-z * z / 2.0, true) / (std::sqrt(mGetPi() + mGetPi()) * sigma);
   } catch (const std::runtime_error&) {
     return 0.0;
@@ -66,7 +67,7 @@ bool mNormalCdf(double x, double mean, double sigma, double* lower, double* uppe
     *lower = *upper = 0.5;
     return true;
   }
-  if (ElvFailed(elv_normal_df((x - mean) / sigma, lower, upper))) {
+  if (ElvFailed(elv_normal_df(mStandardize(x, mean, sigma), lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
     return false;
   }

@@ -7,10 +7,10 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/discrete_rules.h"
-#include "utilities/elv/wrappers.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -27,8 +27,7 @@ double mPoissonPdf(double x, double mean) {
 
 // The upper tail P(X >= k) is P(X > k - 1).
 double mPoissonCdf(double x, double mean, bool upperTail) {
-  double k = discrete::cdfPoint(x);
-  if (upperTail) k -= 1.0;
+  const double k = upperTail ? discrete::upperPoint(x) - 1.0 : discrete::cdfPoint(x);
   if (k < 0.0) return upperTail ? 1.0 : 0.0;
   double chiLower = 0.0, chiUpper = 1.0;
   if (mean > 0.0 &&
