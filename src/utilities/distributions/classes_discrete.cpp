@@ -12,10 +12,10 @@
 #include <new>
 #include <stdexcept>
 
-#include "utilities/LYNBasicTypes.h"
-#include "utilities/MathUtilities.h"
 #include "utilities/distributions/classes.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/LYNBasicTypes.h"
+#include "utilities/MathUtilities.h"
 
 namespace qel {
 namespace {

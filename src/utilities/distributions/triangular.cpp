@@ -1,8 +1,8 @@
 // Triangular distribution on [lower, upper] with its peak at mode.
 #include <cmath>
 
-#include "utilities/CheckedFunctions.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 
