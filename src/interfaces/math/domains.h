@@ -54,6 +54,9 @@ inline bool decidedByArgument(Kind kind, double x, bool upperTail, double* answe
     return true;
   }
   if (kind == Kind::kInvCdf) {
+    // A denormal p is a zero of its sign, as the armed state reads it, so
+    // that scalar and array forms decide alike.
+    if (std::fpclassify(x) == FP_SUBNORMAL) x = std::copysign(0.0, x);
     if (x >= 0.0 && x <= 1.0) return false;
     *answer = mQuietNaN();
     return true;

@@ -9,6 +9,7 @@
 // The two-sided P-value orders the outcomes by their likelihood ratio
 // against p (the G statistic): it adds the probability of every outcome at
 // least as unlikely as the observed one on the far side of the mean.
+#include <algorithm>
 #include <cmath>
 #include <stdexcept>
 
@@ -127,7 +128,8 @@ double mBinomialPValue(double x, int n, double p, EAlternative alternative) {
   const double nearTail = mBinomialCdf(k, n, p, false);
   const double farTail = mBinomialCdf(n - b, n, 1.0 - p, false);
   if (mIsNumericMissing(nearTail) || mIsNumericMissing(farTail)) return mGetMissingValueCode();
-  return nearTail + farTail;
+  // The two tails of a symmetric-in-likelihood set add to 1 plus rounding.
+  return std::min(nearTail + farTail, 1.0);
 }
 
 }  // namespace qel

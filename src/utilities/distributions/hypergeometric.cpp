@@ -26,8 +26,23 @@ struct Support {
   int hi;
 };
 
+// M + n - N in 64 bits: M + n overflows an int near INT_MAX.
 Support supportOf(int N, int M, int n) {
-  return {std::max(0, M + n - N), std::min(M, n)};
+  const long long lo = static_cast<long long>(M) + n - N;
+  return {lo > 0 ? static_cast<int>(lo) : 0, std::min(M, n)};
+}
+
+// ln C(a, b) as a sum of ln((a - k + i)/i) over the smaller side k when it is
+// short: each term is exact to rounding, where log-gamma differences near
+// ln G(2^31) = 4.4e10 would lose 1e-6 absolutely.
+constexpr int kShortSide = 2000;
+double logChoose(int a, int b) {
+  const int k = std::min(b, a - b);
+  if (k < 0) return -HUGE_VAL;
+  if (k > kShortSide) return mLogNChooseK(a, b);
+  double sum = 0.0;
+  for (int i = 1; i <= k; ++i) sum += std::log((static_cast<double>(a) - k + i) / i);
+  return sum;
 }
 
 // Probability y is no more probable than the observed one: below it, or
@@ -44,8 +59,16 @@ double mHypergeometricPdf(double x, int N, int M, int n) {
   const Support s = supportOf(N, M, n);
   if (k < s.lo || k > s.hi) return 0.0;
   const int j = static_cast<int>(k);
+  // The point probability of the ELV routine keeps its relative accuracy;
+  // differences of log-gamma values near ln G(2^31) = 4.4e10 lose 1e-6.
+  double lower = 0.0, above = 0.0, mass = 0.0;
+  if (!ElvFailed(elv_hypergeo_df(static_cast<unsigned long>(j), static_cast<unsigned long>(N),
+                                 static_cast<unsigned long>(M), static_cast<unsigned long>(n),
+                                 &lower, &above, &mass))) {
+    return mass;
+  }
   try {
-    return mExponential(mLogNChooseK(M, j) + mLogNChooseK(N - M, n - j) - mLogNChooseK(N, n), true);
+    return mExponential(logChoose(M, j) + logChoose(N - M, n - j) - logChoose(N, n), true);
   } catch (const std::runtime_error&) {
     return 0.0;
   }
@@ -63,7 +86,9 @@ double mHypergeometricCdf(double x, int N, int M, int n, bool upperTail) {
                                 &lower, &above, &mass))) {
     return mGetMissingValueCode();
   }
-  return upperTail ? above + mass : lower;
+  // The two parts of the upper tail add up to 1 plus rounding at the
+  // lower end of the support.
+  return upperTail ? std::min(above + mass, 1.0) : lower;
 }
 
 double mHypergeometricInvCdf(double p, int N, int M, int n) {
@@ -91,6 +116,9 @@ double mHypergeometricPValue(int x, int N, int M, int n, EAlternative alternativ
   if (alternative != kAlternativeNotEqual) return mGetMissingValueCode();
 
   const Support s = supportOf(N, M, n);
+  // An impossible outcome: only outcomes of probability 0 are as extreme, so
+  // the walks below (up to 2^31 steps) would add nothing.
+  if (x < s.lo || x > s.hi) return 0.0;
   // The mode: the classical start, moved by one towards a more probable
   // neighbour.
   int mode = static_cast<int>(std::floor((M + 1.0) * (n + 1.0) / (N + 2.0)));
