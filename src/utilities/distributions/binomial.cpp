@@ -97,6 +97,9 @@ double mBinomialPValue(double x, int n, double p, EAlternative alternative) {
   if (alternative == kAlternativeLess) return mBinomialCdf(x, n, p, false);
   if (alternative == kAlternativeGreater) return mBinomialCdf(n - x, n, 1.0 - p, false);
   if (alternative != kAlternativeNotEqual) return 0.0;
+  // An outcome outside 0..n is impossible: nothing is as extreme (and the
+  // conversion to int below needs x in range).
+  if (!(x >= 0.0 && x <= n)) return 0.0;
 
   int k = static_cast<int>(x);
   if (mEqualWithinFuzz(p, 0.5, 0.0)) {

@@ -6,6 +6,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/thread_status.h"
 
 namespace qel {
 namespace elv {
@@ -56,14 +57,14 @@ long descendingMixtureStart(double L) {
   long k = 0;
   double f = 0.0;
   poisson_upper_quant(&k, &f, kMixtureStop, L);
-  return ELVerrno >= 2 ? -1 : k;
+  return qel::elv::threadStatus() >= 2 ? -1 : k;
 }
 
 long ascendingMixtureStart(double L) {
   long k = 0;
   double f = 0.0;
   poisson_lower_quant(&k, &f, kMixtureStop, L);
-  return ELVerrno >= 2 ? -1 : k;
+  return qel::elv::threadStatus() >= 2 ? -1 : k;
 }
 
 MixtureResult descendingMixtureSum(const MixtureComponents& components, long k,

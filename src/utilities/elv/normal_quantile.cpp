@@ -7,6 +7,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -76,7 +77,7 @@ void normal_lower_quant(double p, double* z) {
   }
   ELVstartup("normal_upper_quant");
   upperNormalQuantile(p, z);
-  if (ELVerrno < 2) *z = -*z;
+  if (qel::elv::threadStatus() < 2) *z = -*z;
 }
 
 }  // extern "C"

@@ -10,6 +10,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -187,7 +188,7 @@ void poisson_upper_quant(long* k, double* f, double p, double m) {
   double lower, upper, mass;
   poisson_df(j, m, &lower, &upper, &mass);
   double r = p - upper;
-  if (ELVerrno >= 2 || r < 0.0) {
+  if (qel::elv::threadStatus() >= 2 || r < 0.0) {
     ELVexit(name, 4, 'F');
     return;
   }
@@ -232,7 +233,7 @@ void poisson_lower_quant(long* k, double* f, double p, double m) {
     poisson_df(j - 1, m, &lower, &upper, &massBefore);
     mass = massBefore * m / j;
     r = p - lower;
-    if (ELVerrno >= 2 || r < 0.0) {
+    if (qel::elv::threadStatus() >= 2 || r < 0.0) {
       ELVexit(name, 4, 'F');
       return;
     }
