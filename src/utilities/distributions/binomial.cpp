@@ -30,6 +30,9 @@ double logComplement(double p) {
   return p < 0.5 ? std::log1p(-p) : mLog(1.0 - p, true);
 }
 
+// 2^53: above it a double no longer holds every whole number.
+constexpr double kExactCountLimit = 9007199254740992.0;
+
 // P(X <= k), 0 <= k < n, by the incomplete beta ratio.
 double binomialLowerTailByBeta(double k, double n, double p) {
   return mIncompleteBetaRatio(p, 1.0 - p, k + 1.0, n - k, true);
@@ -62,7 +65,12 @@ double mBinomialCdf(double x, double n, double p, bool upperTail) {
       return lower;
     }
   }
-  return binomialLowerTailByBeta(k, n, p);
+  // Beyond 2^53 trials (the negative binomial asks so for a huge x) with
+  // n p^2 below rounding, the Poisson law of mean n p is the binomial to
+  // double precision (Le Cam's bound n p^2 on the total variation).
+  if (n > kExactCountLimit && n * p * p < 1e-16) return mPoissonCdf(k, n * p, false);
+  const double tail = binomialLowerTailByBeta(k, n, p);
+  return mIsNumericMissing(tail) ? tail : std::min(std::max(tail, 0.0), 1.0);
 }
 
 double mBinomialInvCdf(double p, int n, double prob) {
