@@ -150,7 +150,8 @@ TEST(ContinuousKernelRules, TukeyLambdaCases) {
   // missing value is the answer; the search over [0, 1] meets the same end.
   EXPECT_TRUE(isMissing(mLambdaInvCdf(0.0, -0.5, 0.0, 1.0)));
   EXPECT_FALSE(isMissing(mLambdaInvCdf(0.2, -0.5, 0.0, 1.0)));
-  EXPECT_TRUE(isMissing(mLambdaCdf(0.3, -0.5, 0.0, 1.0, false)));
+  // Its distribution function solves Q(p) = x inside (0, 1).
+  EXPECT_NEAR(mLambdaCdf(mLambdaInvCdf(0.2, -0.5, 0.0, 1.0), -0.5, 0.0, 1.0, false), 0.2, 1e-12);
   CmLambdaTransform t(0.5, 0.25);
   EXPECT_NEAR(t(0.75), (std::sqrt(0.75) - std::sqrt(0.25)) / 0.5 - 0.25, 1e-15);
 }

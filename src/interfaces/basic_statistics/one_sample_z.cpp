@@ -14,8 +14,8 @@ namespace {
 constexpr double kNaN = std::numeric_limits<double>::quiet_NaN();
 
 int intervalFromSummary(OneSampleZ* record, double sigma, double confidence, IntervalType type) {
-  // A known sigma must be a positive number.
-  if (!(sigma > 0.0 && std::isfinite(sigma))) {
+  // A known sigma cannot be negative (0 gives an infinite statistic).
+  if (!(sigma >= 0.0 && std::isfinite(sigma))) {
     record->standardError = record->lowerLimit = record->upperLimit = kNaN;
     record->statistic = record->pValue = kNaN;
     return qelFailBadEnumValue;

@@ -29,8 +29,8 @@ std::map<double, double> makeTable(const double* values, const double* probabili
   double total = 0.0;
   for (int i = 0; i < size; ++i) {
     if (!domain::finite(values[i]) || !domain::probability(probabilities[i])) return {};
-    total += probabilities[i];
-    table.insert({values[i], probabilities[i]});
+    // A repeated value keeps its first probability, and only that counts.
+    if (table.insert({values[i], probabilities[i]}).second) total += probabilities[i];
   }
   if (!(std::fabs(total - 1.0) <= kTotalTolerance)) return {};
   return table;

@@ -3,8 +3,8 @@
 #include <cmath>
 
 #include "interfaces/math/frames.h"
-#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 namespace v0 {

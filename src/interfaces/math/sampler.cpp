@@ -30,9 +30,15 @@ int drawInto(CmUniformGenerator* generator, double* out, unsigned n, Args... arg
   SetLynFpuStates();
   Dist dist(args...);
   dist.SetBrng(generator);
-  for (unsigned i = 0; i < n; ++i) out[i] = dist.mGetRandom();
+  bool missing = false;
+  for (unsigned i = 0; i < n; ++i) {
+    out[i] = dist.mGetRandom();
+    missing = missing || mIsNumericMissing(out[i]);
+  }
   ResetFpuStates();
-  return dist.GetMsgCode();
+  // A missing variate is never reported with code 0.
+  const int code = dist.GetMsgCode();
+  return code == 0 && missing ? qelFailRandomVariate : code;
 }
 
 // Parameters outside the family's domain: no draw, NaN in every element and

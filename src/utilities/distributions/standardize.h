@@ -13,11 +13,14 @@
 
 namespace qel {
 
-// scale > 0 and all three finite.
+// All three finite, scale not 0.
 inline double mStandardize(double x, double location, double scale) {
   const double half = 0.5 * x - 0.5 * location;
   const double inf = std::numeric_limits<double>::infinity();
-  if (scale < 1.0 && std::fabs(half) > scale * (DBL_MAX / 2.0)) return half > 0.0 ? inf : -inf;
+  const double size = std::fabs(scale);
+  if (size < 1.0 && std::fabs(half) > size * (DBL_MAX / 2.0)) {
+    return (half > 0.0) == (scale > 0.0) ? inf : -inf;
+  }
   const double q = half / scale;
   if (std::fabs(q) > DBL_MAX / 2.0) return q > 0.0 ? inf : -inf;
   return 2.0 * q;

@@ -9,10 +9,10 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/LYNBasicTypes.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
