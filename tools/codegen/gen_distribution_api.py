@@ -90,7 +90,7 @@ FAMILIES = [
     dict(name="T", domain="positive(df) && finite(noncentrality)",
          params=[(D, "df"), (D, "noncentrality")],
          doc="Student's t with df degrees of freedom and a noncentrality (0: central)."),
-    dict(name="Triangular", domain="finite(lower) && finite(upper) && lower <= mode && mode <= upper && lower < upper",
+    dict(name="Triangular", domain="finite(lower) && finite(upper) && lower <= mode && mode <= upper && lower < upper && finite(upper - lower)",
          params=[(D, "lower"), (D, "mode"), (D, "upper")],
          doc="Triangular on [lower, upper] with its peak at mode."),
     dict(name="Uniform", domain="finite(lower) && finite(upper) && lower < upper && finite(upper - lower)",
