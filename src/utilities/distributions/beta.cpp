@@ -7,6 +7,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -39,8 +40,8 @@ double mBetaPdf(double x, double a, double b) {
     return b == 1.0 ? a : 0.0;
   }
   try {
-    return mExponential((a - 1.0) * mLog(x, true) + (b - 1.0) * std::log1p(-x) + mLogGamma(a + b) -
-                            mLogGamma(a) - mLogGamma(b),
+    return mExponential((a - 1.0) * mLog(x, true) + (b - 1.0) * std::log1p(-x) + mLogGammaOfPositive(a + b) -
+                            mLogGammaOfPositive(a) - mLogGammaOfPositive(b),
                         true);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
@@ -85,7 +86,7 @@ double mFPdf(double x, double df1, double df2) {
     const double b = df2 / 2.0;
     const double c = a + b;
     const double ratio = df1 / df2;
-    return mExponential(mLogGamma(c) - mLogGamma(a) - mLogGamma(b) + a * mLog(ratio, true) +
+    return mExponential(mLogGammaOfPositive(c) - mLogGammaOfPositive(a) - mLogGammaOfPositive(b) + a * mLog(ratio, true) +
                             (a - 1.0) * mLog(x, true) - c * std::log1p(x * ratio),
                         true);
   } catch (const std::runtime_error&) {

@@ -10,6 +10,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/standardize.h"
 #include "utilities/elv/wrappers.h"
@@ -147,7 +148,7 @@ double mChiSqPdf(double x, double df) {
   if (x <= 0.0) return 0.0;
   try {
     const double h = df / 2.0;
-    return mExponential(-mLogGamma(h) - h * std::log(2.0) + (h - 1.0) * mLog(x, true) - x / 2.0,
+    return mExponential(-mLogGammaOfPositive(h) - h * std::log(2.0) + (h - 1.0) * mLog(x, true) - x / 2.0,
                         true);
   } catch (const std::runtime_error&) {
     return 0.0;

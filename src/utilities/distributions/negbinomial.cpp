@@ -104,7 +104,12 @@ double CmNegBinomialCdf::operator()(double x) {
 double mNegBinomialPdf(double x, double p, double r) {
   double k;
   if (!discrete::massPoint(x, &k)) return 0.0;
-  return negBinomialMass(k, p, r);
+  try {
+    return negBinomialMass(k, p, r);
+  } catch (const std::runtime_error&) {
+    // ln G(k) beyond the double range (k near DBL_MAX): no answer.
+    return mGetMissingValueCode();
+  }
 }
 
 double mNegBinomialCdf(double x, double p, double r, bool upperTail) {

@@ -11,6 +11,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -76,7 +77,7 @@ double mTPdf(double x, double df, double noncentrality) {
     if (noncentrality == 0.0 || x == 0.0) {
       const double a = (df + 1.0) / 2.0;
       const double b = df / 2.0;
-      return mExponential(mLogGamma(a) - mLogGamma(b) - 0.5 * mLog(mGetPi() * df, true) -
+      return mExponential(mLogGammaOfPositive(a) - mLogGammaOfPositive(b) - 0.5 * mLog(mGetPi() * df, true) -
                               a * std::log1p(x * x / df) - noncentrality * noncentrality / 2.0,
                           true);
     }
