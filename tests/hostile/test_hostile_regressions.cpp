@@ -77,6 +77,7 @@ TEST(HostileRegressions, DistributionAnswersAsRuled) {
     {"poisson upper, 2.5", [] { return PoissonCdf(2.5, 3, true); }, "poisson_upper_2.5", 0, 1},
     {"geometric upper, 2.5", [] { return GeometricCdf(2.5, 0.3, true); }, "geometric_upper_2.5", 0, 1},
     {"negbinomial upper, 4.5", [] { return NegBinomialCdf(4.5, 0.3, 2, true); }, "negbinomial_upper_4.5", 0, 1},
+    {"noncentral F inv, 1e8 (was 13 s)", [] { return FInvCdf(1e-10, 3, 7, 1e8); }, "", 1e6, 1e7},
     {"hypergeometric upper, 1.5", [] { return HypergeometricCdf(1.5, 10, 4, 5, true); }, "hypergeometric_upper_1.5", 0, 1},
   };
   // clang-format on
