@@ -96,7 +96,15 @@ bool mTCdf(double x, double df, double noncentrality, double* lower, double* upp
     *lower = *upper = missing;
     return false;
   }
-  const ElvStatus status = elv_t_ncdf(x, df, noncentrality, lower, upper);
+  ElvStatus status;
+  try {
+    status = elv_t_ncdf(x, df, noncentrality, lower, upper);
+  } catch (const std::runtime_error&) {
+    // A df so small (1e-300) that the routine's arithmetic divides by zero
+    // or overflows: no answer.
+    *lower = *upper = missing;
+    return false;
+  }
   if (!ElvFailed(status)) return true;
   if (status == kElvDomainStatus && noncentrality != 0.0) {
     // The noncentrality is beyond the routine's limit. Retry just inside a
