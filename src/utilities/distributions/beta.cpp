@@ -2,11 +2,13 @@
 //
 // The F quantile of a noncentral F has no routine of its own: it is a root
 // search of the distribution function from 0 upward.
+#include <cfloat>
 #include <cmath>
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
