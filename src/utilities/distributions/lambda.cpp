@@ -45,6 +45,26 @@ bool negativeLambdaBracket(double z, double lambda, double* a, double* b) {
   return *b < 1.0;
 }
 
+// The bracketing search stops on a small function value, which leaves p
+// some 1e-13 off; Newton steps on Q(p) - z with Q'(p) = p^(lambda - 1) +
+// (1 - p)^(lambda - 1) bring it to the last digits. A step that leaves the
+// bracket or does not shrink the residual ends the polish.
+double newtonPolished(CmLambdaTransform& f, double p, double lambda, double a, double b) {
+  if (!(p > 0.0 && p < 1.0)) return p;
+  double residual = f(p);
+  for (int i = 0; i < 4 && residual != 0.0; ++i) {
+    const double slope =
+        mRaiseToPower(p, lambda - 1.0, true) + mRaiseToPower(1.0 - p, lambda - 1.0, true);
+    const double next = p - residual / slope;
+    if (!(next > a && next < b)) break;
+    const double nextResidual = f(next);
+    if (!(std::fabs(nextResidual) < std::fabs(residual))) break;
+    p = next;
+    residual = nextResidual;
+  }
+  return p;
+}
+
 // The lower tail at the standardised z for the cases other than the
 // logistic limit; the missing value when the search has no answer.
 double lambdaLowerTail(double z, double lambda) {
@@ -59,7 +79,8 @@ double lambdaLowerTail(double z, double lambda) {
   CmLambdaTransform f(lambda, z);
   f.mAbsoluteToleranceForX = kQuantileSearchToleranceX;
   int status = 0;
-  return mRootFinder(a, b, f, &status);
+  const double root = mRootFinder(a, b, f, &status);
+  return mIsNumericMissing(root) ? root : newtonPolished(f, root, lambda, a, b);
 }
 
 }  // namespace
