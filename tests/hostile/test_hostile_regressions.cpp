@@ -78,6 +78,12 @@ TEST(HostileRegressions, DistributionAnswersAsRuled) {
     {"geometric upper, 2.5", [] { return GeometricCdf(2.5, 0.3, true); }, "geometric_upper_2.5", 0, 1},
     {"negbinomial upper, 4.5", [] { return NegBinomialCdf(4.5, 0.3, 2, true); }, "negbinomial_upper_4.5", 0, 1},
     {"noncentral F inv, 1e8 (was 13 s)", [] { return FInvCdf(1e-10, 3, 7, 1e8); }, "", 1e6, 1e7},
+    // Saddle-point densities whose deviance leaves the double range (a trap
+    // inside libm's log or exp cannot unwind): the true values underflow.
+    {"gamma pdf, x 1e300, shape 1e-300", [] { return GammaPdf(1e300, 1e-300, 1, 0); }, "", 0, 0},
+    {"chi-square pdf, x 1e300, df 1e-300", [] { return ChiSqPdf(1e300, 1e-300); }, "", 0, 0},
+    {"poisson pdf, 1e15, mean 1e-300", [] { return PoissonPdf(1e15, 1e-300); }, "", 0, 0},
+    {"t pdf, x 1e300, df 1e-300", [] { return TPdf(1e300, 1e-300, 0); }, "", 0, 0},
     {"hypergeometric upper, 1.5", [] { return HypergeometricCdf(1.5, 10, 4, 5, true); }, "hypergeometric_upper_1.5", 0, 1},
   };
   // clang-format on

@@ -46,6 +46,8 @@ double mBetaPdf(double x, double a, double b) {
     return saddle::betaDensity(x, a, b);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
   }
 }
 
@@ -92,6 +94,8 @@ double mFPdf(double x, double df1, double df2) {
   try {
     return saddle::fDensity(x, df1, df2);
   } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
     return mGetMissingValueCode();
   }
 }

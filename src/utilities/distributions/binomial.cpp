@@ -43,7 +43,13 @@ double mBinomialPdf(double x, int n, double p) {
   if (p == 0.0) return k == 0.0 ? 1.0 : 0.0;
   if (p == 1.0) return k == n ? 1.0 : 0.0;
   if (k < 0.0 || k > n) return 0.0;
-  return saddle::binomialMass(k, n, p, 1.0 - p);
+  try {
+    return saddle::binomialMass(k, n, p, 1.0 - p);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 double mBinomialCdf(double x, double n, double p, bool upperTail) {

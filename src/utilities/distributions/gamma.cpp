@@ -144,7 +144,13 @@ double mGammaPdf(double x, double shape, double scale, double threshold) {
   // Loader's saddle-point form keeps the density's digits for large shapes.
   const double z = mStandardize(x, threshold, scale);
   if (std::isinf(z)) return 0.0;
-  return saddle::gammaDensity(z, shape) / scale;
+  try {
+    return saddle::gammaDensity(z, shape) / scale;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 double mGammaCdf(double x, double shape, double scale, double threshold, bool upperTail) {
@@ -181,7 +187,13 @@ double mGammaInvCdfByRootFinder(double p, double shape, double start) {
 
 double mChiSqPdf(double x, double df) {
   if (x <= 0.0) return 0.0;
-  return saddle::gammaDensity(x / 2.0, df / 2.0) / 2.0;
+  try {
+    return saddle::gammaDensity(x / 2.0, df / 2.0) / 2.0;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double* upper) {

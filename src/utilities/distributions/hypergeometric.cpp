@@ -47,7 +47,13 @@ double mHypergeometricPdf(double x, int N, int M, int n) {
   if (!discrete::massPoint(x, &k)) return 0.0;
   const Support s = supportOf(N, M, n);
   if (k < s.lo || k > s.hi) return 0.0;
-  return saddle::hypergeometricMass(k, N, M, n);
+  try {
+    return saddle::hypergeometricMass(k, N, M, n);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 // The upper tail is P(X > k) + P(X = k).

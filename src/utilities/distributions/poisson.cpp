@@ -20,7 +20,13 @@ namespace qel {
 double mPoissonPdf(double x, double mean) {
   double k;
   if (!discrete::massPoint(x, &k) || k < 0.0) return 0.0;
-  return saddle::poissonMass(k, mean);
+  try {
+    return saddle::poissonMass(k, mean);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 // The upper tail P(X >= k) is P(X > k - 1).

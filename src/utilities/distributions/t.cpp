@@ -102,8 +102,9 @@ double mTPdf(double x, double df, double noncentrality) {
     if (x == 0.0) {
       const double a = (df + 1.0) / 2.0;
       const double b = df / 2.0;
-      return mExponential(mLogGammaOfPositive(a) - mLogGammaOfPositive(b) - 0.5 * mLog(mGetPi() * df, true) -
-                              a * std::log1p(x * x / df) - noncentrality * noncentrality / 2.0,
+      return mExponential(mLogGammaOfPositive(a) - mLogGammaOfPositive(b) -
+                              0.5 * mLog(mGetPi() * df, true) - a * std::log1p(x * x / df) -
+                              noncentrality * noncentrality / 2.0,
                           true);
     }
     const double f1 = mTCdf(x * std::sqrt((df + 2.0) / df), df + 2.0, noncentrality, false);
@@ -112,6 +113,8 @@ double mTPdf(double x, double df, double noncentrality) {
     return (f1 - f2) * df / x;
   } catch (const std::runtime_error&) {
     return 0.0;
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
   }
 }
 
@@ -134,6 +137,9 @@ bool mTCdf(double x, double df, double noncentrality, double* lower, double* upp
   } catch (const std::runtime_error&) {
     // A df so small (1e-300) that the routine's arithmetic divides by zero
     // or overflows: no answer.
+    *lower = *upper = missing;
+    return false;
+  } catch (const std::invalid_argument&) {
     *lower = *upper = missing;
     return false;
   }
