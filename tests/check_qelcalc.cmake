@@ -44,7 +44,7 @@ run(2 "^$" logistic pdf 1 --upper)
 run(2 "^$" logistic cdf --file ${WORK}/no_such_file.txt)
 run(2 "^$" logistic cdf --file ${WORK}/qelcalc_bad.txt)
 # An overflow that no kernel catches is reported, not a crash.
-run(1 "^$" loglogistic inv 0.999999999999 --scale 100)
+run(2 "^$" loglogistic inv 0.999999999999 --scale 100)
 
 # describe: summary lines of a column, from a file or stdin.
 file(WRITE ${WORK}/qelcalc_describe.txt "2\n4\n4\n4\n5\n5\n7\n9\n")
@@ -74,7 +74,7 @@ run(0 "^(-?[0-9][0-9.e+-]*\n)(-?[0-9][0-9.e+-]*\n)(-?[0-9][0-9.e+-]*\n)(-?[0-9][
 run(0 "^(2(\\.[0-9]+)?\n)+$" sample uniform 20 --lower 2 --upper 3 --seed 7)
 run(0 "^([0-9]\n|10\n)+$" sample binomial 30 --n 10 --p 0.4 --seed 7)
 run(0 "^$" sample poisson 0 --mean 3)
-run(1 "^$" sample gamma 3 --shape -1 --seed 5)
+run(2 "^$" sample gamma 3 --shape -1 --seed 5)
 run(2 "^$" sample gauss 3)
 run(2 "^$" sample normal 3 --sigma 2)
 run(2 "^$" sample normal -1)
@@ -127,7 +127,8 @@ run(0 "\np 0\\.039112442[0-9]*\n$" test one-sample-t ${WORK}/qelcalc_table.csv -
     --alternative greater)
 run(0 "\np 0\\.178222907[0-9]*\n$" test two-sample-t ${WORK}/qelcalc_table.csv --column 2
     --column2 3 --pooled)
-run(2 "^$" test paired-t ${WORK}/qelcalc_table.csv --column 2 --column2 3)
+# Paired by row: the row without y is dropped (and reported on stderr).
+run(0 "^n 4\n" test paired-t ${WORK}/qelcalc_table.csv --column 2 --column2 3)
 run(2 "^$" test one-sample-z ${WORK}/qelcalc_table.csv --column 2)
 run(2 "^$" test one-sample-t ${WORK}/qelcalc_table.csv --column 9)
 run(2 "^$" test sign-test ${WORK}/qelcalc_table.csv)
@@ -415,3 +416,11 @@ run(0 "^3\\.5\n\\*\n1\n3\\.5\n2\n$" ranks ${WORK}/qelcalc_ranks.txt)
 run(0 "^2\n\\*\n4\n1\n3\n$" ranks ${WORK}/qelcalc_ranks.txt --descending --ties first)
 run(2 "^$" ranks ${WORK}/qelcalc_ranks.txt --ties x)
 run(2 "^$" ranks ${WORK}/qelcalc_bad.txt)
+# Hostile input: CR-only line ends, empty input, a number beyond the range.
+file(WRITE ${WORK}/qelcalc_cr.txt "1\r2\r3\r")
+run(0 "^n 3\n" describe --file ${WORK}/qelcalc_cr.txt)
+file(WRITE ${WORK}/qelcalc_empty.txt "")
+run(2 "^$" describe --file ${WORK}/qelcalc_empty.txt)
+run(2 "^$" normal cdf --file ${WORK}/qelcalc_empty.txt)
+file(WRITE ${WORK}/qelcalc_huge.txt "1e999\n")
+run(2 "^$" describe --file ${WORK}/qelcalc_huge.txt)

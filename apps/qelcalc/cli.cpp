@@ -32,16 +32,58 @@ Arguments parseArguments(int argc, char** argv, int first,
   return args;
 }
 
+// Longest piece of a bad input quoted in an error message.
+constexpr std::size_t kQuotedLength = 60;
+
+std::string quoted(const std::string& text) {
+  std::string out = "'";
+  for (std::size_t i = 0; i < text.size() && i < kQuotedLength; ++i) {
+    const unsigned char c = static_cast<unsigned char>(text[i]);
+    if (c < 0x20 || c == 0x7F) {
+      char escaped[8];
+      std::snprintf(escaped, sizeof escaped, "\\x%02X", c);
+      out += escaped;
+    } else {
+      out += static_cast<char>(c);
+    }
+  }
+  if (text.size() > kQuotedLength) out += "...";
+  return out + "'";
+}
+
+// The whole text must be the number: a NUL byte inside it ends strtod's view
+// of the string, not the line. A value beyond the double range is refused
+// rather than read as an infinity.
 double parseNumber(const std::string& text, const std::string& what) {
   const char* begin = text.c_str();
+  const char* last = begin + text.size();
   char* end = nullptr;
   errno = 0;
   const double value = std::strtod(begin, &end);
-  while (end && (*end == ' ' || *end == '\t' || *end == '\r')) ++end;
-  if (text.empty() || end == begin || *end != '\0' || std::isnan(value)) {
-    throw UsageError(what + ": not a number: '" + text + "'");
+  const bool overflow = errno == ERANGE && std::isinf(value);
+  while (end != last && (*end == ' ' || *end == '\t' || *end == '\r')) ++end;
+  if (text.empty() || end == begin || end != last || std::isnan(value)) {
+    throw UsageError(what + ": not a number: " + quoted(text));
   }
+  if (overflow) throw UsageError(what + ": beyond the double range: " + quoted(text));
   return value;
+}
+
+// Lines ended by LF, CR LF or a lone CR (old Mac files).
+bool readLine(std::istream& in, std::string& line) {
+  line.clear();
+  int c;
+  bool any = false;
+  while ((c = in.get()) != EOF) {
+    any = true;
+    if (c == '\n') return true;
+    if (c == '\r') {
+      if (in.peek() == '\n') in.get();
+      return true;
+    }
+    line += static_cast<char>(c);
+  }
+  return any;
 }
 
 std::istream& openInput(const std::string& path, std::ifstream& file) {
@@ -57,13 +99,14 @@ std::vector<double> readNumbers(const std::string& path) {
   std::vector<double> values;
   std::string line;
   unsigned long lineNumber = 0;
-  while (std::getline(*in, line)) {
+  while (readLine(*in, line)) {
     ++lineNumber;
     if (line.find_first_not_of(" \t\r") == std::string::npos) continue;
     const auto start = line.find_first_not_of(" \t");
     values.push_back(parseNumber(line.substr(start), "line " + std::to_string(lineNumber)));
   }
   if (in->bad()) throw UsageError("error while reading '" + path + "'");
+  if (values.empty()) throw UsageError("no numbers in the input " + quoted(path));
   return values;
 }
 

@@ -31,6 +31,12 @@ Arguments parseArguments(int argc, char** argv, int first,
 // UsageError naming what.
 double parseNumber(const std::string& text, const std::string& what);
 
+// text for an error message: at most 60 bytes, control bytes as \xNN.
+std::string quoted(const std::string& text);
+
+// One line ended by LF, CR LF or a lone CR; false at the end of the input.
+bool readLine(std::istream& in, std::string& line);
+
 // Reads one number per line (blank lines skipped) from a file, or from
 // standard input when path is "-".
 std::vector<double> readNumbers(const std::string& path);

@@ -98,7 +98,10 @@ int main(int argc, char** argv) {
     // An exception that left the library (for instance an overflow the kernel
     // does not catch) leaves the thread armed; restore it before reporting.
     qel::ResetFpuStates();
-    std::cerr << "qelcalc: computation failed: " << e.what() << "\n";
-    return 1;
+    std::string call;
+    for (int i = 1; i < argc; ++i) call += (i > 1 ? " " : "") + std::string(argv[i]);
+    std::cerr << "qelcalc: the library failed in " << qelcalc::quoted(call) << ": "
+              << qelcalc::quoted(e.what()) << "\n";
+    return 2;
   }
 }

@@ -91,7 +91,7 @@ std::vector<TableRow> readTableRows(const std::string& path) {
   std::vector<TableRow> rows;
   std::string text;
   int lineNumber = 0;
-  while (std::getline(*in, text)) {
+  while (readLine(*in, text)) {
     ++lineNumber;
     TableRow row{lineNumber, fieldsOf(text)};
     if (!row.fields.empty()) rows.push_back(std::move(row));
@@ -126,6 +126,30 @@ std::vector<double> tableColumn(const std::vector<TableRow>& rows, int column,
     throw UsageError("too many numbers");
   }
   return values;
+}
+
+// Paired columns, paired by row: a row that lacks either value is dropped as
+// a whole (pairing the columns' values separately would join values of
+// different rows). Returns the number of rows dropped.
+std::size_t pairedColumns(const std::vector<TableRow>& rows, int first, int second,
+                          const std::string& path, std::vector<double>* x, std::vector<double>* y) {
+  std::size_t dropped = 0;
+  const auto present = [](const std::vector<std::string>& f, int c) {
+    return static_cast<int>(f.size()) >= c &&
+           f[c - 1].find_first_not_of(" \t") != std::string::npos;
+  };
+  for (std::size_t r = hasHeader(rows, {first, second}) ? 1 : 0; r < rows.size(); ++r) {
+    const auto& fields = rows[r].fields;
+    if (!present(fields, first) || !present(fields, second)) {
+      ++dropped;
+      continue;
+    }
+    const std::string where = "line " + std::to_string(rows[r].lineNumber);
+    x->push_back(parseNumber(fields[first - 1], where));
+    y->push_back(parseNumber(fields[second - 1], where));
+  }
+  if (x->empty()) throw UsageError("no complete pairs in " + quoted(path));
+  return dropped;
 }
 
 std::vector<double> readTableColumn(const std::string& path, int column) {

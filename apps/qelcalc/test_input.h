@@ -51,6 +51,11 @@ std::vector<double> tableColumn(const std::vector<TableRow>& rows, int column,
                                 const std::string& path);
 
 // readTableRows and tableColumn in one.
+// Two columns paired by row; rows lacking either value are dropped and
+// counted (the return value).
+std::size_t pairedColumns(const std::vector<TableRow>& rows, int first, int second,
+                          const std::string& path, std::vector<double>* x, std::vector<double>* y);
+
 std::vector<double> readTableColumn(const std::string& path, int column);
 
 }  // namespace qelcalc

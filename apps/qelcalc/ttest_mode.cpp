@@ -5,6 +5,7 @@
 
 #include <qel/location_tests.h>
 
+#include <iostream>
 #include <limits>
 #include <string>
 #include <vector>
@@ -204,8 +205,17 @@ int runTestMode(int argc, char** argv, std::ostream& out) {
   }
   const std::string& path = args.positional[1];
   const std::vector<TableRow> rows = readTableRows(path);
-  const std::vector<double> x = tableColumn(rows, columnOption(args, "column", 1), path);
-  std::vector<double> y;
+  std::vector<double> x, y;
+  if (kind == Kind::PairedT) {
+    const std::size_t dropped = pairedColumns(rows, columnOption(args, "column", 1),
+                                              columnOption(args, "column2", 2), path, &x, &y);
+    if (dropped > 0) {
+      std::cerr << "qelcalc: paired-t dropped " << dropped << " incomplete row"
+                << (dropped == 1 ? "" : "s") << "\n";
+    }
+    return runLocationTest(kind, x, y, pooled, args, out);
+  }
+  x = tableColumn(rows, columnOption(args, "column", 1), path);
   if (twoColumns) y = tableColumn(rows, columnOption(args, "column2", 2), path);
   return runLocationTest(kind, x, y, pooled, args, out);
 }

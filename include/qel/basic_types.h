@@ -73,6 +73,19 @@ QEL_API void ResetFpuStates();
 
 // Installs the SIGFPE handler that turns a trap in an armed thread into a C++
 // exception at the faulting instruction. Returns 0 or qelFailSignalHandler.
+//
+// Exception contract. Exported functions hold no catch clause. Kernels catch
+// the traps they expect and answer NaN (distribution functions) or a message
+// code (test functions); a trap that no kernel catches leaves the exported
+// function as std::runtime_error, std::overflow_error or
+// std::invalid_argument, without the closing ResetFpuStates, so the thread
+// is still armed when the exception reaches the host. A host that calls the
+// library where such an exception may arise recovers with two lines:
+//
+//   try { p = qel::GammaCdf(x, shape, scale, 0.0, false); }
+//   catch (const std::exception&) { qel::ResetFpuStates(); p = NAN; }
+//
+// Without RegisterLynSigfpeHandler a trap is the process's ordinary SIGFPE.
 QEL_API int RegisterLynSigfpeHandler();
 
 }  // namespace qel

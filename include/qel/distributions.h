@@ -11,6 +11,15 @@
 // Array forms: output first, input second, count third, then the parameters
 // of the scalar form; one floating-point state switch serves the whole
 // column. out may equal the input array.
+//
+// Parameters outside a family's domain (a scale, sigma or df that is not
+// positive, a probability outside [0, 1], a count that is not a whole
+// number, NaN, an infinity or the missing value) give NaN, and so does a NaN
+// argument; at x = -inf or +inf a Cdf gives the limit and a Pdf 0. A Cdf is
+// in [0, 1], a Pdf >= 0, a quantile in the support; the missing value is
+// never returned. Exceptions: see the contract at RegisterLynSigfpeHandler
+// in <qel/basic_types.h> (no catch here; a host recovers with catch and
+// ResetFpuStates()).
 #ifndef QEL_DISTRIBUTIONS_H
 #define QEL_DISTRIBUTIONS_H
 

@@ -9,10 +9,10 @@
 // field that a call does not compute is left as it stands, so on a fresh
 // record NaN means "not computed".
 //
-// Return codes: 0, or 30002 for an IntervalType outside -1, 0, 1 (limits
-// NaN, test not run), or 30001 when memory runs out (paired t only). The
-// data are not checked: NaN in the data, too few observations or a
-// confidence outside (0, 1) give NaN in the concerned fields and code 0.
+// Return codes: 0, or 30002 for an IntervalType outside -1, 0, 1 or a
+// confidence outside (0, 1) (limits NaN), or 30001 when memory runs out
+// (paired t only). The data are not checked: NaN in the data or too few
+// observations give NaN in the concerned fields and code 0.
 // The functions run outside the armed floating-point frame; each
 // distribution call enters and leaves it by itself.
 #ifndef QEL_LOCATION_TESTS_H

@@ -1,10 +1,11 @@
+#include "utilities/CheckedFunctions.h"
+
 #include <cfloat>
 #include <cmath>
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 
@@ -80,7 +81,8 @@ double mRaiseToPower(double base, double power, bool throwOnError) {
   if (t < -MAX_EXPONENT) return 0.0;
   if (t <= MAX_EXPONENT) return std::pow(base, n);
   const double big = mHandleOverflow(throwOnError);
-  return (static_cast<long long>(n) % 2 != 0) ? -big : big;
+  // fmod, not a cast: an odd power beyond the 64-bit range cannot exist.
+  return std::fmod(n, 2.0) != 0.0 ? -big : big;
 }
 
 double mSin(double x) {

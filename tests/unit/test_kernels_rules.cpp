@@ -124,6 +124,8 @@ TEST(ContinuousKernelRules, LimitingForms) {
   EXPECT_DOUBLE_EQ(mLambdaCdf(0.7, 1e-13, 0.0, 1.0, false), mLogisticCdf(0.7, 0.0, 1.0, false));
   EXPECT_DOUBLE_EQ(mLambdaInvCdf(0.3, 0.0, 2.0, 3.0), 2.0 + 3.0 * mLogisticInvCdf(0.3, 0.0, 1.0));
   EXPECT_FALSE(isMissing(mLambdaInvCdf(0.2, -0.5, 0.0, 1.0)));
+  // Its distribution function solves Q(p) = x inside (0, 1).
+  EXPECT_NEAR(mLambdaCdf(mLambdaInvCdf(0.2, -0.5, 0.0, 1.0), -0.5, 0.0, 1.0, false), 0.2, 1e-12);
   CmLambdaTransform transform(0.5, 0.25);
   EXPECT_NEAR(transform(0.75), (std::sqrt(0.75) - std::sqrt(0.25)) / 0.5 - 0.25, 1e-15);
   // A noncentrality below 2.2250738585072014e-307 is the central F.

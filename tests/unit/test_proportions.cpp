@@ -260,8 +260,12 @@ TEST(ProportionsBadInput, CodesAndNaN) {
   for (double confidence : {0.0, 1.0, kNaN}) {
     OneProportion c = one(3, 10);
     EXPECT_EQ(RunOneProportionMidP(&c, confidence, qel::kIntervalTwoSided), 0);
-    EXPECT_EQ(RunOneProportion(&c, true, confidence, qel::kIntervalTwoSided), 0);
     EXPECT_FALSE(c.lowerLimit > c.upperLimit);
+    // The symmetric interval refuses a confidence outside (0, 1) rather than
+    // turn inside out.
+    EXPECT_EQ(RunOneProportion(&c, true, confidence, qel::kIntervalTwoSided),
+              qel::qelFailBadEnumValue);
+    EXPECT_TRUE(std::isnan(c.lowerLimit) && std::isnan(c.upperLimit));
   }
   OneProportion empty = one(0, 0), over = one(12, 10);
   EXPECT_EQ(RunLynOneProportion(&empty, true, 0.95, qel::kIntervalTwoSided,

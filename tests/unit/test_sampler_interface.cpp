@@ -123,7 +123,7 @@ TEST(SamplerOperations, BadParametersGiveCodesNotCrashes) {
   EXPECT_EQ(s->Binomial(x.data(), 100, 0, 0.5), 0);
   EXPECT_EQ(x[0], 0.0);
   EXPECT_EQ(s->Bernoulli(x.data(), 100, 1.5), 0);
-  EXPECT_EQ(s->Hypergeometric(x.data(), 100, 5, 9, 3), 0);
+  EXPECT_EQ(s->Hypergeometric(x.data(), 100, 5, 9, 3), qel::qelFailBadEnumValue);
   // Weibull returns 0 whatever its parameters.
   EXPECT_EQ(s->Weibull(x.data(), 100, -1.0, -2.0, 0), 0);
   // n = 0 draws nothing; a null array with elements to fill is refused.
@@ -146,8 +146,7 @@ TEST(SamplerOperations, BadParametersGiveCodesNotCrashes) {
   // state), as from the distribution functions.
   EXPECT_THROW(s->Gamma(x.data(), 10, std::nan(""), 1, 0), std::invalid_argument);
   qel::ResetFpuStates();
-  EXPECT_THROW(s->Binomial(x.data(), 10, 5, std::nan("")), std::invalid_argument);
-  qel::ResetFpuStates();
+  EXPECT_EQ(s->Binomial(x.data(), 10, 5, std::nan("")), qel::qelFailBadEnumValue);
   // Masked overflow of the huge weights leaves a sticky flag; the control
   // bits must be the default ones.
   EXPECT_EQ(qeltest::x87ControlWord(), qeltest::kDefaultX87);

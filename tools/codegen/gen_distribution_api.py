@@ -22,77 +22,133 @@ I = "int"
 # Overrides: pdf/cdf/inv -> parameter list; kernel_pdf/kernel_cdf/kernel_inv
 # -> kernel expression name (default m<Name>Pdf etc.).
 FAMILIES = [
-    dict(name="Beta", params=[(D, "a"), (D, "b")], doc="Beta(a, b) on [0, 1]."),
-    dict(name="Binomial", params=[(I, "n"), (D, "p")], cdf=[(D, "n"), (D, "p")],
+    dict(name="Beta", domain="positive(a) && positive(b)",
+         params=[(D, "a"), (D, "b")], doc="Beta(a, b) on [0, 1]."),
+    dict(name="Binomial", domain="n >= 0 && probability(p)",
+         domain_cdf="count(n) && probability(p)",
+         params=[(I, "n"), (D, "p")], cdf=[(D, "n"), (D, "p")],
          doc="Binomial(n, p). Pdf and InvCdf take an int n, Cdf a double n.\n"
              "The upper tail includes the point: P(X >= x)."),
-    dict(name="Cauchy", params=[(D, "location"), (D, "scale")], doc="Cauchy(location, scale)."),
-    dict(name="ChiSq", params=[(D, "df"), (D, "noncentrality")], pdf=[(D, "df")],
+    dict(name="Cauchy", domain="finite(location) && positive(scale)",
+         params=[(D, "location"), (D, "scale")], doc="Cauchy(location, scale)."),
+    dict(name="ChiSq", domain="positive(df) && nonNegative(noncentrality)",
+         params=[(D, "df"), (D, "noncentrality")], pdf=[(D, "df")],
          doc="Chi-square with df degrees of freedom and a noncentrality (0: central).\n"
              "The density is that of the central law."),
-    dict(name="Exponential", params=[(D, "scale"), (D, "threshold")],
+    dict(name="Exponential", domain="positive(scale) && finite(threshold)",
+         params=[(D, "scale"), (D, "threshold")],
          doc="Exponential(scale) shifted by threshold."),
-    dict(name="F", params=[(D, "df1"), (D, "df2"), (D, "noncentrality")],
+    dict(name="F", domain="positive(df1) && positive(df2) && nonNegative(noncentrality)",
+         params=[(D, "df1"), (D, "df2"), (D, "noncentrality")],
          pdf=[(D, "df1"), (D, "df2")],
          doc="F(df1, df2) with a noncentrality (0: central). The density is central."),
-    dict(name="Gamma", params=[(D, "shape"), (D, "scale"), (D, "threshold")],
+    dict(name="Gamma", domain="positive(shape) && positive(scale) && finite(threshold)",
+         params=[(D, "shape"), (D, "scale"), (D, "threshold")],
          doc="Gamma(shape, scale) shifted by threshold."),
-    dict(name="Geometric", params=[(D, "p")],
+    dict(name="Geometric", domain="p > 0.0 && p <= 1.0",
+         params=[(D, "p")],
          kernel_pdf="geometricPdf", kernel_cdf="geometricCdf", kernel_inv="geometricInvCdf",
          doc="Geometric: the number of trials up to the first success (negative\n"
              "binomial with r = 1)."),
-    dict(name="HalfNormal", params=[(D, "scale"), (D, "location")],
+    dict(name="HalfNormal", domain="positive(scale) && finite(location)",
+         params=[(D, "scale"), (D, "location")],
          doc="Half-normal(scale) above location."),
-    dict(name="Hypergeometric", params=[(I, "N"), (I, "M"), (I, "n")],
+    dict(name="Hypergeometric", domain="N >= 0 && M >= 0 && n >= 0 && M <= N && n <= N",
+         params=[(I, "N"), (I, "M"), (I, "n")],
          doc="Hypergeometric: population N, M of them marked, sample n. The upper\n"
              "tail includes the point."),
-    dict(name="IntegerUniform", params=[(I, "lower"), (I, "upper")],
+    dict(name="IntegerUniform", domain="lower <= upper",
+         params=[(I, "lower"), (I, "upper")],
          doc="Discrete uniform on the integers lower..upper."),
-    dict(name="LargestExtremeValue", params=[(D, "location"), (D, "scale")],
+    dict(name="LargestExtremeValue", domain="finite(location) && positive(scale)",
+         params=[(D, "location"), (D, "scale")],
          doc="Largest extreme value (Gumbel) distribution."),
-    dict(name="Lambda", params=[(D, "lambda"), (D, "location"), (D, "scale")],
+    dict(name="Lambda", domain="finite(lambda) && finite(location) && positive(scale)",
+         params=[(D, "lambda"), (D, "location"), (D, "scale")],
          doc="Tukey's lambda distribution."),
-    dict(name="Laplace", params=[(D, "location"), (D, "scale")], doc="Laplace(location, scale)."),
-    dict(name="Logistic", params=[(D, "location"), (D, "scale")], doc="Logistic(location, scale)."),
-    dict(name="LogLogistic", params=[(D, "location"), (D, "scale"), (D, "threshold")],
+    dict(name="Laplace", domain="finite(location) && positive(scale)",
+         params=[(D, "location"), (D, "scale")], doc="Laplace(location, scale)."),
+    dict(name="Logistic", domain="finite(location) && positive(scale)",
+         params=[(D, "location"), (D, "scale")], doc="Logistic(location, scale)."),
+    dict(name="LogLogistic", domain="finite(location) && positive(scale) && finite(threshold)",
+         params=[(D, "location"), (D, "scale"), (D, "threshold")],
          doc="Log-logistic: log(X - threshold) is Logistic(location, scale)."),
-    dict(name="LogNormal", params=[(D, "location"), (D, "scale"), (D, "threshold")],
+    dict(name="LogNormal", domain="finite(location) && positive(scale) && finite(threshold)",
+         params=[(D, "location"), (D, "scale"), (D, "threshold")],
          doc="Log-normal: log(X - threshold) is Normal(location, scale)."),
-    dict(name="NegBinomial", params=[(D, "p"), (D, "r")],
+    dict(name="NegBinomial", domain="p > 0.0 && p <= 1.0 && count(r) && r >= 1.0",
+         params=[(D, "p"), (D, "r")],
          doc="Negative binomial: the number of trials up to the r-th success\n"
              "(support starts at r)."),
-    dict(name="Normal", params=[(D, "mean"), (D, "sigma")], doc="Normal(mean, sigma)."),
-    dict(name="Poisson", params=[(D, "mean")], doc="Poisson(mean). The upper tail includes the point."),
-    dict(name="SmallestExtremeValue", params=[(D, "location"), (D, "scale")],
+    dict(name="Normal", domain="finite(mean) && positive(sigma)",
+         params=[(D, "mean"), (D, "sigma")], doc="Normal(mean, sigma)."),
+    dict(name="Poisson", domain="nonNegative(mean)",
+         params=[(D, "mean")], doc="Poisson(mean). The upper tail includes the point."),
+    dict(name="SmallestExtremeValue", domain="finite(location) && positive(scale)",
+         params=[(D, "location"), (D, "scale")],
          kernel_pdf="smallestExtremeValuePdf", doc="Smallest extreme value distribution."),
-    dict(name="T", params=[(D, "df"), (D, "noncentrality")],
+    dict(name="T", domain="positive(df) && finite(noncentrality)",
+         params=[(D, "df"), (D, "noncentrality")],
          doc="Student's t with df degrees of freedom and a noncentrality (0: central)."),
-    dict(name="Triangular", params=[(D, "lower"), (D, "mode"), (D, "upper")],
+    dict(name="Triangular", domain="finite(lower) && finite(upper) && lower <= mode && mode <= upper && lower < upper && finite(upper - lower)",
+         params=[(D, "lower"), (D, "mode"), (D, "upper")],
          doc="Triangular on [lower, upper] with its peak at mode."),
-    dict(name="Uniform", params=[(D, "lower"), (D, "upper")], frame="bare",
+    dict(name="Uniform", domain="finite(lower) && finite(upper) && lower < upper && finite(upper - lower)",
+         params=[(D, "lower"), (D, "upper")], frame="bare",
          cli_defaults={"lower": "0.0", "upper": "1.0"},
          doc="Uniform on [lower, upper]. Bare frame: no floating-point state change and\n"
              "no parameter check (lower == upper divides by zero and gives infinity)."),
-    dict(name="Weibull", params=[(D, "shape"), (D, "scale"), (D, "threshold")],
+    dict(name="Weibull", domain="positive(shape) && positive(scale) && finite(threshold)",
+         params=[(D, "shape"), (D, "scale"), (D, "threshold")],
          doc="Weibull(shape, scale) shifted by threshold."),
 ]
 
 # P-value and critical-value functions: name, parameters after the first
 # argument (all armed, kernel m<name>).
 PVALUES = [
-    ("BinomialPValue", (D, "x"), [(I, "n"), (D, "p"), ("EAlternative", "alternative")]),
-    ("ChiSqPValue", (D, "x"), [(D, "df"), ("EAlternative", "alternative")]),
-    ("ChiSqCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative")]),
-    ("FPValue", (D, "x"), [(D, "df1"), (D, "df2"), ("EAlternative", "alternative")]),
-    ("FCritValue", (D, "alpha"), [(D, "df1"), (D, "df2"), ("EAlternative", "alternative")]),
+    ("BinomialPValue", (D, "x"), [(I, "n"), (D, "p"), ("EAlternative", "alternative")],
+     "n >= 0 && probability(p)"),
+    ("ChiSqPValue", (D, "x"), [(D, "df"), ("EAlternative", "alternative")], "positive(df)"),
+    ("ChiSqCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative")], "positive(df)"),
+    ("FPValue", (D, "x"), [(D, "df1"), (D, "df2"), ("EAlternative", "alternative")],
+     "positive(df1) && positive(df2)"),
+    ("FCritValue", (D, "alpha"), [(D, "df1"), (D, "df2"), ("EAlternative", "alternative")],
+     "positive(df1) && positive(df2)"),
     ("HypergeometricPValue", (I, "x"), [(I, "N"), (I, "M"), (I, "n"),
-                                        ("EAlternative", "alternative")]),
-    ("NormalPValue", (D, "z"), [("EAlternative", "alternative")]),
-    ("NormalCritValue", (D, "alpha"), [("EAlternative", "alternative")]),
-    ("TPValue", (D, "t"), [(D, "df"), ("EAlternative", "alternative")]),
-    ("TCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative"), (I, "k")]),
-    ("TSidakCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative"), (I, "k")]),
+                                        ("EAlternative", "alternative")],
+     "N >= 0 && M >= 0 && n >= 0 && M <= N && n <= N"),
+    ("NormalPValue", (D, "z"), [("EAlternative", "alternative")], "true"),
+    ("NormalCritValue", (D, "alpha"), [("EAlternative", "alternative")], "true"),
+    ("TPValue", (D, "t"), [(D, "df"), ("EAlternative", "alternative")], "positive(df)"),
+    ("TCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative"), (I, "k")],
+     "positive(df) && k >= 1"),
+    ("TSidakCritValue", (D, "alpha"), [(D, "df"), ("EAlternative", "alternative"), (I, "k")],
+     "positive(df) && k >= 1"),
 ]
+
+PREDICATES = ("finite", "positive", "nonNegative", "probability", "count")
+
+
+def qualified(expr):
+    """The domain expression with its predicates in namespace domain."""
+    import re
+    return re.sub(r"\b(%s)\(" % "|".join(PREDICATES), r"domain::\1(", expr)
+
+
+def domain_check(f, suffix, params):
+    """The family's domain clauses that speak only of this function's
+    parameters (ChiSqPdf has no noncentrality, for instance)."""
+    import re
+    expr = f.get("domain_" + suffix.lower(), f["domain"])
+    family_names = {n for _, n in f["params"]} | {n for k in ("pdf", "cdf", "inv")
+                                                   for _, n in f.get(k, [])}
+    present = {n for _, n in params}
+    clauses = []
+    for clause in expr.split(" && "):
+        used = set(re.findall(r"\b[A-Za-z_]\w*\b", clause)) & family_names
+        if used <= present:
+            clauses.append(clause)
+    return qualified(" && ".join(clauses)) if clauses else "true"
 
 
 def plist(params):
@@ -144,7 +200,7 @@ def declarations():
     out.append("// P-values of test statistics (the tail or tails that the alternative")
     out.append("// names) and critical values at level alpha. TCritValue divides alpha by k")
     out.append("// (Bonferroni), TSidakCritValue uses 1 - (1 - alpha)^(1/k).")
-    for name, first, rest in PVALUES:
+    for name, first, rest, _ in PVALUES:
         out.append(f"QEL_API double {name}({first[0]} {first[1]}, {plist(rest)});")
     return "\n".join(out)
 
@@ -162,6 +218,15 @@ HEADER = """// Exported distribution functions. GENERATED by tools/codegen/gen_d
 // Array forms: output first, input second, count third, then the parameters
 // of the scalar form; one floating-point state switch serves the whole
 // column. out may equal the input array.
+//
+// Parameters outside a family's domain (a scale, sigma or df that is not
+// positive, a probability outside [0, 1], a count that is not a whole
+// number, NaN, an infinity or the missing value) give NaN, and so does a NaN
+// argument; at x = -inf or +inf a Cdf gives the limit and a Pdf 0. A Cdf is
+// in [0, 1], a Pdf >= 0, a quantile in the support; the missing value is
+// never returned. Exceptions: see the contract at RegisterLynSigfpeHandler
+// in <qel/basic_types.h> (no catch here; a host recovers with catch and
+// ResetFpuStates()).
 #ifndef QEL_DISTRIBUTIONS_H
 #define QEL_DISTRIBUTIONS_H
 
@@ -181,8 +246,8 @@ def definitions():
            "// Included by random_distributions.cpp inside namespace qel."]
     for f in FAMILIES:
         bare = f.get("frame") == "bare"
-        frame = "bare" if bare else "frame::armed"
-        array = "frame::bareArray" if bare else "frame::armedArray"
+        frame = "frame::bare" if bare else "frame::armed"
+        array = "frame::checkedBareArray" if bare else "frame::checkedArmedArray"
         for suffix, params, var, tail in function_sets(f):
             kernel = f.get("kernel_" + {"Pdf": "pdf", "Cdf": "cdf", "InvCdf": "inv"}[suffix],
                            f"m{f['name']}{suffix}")
@@ -191,12 +256,23 @@ def definitions():
             # Cdf kernels also have a both-tails form).
             types = ", ".join(["double"] + [t for t, _ in ps])
             kernel = f"static_cast<double (*)({types})>({kernel})"
-            out.append(f"QEL_DEFINE_FAMILY_FUNCTION({f['name']}{suffix},")
+            out.append(f"QEL_DEFINE_FAMILY_FUNCTION({f['name']}{suffix}, domain::Kind::k{suffix},")
             out.append(f"                           {kernel},")
             out.append(f"                           {frame}, {array},")
-            out.append(f"                           ({plist(ps)}), ({alist(ps)}))")
-    for name, first, rest in PVALUES:
+            out.append(f"                           ({plist(ps)}), ({alist(ps)}),")
+            out.append(f"                           {domain_check(f, suffix, params)},")
+            out.append(f"                           {'upperTail' if tail else 'false'})")
+    for name, first, rest, dom in PVALUES:
         out.append(f"double {name}({first[0]} {first[1]}, {plist(rest)}) {{")
+        if dom != "true":
+            out.append(f"  if (!({qualified(dom)})) return mQuietNaN();")
+        if first[0] == D:
+            out.append("  double answer;")
+            if first[1] == "alpha":
+                out.append(f"  if (domain::decidedLevel({first[1]}, &answer)) return answer;")
+            else:
+                out.append(f"  if (domain::decidedStatistic({first[1]}, alternative, &answer)) "
+                           "return answer;")
         out.append(f"  return frame::armed(m{name}, {first[1]}, {alist(rest)});")
         out.append("}")
     return "\n".join(out) + "\n"
@@ -242,7 +318,7 @@ def demangled_names():
         extra = ", bool" if tail else ""
         names.append(f"qel::Discrete{suffix}(double, {d}{extra})")
         names.append(f"qel::Discrete{suffix}(double*, double const*, unsigned long, {d}{extra})")
-    for name, first, rest in PVALUES:
+    for name, first, rest, _ in PVALUES:
         names.append(f"qel::{name}({', '.join([t(first[0])] + [t(ty) for ty, _ in rest])})")
     return names
 
@@ -313,7 +389,7 @@ def signature_test():
         extra = ["bool"] if tail else []
         emit("double", f"Discrete{suffix}", ["double"] + d + extra)
         emit("void", f"Discrete{suffix}", ["double*", "const double*", "unsigned long"] + d + extra)
-    for name, first, rest in PVALUES:
+    for name, first, rest, _ in PVALUES:
         emit("double", name, [first[0]] + [("qel::" + t if t == "EAlternative" else t) for t, _ in rest])
     out += ['  std::printf("%d exported distribution functions linked\\n", count);',
             f"  return count == {len(demangled_names())} ? 0 : 1;", "}"]

@@ -81,7 +81,10 @@ case("lambda", "pdf", 0.6, (2, 0, 1), 0)
 case("lambda", "inv", 0.75, (1, 0, 1), 0.5)
 case("lambda", "inv", 0.75, (2, 0, 1), 0.25)
 case("lambda", "inv", 0, (-0.5, 0, 1), MISSING)
-case("lambda", "lower", 0.3, (-0.5, 0, 1), MISSING)
+# A negative lambda: the support is the real line, P(X <= x) the root p of
+# Q(p) = (p^l - (1 - p)^l)/l = x.
+case("lambda", "lower", 0.3, (-0.5, 0, 1),
+     mp.findroot(lambda p: (p**mpf(-0.5) - (1 - p)**mpf(-0.5)) / mpf(-0.5) - mpf(0.3), 0.55))
 # Integer rules: a mass only at integers (within 1e-12), tails of the floor.
 case("binomial", "pdf", 2.5, (5, 0.5), 0)
 case("binomial", "pdf", 2.0 + 1e-13, (5, 0.5), mpf(10) / 32)

@@ -12,6 +12,11 @@ int MakeTraditionalSymmetricCI(F const& inverseCdf, double confidence, IntervalT
                                double estimate, double standardError, double* lower,
                                double* upper) {
   const double infinity = std::numeric_limits<double>::infinity();
+  // A confidence outside (0, 1) would turn the interval inside out.
+  if (!(confidence > 0.0 && confidence < 1.0)) {
+    *lower = *upper = std::numeric_limits<double>::quiet_NaN();
+    return qelFailBadEnumValue;
+  }
   switch (type) {
     case kIntervalTwoSided: {
       // Each tail holds half of 1 - confidence.

@@ -180,6 +180,8 @@ void test(MannWhitney* record, SortedSample const& x, SortedSample const& y, dou
 int legacyRunMannWhitney(MannWhitney* record, double const* x, double const* y, double confidence,
                          IntervalType type, AlternativeHypothesis alternative) {
   if (type < -1 || type > 1 || alternative < -1 || alternative > 1) return qelFailBadEnumValue;
+  // A confidence outside (0, 1) would give an inverted interval.
+  if (!(confidence > 0.0 && confidence < 1.0)) return qelFailBadEnumValue;
   if (record->firstN < 1 || record->secondN < 1) return qelFailDegenerateData;
   SortedSample first{x, record->firstN, {}, {}};
   SortedSample second{y, record->secondN, {}, {}};

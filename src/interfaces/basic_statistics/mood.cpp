@@ -192,12 +192,18 @@ int legacyRunMood(Mood* record) {
     const double d1 = group.countAtOrBelow - e1, d2 = group.countAbove - e2;
     chi += d1 * d1 / e1 + d2 * d2 / e2;
   }
-  record->statistic = chi;
-  record->pValue = ChiSqPValue(chi, record->degreesOfFreedom, kAlternativeGreater);
+  if (counted < 2) {
+    // No group of two or more: there is no chi-square (flag 8 below), and
+    // the degrees of freedom are not -1 or 0 but absent.
+    record->degreesOfFreedom = kNaN;
+  } else {
+    record->statistic = chi;
+    record->pValue = ChiSqPValue(chi, record->degreesOfFreedom, kAlternativeGreater);
+  }
   if (record->groupCount == 2 && record->groups[0].n > 0 && record->groups[1].n > 0) {
     twoSample(record);
   }
-  if (record->degreesOfFreedom <= 0.0) record->flags |= kMoodNoDegrees;
+  if (!(record->degreesOfFreedom > 0.0)) record->flags |= kMoodNoDegrees;
   if (failures > 0) return qelFailOutOfMemory;
   return record->flags != 0 ? kFlaggedWarning : qelOk;
 }

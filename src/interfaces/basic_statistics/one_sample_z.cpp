@@ -11,7 +11,15 @@ namespace v0 {
 
 namespace {
 
+constexpr double kNaN = std::numeric_limits<double>::quiet_NaN();
+
 int intervalFromSummary(OneSampleZ* record, double sigma, double confidence, IntervalType type) {
+  // A known sigma cannot be negative (0 gives an infinite statistic).
+  if (!(sigma >= 0.0 && std::isfinite(sigma))) {
+    record->standardError = record->lowerLimit = record->upperLimit = kNaN;
+    record->statistic = record->pValue = kNaN;
+    return qelFailBadEnumValue;
+  }
   record->standardError = sigma / std::sqrt(static_cast<double>(record->n));
   return v1::MakeTraditionalSymmetricCI(NormalInvCdfFunc(), confidence, type, record->mean,
                                         record->standardError, &record->lowerLimit,

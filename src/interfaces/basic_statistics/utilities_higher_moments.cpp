@@ -11,6 +11,7 @@
 #include <qel/basic_types.h>
 
 #include <cmath>
+#include <cstdint>
 #include <limits>
 
 #include "interfaces/basic_statistics/utilities.h"
@@ -39,8 +40,9 @@ CentralSums centralSums(double const* x, unsigned int n) {
     mean.add(e);
     m2.add(t);
     m3.add(((k - 1) * t - 3 * oldM2) * e);
-    // k*k - k is formed in unsigned 32-bit arithmetic before the conversion.
-    const double w = static_cast<double>(k * k - k + 1u);
+    // k*k - k + 1 in 64 bits: in 32 it wraps from k = 65537 on.
+    const std::uint64_t k64 = k;
+    const double w = static_cast<double>(k64 * k64 - k64 + 1u);
     m4.add((w * t * e + 6 * oldM2 * e - 4 * oldM3) * e);
   }
   return {mean.sum, m2.sum, m3.sum, m4.sum};

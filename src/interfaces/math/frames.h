@@ -7,13 +7,19 @@
 // Array form: one state switch serves the whole column. Each element is read
 // before it is written and no other element is touched, so out may equal in.
 //
-// Both armed frames ask the ELV routines for tails down to the smallest
+// All armed frames ask the ELV routines for tails down to the smallest
 // normal double (limits.h).
 //
-// Bare frame: the kernel alone, no state call and no translation.
+// Bare frame: the kernel alone, no state call; the missing value still
+// becomes NaN, since it never leaves an exported function.
+//
+// The checked forms (family functions) first refuse parameters outside the
+// family's domain and answer NaN and infinite arguments without the kernel
+// (domains.h); those answers leave the floating-point state untouched.
 #ifndef QEL_SRC_INTERFACES_MATH_FRAMES_H
 #define QEL_SRC_INTERFACES_MATH_FRAMES_H
 
+#include "interfaces/math/domains.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/elv/limits.h"
 
@@ -43,26 +49,65 @@ void armedArray(Kernel kernel, double* out, const double* in, unsigned long coun
   ResetFpuStates();
 }
 
+inline void fillNaN(double* out, unsigned long count) {
+  for (unsigned long i = 0; i < count; ++i) out[i] = mQuietNaN();
+}
+
+// Array form of a family function: elements that their argument decides
+// alone are answered without the kernel; the others run in one armed span.
 template <class Kernel, class... Params>
-void bareArray(Kernel kernel, double* out, const double* in, unsigned long count,
-               Params... params) {
-  for (unsigned long i = 0; i < count; ++i) out[i] = kernel(in[i], params...);
+void checkedArmedArray(domain::Kind kind, bool upperTail, Kernel kernel, double* out,
+                       const double* in, unsigned long count, Params... params) {
+  const elv::DeepTailScope deep;
+  SetLynFpuStates();
+  for (unsigned long i = 0; i < count; ++i) {
+    double answer;
+    const double x = in[i];
+    out[i] = domain::decidedByArgument(kind, x, upperTail, &answer)
+                 ? answer
+                 : missingToNaN(kernel(x, params...));
+  }
+  ResetFpuStates();
+}
+
+template <class Kernel, class... Params>
+void checkedBareArray(domain::Kind kind, bool upperTail, Kernel kernel, double* out,
+                      const double* in, unsigned long count, Params... params) {
+  for (unsigned long i = 0; i < count; ++i) {
+    double answer;
+    const double x = in[i];
+    out[i] = domain::decidedByArgument(kind, x, upperTail, &answer)
+                 ? answer
+                 : missingToNaN(kernel(x, params...));
+  }
+}
+
+template <class Kernel, class... Params>
+double bare(Kernel kernel, double x, Params... params) {
+  return missingToNaN(kernel(x, params...));
 }
 
 }  // namespace frame
 }  // namespace qel
 
-// Defines the scalar and the array form of one exported function around a
-// kernel. PARAMS is the parenthesised parameter list after the first
-// argument, ARGS the matching parenthesised argument names.
+// Defines the scalar and the array form of one exported family function
+// around a kernel. PARAMS is the parenthesised parameter list after the first
+// argument, ARGS the matching parenthesised argument names, VALID the
+// family's domain check on them and TAIL the upper-tail flag (false where the
+// function has none).
 #define QEL_FRAME_UNPACK(...) __VA_ARGS__
 
-#define QEL_DEFINE_FAMILY_FUNCTION(Name, Kernel, Frame, ArrayFrame, PARAMS, ARGS)          \
-  double Name(double x, QEL_FRAME_UNPACK PARAMS) {                                         \
-    return Frame(Kernel, x, QEL_FRAME_UNPACK ARGS);                                        \
-  }                                                                                        \
-  void Name(double* out, const double* in, unsigned long count, QEL_FRAME_UNPACK PARAMS) { \
-    ArrayFrame(Kernel, out, in, count, QEL_FRAME_UNPACK ARGS);                             \
+#define QEL_DEFINE_FAMILY_FUNCTION(Name, Kind, Kernel, Frame, ArrayFrame, PARAMS, ARGS, VALID, \
+                                   TAIL)                                                       \
+  double Name(double x, QEL_FRAME_UNPACK PARAMS) {                                             \
+    double answer;                                                                             \
+    if (!(VALID)) return mQuietNaN();                                                          \
+    if (domain::decidedByArgument(Kind, x, TAIL, &answer)) return answer;                      \
+    return Frame(Kernel, x, QEL_FRAME_UNPACK ARGS);                                            \
+  }                                                                                            \
+  void Name(double* out, const double* in, unsigned long count, QEL_FRAME_UNPACK PARAMS) {     \
+    if (!(VALID)) return frame::fillNaN(out, count);                                           \
+    ArrayFrame(Kind, TAIL, Kernel, out, in, count, QEL_FRAME_UNPACK ARGS);                     \
   }
 
 #endif

@@ -11,12 +11,6 @@ namespace qel {
 
 namespace {
 
-// The bare frame's scalar form: the kernel itself.
-template <class Kernel, class... Params>
-double bare(Kernel kernel, double x, Params... params) {
-  return kernel(x, params...);
-}
-
 // The geometric law is the negative binomial with r = 1.
 double geometricPdf(double x, double p) {
   return mNegBinomialPdf(x, p, 1.0);

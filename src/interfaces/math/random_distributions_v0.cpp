@@ -3,8 +3,8 @@
 #include <cmath>
 
 #include "interfaces/math/frames.h"
-#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 namespace v0 {
@@ -31,7 +31,7 @@ double NormalInvCdf(double p, double mean, double sigma) {
 }
 
 double TInvCdf(double p, double df, double noncentrality) {
-  if (notFinite(p) || notFinite(df)) return mQuietNaN();
+  if (notFinite(p) || notFinite(df) || !(df > 0.0)) return mQuietNaN();
   return frame::armed(mTInvCdf, p, df, noncentrality);
 }
 
@@ -42,7 +42,8 @@ double NormalPValue(double z, AlternativeHypothesis alternative) {
 }
 
 double TPValue(double t, double df, AlternativeHypothesis alternative) {
-  if (std::isnan(t) || std::isnan(df)) return mQuietNaN();
+  // No degrees of freedom (a sample of one): no P-value.
+  if (std::isnan(t) || std::isnan(df) || !(df > 0.0)) return mQuietNaN();
   if (std::isinf(t)) return 0.0;
   // Infinitely many degrees of freedom: the normal law.
   if (std::isinf(df)) return frame::armed(mNormalPValue, t, alternative);
@@ -56,7 +57,7 @@ double NormalCritValue(double alpha, AlternativeHypothesis alternative) {
 }
 
 double TCritValue(double alpha, double df, AlternativeHypothesis alternative) {
-  if (notFinite(alpha) || notFinite(df)) return mQuietNaN();
+  if (notFinite(alpha) || notFinite(df) || !(df > 0.0)) return mQuietNaN();
   return frame::armed(mTInvCdf, criticalProbability(alpha, alternative), df, 0.0);
 }
 

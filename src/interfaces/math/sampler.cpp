@@ -10,8 +10,9 @@
 
 #include "interfaces/math/random_distributions_v1.h"
 #include "interfaces/math/rngs_sampling.h"
-#include "utilities/distributions/classes.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/classes.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 namespace {
@@ -29,9 +30,57 @@ int drawInto(CmUniformGenerator* generator, double* out, unsigned n, Args... arg
   SetLynFpuStates();
   Dist dist(args...);
   dist.SetBrng(generator);
-  for (unsigned i = 0; i < n; ++i) out[i] = dist.mGetRandom();
+  bool missing = false;
+  for (unsigned i = 0; i < n; ++i) {
+    out[i] = dist.mGetRandom();
+    missing = missing || mIsNumericMissing(out[i]);
+  }
   ResetFpuStates();
-  return dist.GetMsgCode();
+  // A missing variate is never reported with code 0.
+  const int code = dist.GetMsgCode();
+  return code == 0 && missing ? qelFailRandomVariate : code;
+}
+
+// Parameters outside the family's domain: no draw, NaN in every element and
+// the code of a refused argument.
+int refuse(double* out, unsigned n) {
+  if (out != nullptr) {
+    for (unsigned i = 0; i < n; ++i) out[i] = std::numeric_limits<double>::quiet_NaN();
+  }
+  return qelFailBadEnumValue;
+}
+
+bool positiveFinite(double v) {
+  return v > 0.0 && std::isfinite(v);
+}
+
+// Means from here on are drawn by transformed rejection: the inversion of
+// the Poisson quantile needs a tail routine whose work grows with the mean.
+constexpr double kLargePoissonMean = 1e8;
+
+// PTRS, the transformed rejection with squeeze of Hormann (1993), "The
+// transformed rejection method for generating Poisson random variables",
+// Insurance: Mathematics and Economics 12, 39-45; for means of 10 and more.
+double poissonByTransformedRejection(CmUniformGenerator* generator, double mean) {
+  const double root = std::sqrt(mean);
+  const double logMean = std::log(mean);
+  const double b = 0.931 + 2.53 * root;
+  const double a = -0.059 + 0.02483 * b;
+  const double inverseAlpha = 1.1239 + 1.1328 / (b - 3.4);
+  const double vr = 0.9277 - 3.6224 / (b - 2.0);
+  for (;;) {
+    const double u = generator->mGetRandom() - 0.5;
+    const double v = generator->mGetRandom();
+    const double us = 0.5 - std::fabs(u);
+    if (!(us > 0.0 && v > 0.0)) continue;
+    const double k = std::floor((2.0 * a / us + b) * u + mean + 0.43);
+    if (us >= 0.07 && v <= vr) return k;
+    if (k < 0.0 || (us < 0.013 && v > us)) continue;
+    if (std::log(v) + std::log(inverseAlpha) - std::log(a / (us * us) + b) <=
+        -mean + k * logMean - mLogGamma(k + 1.0)) {
+      return k;
+    }
+  }
 }
 
 }  // namespace
@@ -57,6 +106,7 @@ int Sampler::ChiSq(double* out, unsigned n, double df, double) {
   return drawInto<CmDistGamma>(mGenerator, out, n, df * 0.5, 2.0, 0.0);
 }
 int Sampler::Exponential(double* out, unsigned n, double scale, double threshold) {
+  if (!positiveFinite(scale) || !std::isfinite(threshold)) return refuse(out, n);
   return drawInto<CmDistExponential>(mGenerator, out, n, scale, threshold);
 }
 int Sampler::Gamma(double* out, unsigned n, double shape, double scale, double threshold) {
@@ -96,6 +146,7 @@ int Sampler::Bernoulli(double* out, unsigned n, double p) {
   return drawInto<CmDistBernoulli>(mGenerator, out, n, p);
 }
 int Sampler::Binomial(double* out, unsigned n, int trials, double p) {
+  if (trials < 0 || !(p >= 0.0 && p <= 1.0)) return refuse(out, n);
   return drawInto<CmDistBinomial>(mGenerator, out, n, trials, p);
 }
 // The distribution object's flag says "failures only": the negation.
@@ -103,6 +154,9 @@ int Sampler::Geometric(double* out, unsigned n, double p, bool countTrials) {
   return drawInto<CmDistNegBinomial>(mGenerator, out, n, p, 1.0, !countTrials);
 }
 int Sampler::Hypergeometric(double* out, unsigned n, int population, int marked, int sample) {
+  if (marked < 0 || sample < 0 || marked > population || sample > population) {
+    return refuse(out, n);
+  }
   return drawInto<CmDistHypergeometric>(mGenerator, out, n, population, marked, sample);
 }
 int Sampler::NegBinomial(double* out, unsigned n, unsigned successes, double p, bool countTrials) {
@@ -110,7 +164,13 @@ int Sampler::NegBinomial(double* out, unsigned n, unsigned successes, double p, 
                                      !countTrials);
 }
 int Sampler::Poisson(double* out, unsigned n, double mean) {
-  return drawInto<CmDistPoisson>(mGenerator, out, n, mean);
+  if (!(mean >= 0.0 && std::isfinite(mean))) return refuse(out, n);
+  if (mean < kLargePoissonMean) return drawInto<CmDistPoisson>(mGenerator, out, n, mean);
+  if (cannotFill(out, n)) return qelFailRandomVariate;
+  SetLynFpuStates();
+  for (unsigned i = 0; i < n; ++i) out[i] = poissonByTransformedRejection(mGenerator, mean);
+  ResetFpuStates();
+  return 0;
 }
 int Sampler::Uniform(double* out, unsigned n, int lower, int upper) {
   return drawInto<CmDistIntegerUniform>(mGenerator, out, n, lower, upper);
@@ -229,6 +289,11 @@ int Sampler::Discrete(double* out, unsigned n, double const* values, double cons
 int Sampler::RandomSample(unsigned* out, unsigned population, unsigned count,
                           bool withoutReplacement) {
   if (cannotFill(out, count)) return qelFailRandomVariate;
+  // Without replacement no more than the population can be drawn.
+  if (withoutReplacement && count > population) {
+    for (unsigned i = 0; i < count; ++i) out[i] = 4294967295u;
+    return qelFailBadEnumValue;
+  }
   if (!withoutReplacement) {
     for (unsigned i = 0; i < count; ++i)
       out[i] = static_cast<unsigned>(std::floor(mGenerator->mGetRandom() * population));

@@ -2,11 +2,13 @@
 //
 // The F quantile of a noncentral F has no routine of its own: it is a root
 // search of the distribution function from 0 upward.
+#include <cfloat>
 #include <cmath>
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
@@ -43,6 +45,8 @@ double mBetaPdf(double x, double a, double b) {
   try {
     return saddle::betaDensity(x, a, b);
   } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
     return mGetMissingValueCode();
   }
 }
@@ -90,6 +94,8 @@ double mFPdf(double x, double df1, double df2) {
   try {
     return saddle::fDensity(x, df1, df2);
   } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
     return mGetMissingValueCode();
   }
 }

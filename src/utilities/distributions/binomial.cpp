@@ -9,6 +9,7 @@
 // The two-sided P-value orders the outcomes by their likelihood ratio
 // against p (the G statistic): it adds the probability of every outcome at
 // least as unlikely as the observed one on the far side of the mean.
+#include <algorithm>
 #include <cmath>
 #include <stdexcept>
 
@@ -26,6 +27,9 @@ namespace qel {
 
 namespace {
 
+// 2^53: above it a double no longer holds every whole number.
+constexpr double kExactCountLimit = 9007199254740992.0;
+
 // P(X <= k), 0 <= k < n, by the incomplete beta ratio.
 double binomialLowerTailByBeta(double k, double n, double p) {
   return mIncompleteBetaRatio(p, 1.0 - p, k + 1.0, n - k, true);
@@ -39,7 +43,13 @@ double mBinomialPdf(double x, int n, double p) {
   if (p == 0.0) return k == 0.0 ? 1.0 : 0.0;
   if (p == 1.0) return k == n ? 1.0 : 0.0;
   if (k < 0.0 || k > n) return 0.0;
-  return saddle::binomialMass(k, n, p, 1.0 - p);
+  try {
+    return saddle::binomialMass(k, n, p, 1.0 - p);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 double mBinomialCdf(double x, double n, double p, bool upperTail) {
@@ -57,7 +67,12 @@ double mBinomialCdf(double x, double n, double p, bool upperTail) {
       return lower;
     }
   }
-  return binomialLowerTailByBeta(k, n, p);
+  // Beyond 2^53 trials (the negative binomial asks so for a huge x) with
+  // n p^2 below rounding, the Poisson law of mean n p is the binomial to
+  // double precision (Le Cam's bound n p^2 on the total variation).
+  if (n > kExactCountLimit && n * p * p < 1e-16) return mPoissonCdf(k, n * p, false);
+  const double tail = binomialLowerTailByBeta(k, n, p);
+  return mIsNumericMissing(tail) ? tail : std::min(std::max(tail, 0.0), 1.0);
 }
 
 double mBinomialInvCdf(double p, int n, double prob) {
@@ -100,6 +115,9 @@ double mBinomialPValue(double x, int n, double p, EAlternative alternative) {
   if (alternative == kAlternativeLess) return mBinomialCdf(x, n, p, false);
   if (alternative == kAlternativeGreater) return mBinomialCdf(n - x, n, 1.0 - p, false);
   if (alternative != kAlternativeNotEqual) return 0.0;
+  // An outcome outside 0..n is impossible: nothing is as extreme (and the
+  // conversion to int below needs x in range).
+  if (!(x >= 0.0 && x <= n)) return 0.0;
 
   int k = static_cast<int>(x);
   if (mEqualWithinFuzz(p, 0.5, 0.0)) {
@@ -131,7 +149,8 @@ double mBinomialPValue(double x, int n, double p, EAlternative alternative) {
   const double nearTail = mBinomialCdf(k, n, p, false);
   const double farTail = mBinomialCdf(n - b, n, 1.0 - p, false);
   if (mIsNumericMissing(nearTail) || mIsNumericMissing(farTail)) return mGetMissingValueCode();
-  return nearTail + farTail;
+  // The two tails of a symmetric-in-likelihood set add to 1 plus rounding.
+  return std::min(nearTail + farTail, 1.0);
 }
 
 }  // namespace qel

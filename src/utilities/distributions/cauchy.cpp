@@ -8,20 +8,22 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/standardize.h"
 
 namespace qel {
 
 double mCauchyPdf(double x, double location, double scale) {
-  const double z = (x - location) / scale;
+  const double z = mStandardize(x, location, scale);
   const double pi = mGetPi();
-  if (std::fabs(z) <= 1.0) return 1.0 / (pi * scale * (1.0 + z * z));
+  // Divided by the scale last: pi times a scale near DBL_MAX overflows.
+  if (std::fabs(z) <= 1.0) return 1.0 / (pi * (1.0 + z * z)) / scale;
   // 1/(1 + z^2) = w^2/(1 + w^2) with w = 1/z: no overflow of z^2.
   const double w = 1.0 / z;
-  return w * w / (pi * scale * (1.0 + w * w));
+  return w * w / (pi * (1.0 + w * w)) / scale;
 }
 
 namespace {
@@ -37,7 +39,7 @@ double standardCauchyLowerTail(double z) {
 }  // namespace
 
 double mCauchyCdf(double x, double location, double scale, bool upperTail) {
-  const double z = (x - location) / scale;
+  const double z = mStandardize(x, location, scale);
   return standardCauchyLowerTail(upperTail ? -z : z);
 }
 
@@ -50,6 +52,9 @@ double mCauchyInvCdf(double p, double location, double scale) {
     if (p > 0.75 && p < 1.0) return location + scale / mTan(pi * (1.0 - p));
     return location + scale * mTan(pi * (p - 0.5));
   } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  } catch (const std::runtime_error&) {
+    // A quantile beyond the double range (a huge scale): no answer.
     return mGetMissingValueCode();
   }
 }

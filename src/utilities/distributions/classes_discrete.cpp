@@ -12,10 +12,10 @@
 #include <new>
 #include <stdexcept>
 
-#include "utilities/distributions/classes.h"
-#include "utilities/distributions/kernels.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
+#include "utilities/distributions/classes.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 namespace {
@@ -66,7 +66,33 @@ double CmDistBinomial::mInvCdf(double p) const {
   return mBinomialInvCdf(p, mN, mP);
 }
 
+// Up to this many trials a draw counts Bernoulli trials; beyond, it inverts
+// the distribution function at one uniform, so that a draw of INT_MAX
+// trials costs one quantile search instead of 2^31 uniforms.
+constexpr int kLargestCountedTrials = 10000;
+
+// The smallest k with P(X <= k) >= u, by bisection on whole numbers within
+// mean +- 40 sd (the tails beyond hold less than 1e-300): for trial counts
+// beyond the ELV quantile routine's range.
+static double binomialQuantileByBisection(double u, int n, double p) {
+  const double mean = n * p, sd = std::sqrt(n * p * (1.0 - p));
+  double lo = std::max(-1.0, std::floor(mean - 40.0 * sd)),
+         hi = std::min(1.0 * n, std::ceil(mean + 40.0 * sd));
+  while (hi - lo > 1.0) {
+    const double mid = std::floor(lo + (hi - lo) / 2.0);
+    const double f = mBinomialCdf(mid, n, p, false);
+    if (mIsNumericMissing(f)) return f;
+    (f >= u ? hi : lo) = mid;
+  }
+  return hi;
+}
+
 double CmDistBinomial::mGetRandom() const {
+  if (mN > kLargestCountedTrials) {
+    const double u = mUniform();
+    const double k = mBinomialInvCdf(u, mN, mP);
+    return mIsNumericMissing(k) ? binomialQuantileByBisection(u, mN, mP) : k;
+  }
   int k = 0;
   for (int i = 0; i < mN; ++i)
     if (mUniform() <= mP) ++k;

@@ -23,6 +23,13 @@ inline double cdfPoint(double x) {
   return mEqualWithinFuzz(x, r, 0.0) ? r : std::floor(x);
 }
 
+// An upper tail P(X >= x) takes that integer, or else ceil(x): the smallest
+// count that is not below x.
+inline double upperPoint(double x) {
+  const double r = mNearestInteger(x);
+  return mEqualWithinFuzz(x, r, 0.0) ? r : std::ceil(x);
+}
+
 // An ELV quantile routine reports the quantile and the fraction of the point
 // probability that p reaches. A fraction at 0 (lower routine) or at 1 (upper
 // routine) means that p was met by the previous count within rounding.

@@ -1,18 +1,17 @@
 // Exponential, extreme-value (Gumbel), Weibull and Laplace distributions.
 //
 // All four rest on the exponential tails: with e = exp(-z) the upper tail is
-// e itself, and the lower tail 1 - e is exact enough while e <= 0.999. Above
-// that the subtraction would cancel, so the lower tail comes from the
-// chi-square routine on 2 degrees of freedom at 2z, which is the same
-// distribution computed as a small tail in its own right.
+// e itself, and the lower tail 1 - e is -expm1(-z), which keeps its relative
+// accuracy for small z where the subtraction would cancel.
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/elv/wrappers.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/standardize.h"
+#include "utilities/elv/wrappers.h"
 
 namespace qel {
 
@@ -45,7 +44,7 @@ double largestExtremeValueQuantile(double minusLogP, double location, double sca
 double mExponentialPdf(double x, double scale, double threshold) {
   try {
     if (x < threshold) return 0.0;
-    return mExponential(-(x - threshold) / scale, true) / scale;
+    return mExponential(-mStandardize(x, threshold, scale), true) / scale;
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -54,13 +53,11 @@ double mExponentialPdf(double x, double scale, double threshold) {
 double mExponentialCdf(double x, double scale, double threshold, bool upperTail) {
   if (x <= threshold) return upperTail ? 1.0 : 0.0;
   try {
-    const double z = (x - threshold) / scale;
-    const double e = mExponential(-z, true);
-    if (upperTail) return e;
-    if (e <= 0.999) return 1.0 - e;
-    double lower = 0.0, upper = 0.0;
-    if (ElvFailed(elv_chi2_ncdf(z + z, 2.0, 0.0, &lower, &upper))) return mGetMissingValueCode();
-    return lower;
+    const double z = mStandardize(x, threshold, scale);
+    if (upperTail) return mExponential(-z, true);
+    // 1 - exp(-z) by expm1: exact to rounding for every z, also where a
+    // tiny z (x = 1e-300) would cancel to 0 in 1 - e.
+    return -std::expm1(-z);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -78,7 +75,7 @@ double mExponentialInvCdf(double p, double scale, double threshold) {
 
 double mLargestExtremeValuePdf(double x, double location, double scale) {
   try {
-    const double e = mExponential(-(x - location) / scale, true);
+    const double e = mExponential(-mStandardize(x, location, scale), true);
     return e * mExponential(-e, true) / scale;
   } catch (const std::runtime_error&) {
     return 0.0;
@@ -88,7 +85,7 @@ double mLargestExtremeValuePdf(double x, double location, double scale) {
 // The lower tail exp(-e) is the upper tail of a unit exponential at e.
 double mLargestExtremeValueCdf(double x, double location, double scale, bool upperTail) {
   try {
-    const double e = mExponential(-(x - location) / scale, true);
+    const double e = mExponential(-mStandardize(x, location, scale), true);
     return mExponentialCdf(e, 1.0, 0.0, !upperTail);
   } catch (const std::runtime_error&) {
     // exp(-z) overflowed: x lies far below the location.
@@ -130,7 +127,7 @@ double mSmallestExtremeValueInvCdf(double p, double location, double scale) {
 double mWeibullPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
   try {
-    const double z = (x - threshold) / scale;
+    const double z = mStandardize(x, threshold, scale);
     const double zShape = mRaiseToPower(z, shape, true);
     return shape * mExponential(-zShape, true) * mRaiseToPower(z, shape - 1.0, true) / scale;
   } catch (const std::runtime_error&) {
@@ -141,7 +138,7 @@ double mWeibullPdf(double x, double shape, double scale, double threshold) {
 double mWeibullCdf(double x, double shape, double scale, double threshold, bool upperTail) {
   if (x <= threshold) return upperTail ? 1.0 : 0.0;
   try {
-    const double z = (x - threshold) / scale;
+    const double z = mStandardize(x, threshold, scale);
     return mExponentialCdf(mRaiseToPower(z, shape, true), 1.0, 0.0, upperTail);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
@@ -162,7 +159,7 @@ double mWeibullInvCdf(double p, double shape, double scale, double threshold) {
 
 double mLaplacePdf(double x, double location, double scale) {
   try {
-    return mExponential(-std::fabs(x - location) / scale, true) / (2.0 * scale);
+    return mExponential(-std::fabs(mStandardize(x, location, scale)), true) / (2.0 * scale);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -172,7 +169,7 @@ double mLaplacePdf(double x, double location, double scale) {
 // holds the location adds one half to half the exponential lower tail.
 double mLaplaceCdf(double x, double location, double scale, bool upperTail) {
   try {
-    double s = (x - location) / scale;
+    double s = mStandardize(x, location, scale);
     if (upperTail) s = -s;
     if (s < 0.0) return 0.5 * mExponential(s, true);
     const double e = mExponentialCdf(s, 1.0, 0.0, false);

@@ -11,8 +11,10 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/standardize.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
@@ -140,13 +142,21 @@ double CmChiSqCdf::operator()(double x) {
 double mGammaPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
   // Loader's saddle-point form keeps the density's digits for large shapes.
-  return saddle::gammaDensity((x - threshold) / scale, shape) / scale;
+  const double z = mStandardize(x, threshold, scale);
+  if (std::isinf(z)) return 0.0;
+  try {
+    return saddle::gammaDensity(z, shape) / scale;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 double mGammaCdf(double x, double shape, double scale, double threshold, bool upperTail) {
   if (x < threshold) return upperTail ? 1.0 : 0.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
-  const double z = (x - threshold) / scale;
+  const double z = mStandardize(x, threshold, scale);
   if (ElvFailed(elv_gamma_df(z, shape, &lower, &upper, &density))) return mGetMissingValueCode();
   return upperTail ? upper : lower;
 }
@@ -177,7 +187,13 @@ double mGammaInvCdfByRootFinder(double p, double shape, double start) {
 
 double mChiSqPdf(double x, double df) {
   if (x <= 0.0) return 0.0;
-  return saddle::gammaDensity(x / 2.0, df / 2.0) / 2.0;
+  try {
+    return saddle::gammaDensity(x / 2.0, df / 2.0) / 2.0;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double* upper) {

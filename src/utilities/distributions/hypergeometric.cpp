@@ -28,8 +28,10 @@ struct Support {
   int hi;
 };
 
+// M + n - N in 64 bits: M + n overflows an int near INT_MAX.
 Support supportOf(int N, int M, int n) {
-  return {std::max(0, M + n - N), std::min(M, n)};
+  const long long lo = static_cast<long long>(M) + n - N;
+  return {lo > 0 ? static_cast<int>(lo) : 0, std::min(M, n)};
 }
 
 // Probability y is no more probable than the observed one: below it, or
@@ -45,12 +47,18 @@ double mHypergeometricPdf(double x, int N, int M, int n) {
   if (!discrete::massPoint(x, &k)) return 0.0;
   const Support s = supportOf(N, M, n);
   if (k < s.lo || k > s.hi) return 0.0;
-  return saddle::hypergeometricMass(k, N, M, n);
+  try {
+    return saddle::hypergeometricMass(k, N, M, n);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 // The upper tail is P(X > k) + P(X = k).
 double mHypergeometricCdf(double x, int N, int M, int n, bool upperTail) {
-  const double k = discrete::cdfPoint(x);
+  const double k = upperTail ? discrete::upperPoint(x) : discrete::cdfPoint(x);
   const Support s = supportOf(N, M, n);
   if (k < s.lo) return upperTail ? 1.0 : 0.0;
   if (k > s.hi) return upperTail ? 0.0 : 1.0;
@@ -60,7 +68,9 @@ double mHypergeometricCdf(double x, int N, int M, int n, bool upperTail) {
                                 &lower, &above, &mass))) {
     return mGetMissingValueCode();
   }
-  return upperTail ? above + mass : lower;
+  // The two parts of the upper tail add up to 1 plus rounding at the
+  // lower end of the support.
+  return upperTail ? std::min(above + mass, 1.0) : lower;
 }
 
 double mHypergeometricInvCdf(double p, int N, int M, int n) {
@@ -96,6 +106,9 @@ double mHypergeometricPValue(int x, int N, int M, int n, EAlternative alternativ
   if (alternative != kAlternativeNotEqual) return mGetMissingValueCode();
 
   const Support s = supportOf(N, M, n);
+  // An impossible outcome: only outcomes of probability 0 are as extreme, so
+  // the walks below (up to 2^31 steps) would add nothing.
+  if (x < s.lo || x > s.hi) return 0.0;
   // The mode: the classical start, moved by one towards a more probable
   // neighbour.
   int mode = static_cast<int>(std::floor((M + 1.0) * (n + 1.0) / (N + 2.0)));

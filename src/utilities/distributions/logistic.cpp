@@ -6,16 +6,17 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/standardize.h"
 
 namespace qel {
 
 double mLogisticPdf(double x, double location, double scale) {
   try {
-    const double e = mExponential(-(x - location) / scale, true);
+    const double e = mExponential(-mStandardize(x, location, scale), true);
     if (e == 0.0) return 0.0;
     return 1.0 / (1.0 / e + 2.0 + e) / scale;
   } catch (const std::runtime_error&) {
@@ -26,7 +27,7 @@ double mLogisticPdf(double x, double location, double scale) {
 
 double mLogisticCdf(double x, double location, double scale, bool upperTail) {
   try {
-    const double e = mExponential(-(x - location) / scale, true);
+    const double e = mExponential(-mStandardize(x, location, scale), true);
     return upperTail ? e / (1.0 + e) : 1.0 / (1.0 + e);
   } catch (const std::runtime_error&) {
     return upperTail ? 1.0 : 0.0;

@@ -7,13 +7,15 @@
 // geometric distribution. The quantile starts from the Cornish-Fisher
 // expansion (skewness term) of the negative binomial and finishes with an
 // integer search on the distribution function.
+#include <algorithm>
+#include <cfloat>
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/kernels.h"
-#include "utilities/distributions/discrete_rules.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
+#include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/kernels.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
@@ -63,6 +65,31 @@ double negBinomialMass(double k, double p, double r) {
   return value * p;
 }
 
+// The smallest count k >= r with F(k) >= p, by doubling the distance from r
+// and then bisecting on whole numbers. Both loops are bounded: the doubling
+// ends at the double range, and the bisection stops when no whole number
+// lies strictly between its ends (beyond 2^53 neighbouring doubles differ by
+// more than 1, where a unit step would never move).
+double smallestCountReaching(double p, double prob, double r, double start) {
+  double lo = r, hi = start;
+  for (;;) {
+    const double f = mNegBinomialCdf(hi, prob, r, false);
+    if (mIsNumericMissing(f)) return f;
+    if (f >= p) break;
+    lo = hi;
+    if (hi >= DBL_MAX / 4.0) return mGetMissingValueCode();
+    hi = r + 2.0 * (hi - r) + 1.0;
+  }
+  if (mNegBinomialCdf(lo, prob, r, false) >= p) return lo;
+  for (;;) {
+    const double mid = std::floor(lo + (hi - lo) / 2.0);
+    if (!(mid > lo && mid < hi)) return hi;
+    const double f = mNegBinomialCdf(mid, prob, r, false);
+    if (mIsNumericMissing(f)) return f;
+    (f >= p ? hi : lo) = mid;
+  }
+}
+
 }  // namespace
 
 CmNegBinomialCdf::CmNegBinomialCdf(double p, double r, double target, bool tail)
@@ -77,11 +104,16 @@ double CmNegBinomialCdf::operator()(double x) {
 double mNegBinomialPdf(double x, double p, double r) {
   double k;
   if (!discrete::massPoint(x, &k)) return 0.0;
-  return negBinomialMass(k, p, r);
+  try {
+    return negBinomialMass(k, p, r);
+  } catch (const std::runtime_error&) {
+    // ln G(k) beyond the double range (k near DBL_MAX): no answer.
+    return mGetMissingValueCode();
+  }
 }
 
 double mNegBinomialCdf(double x, double p, double r, bool upperTail) {
-  const double k = discrete::cdfPoint(x);
+  const double k = upperTail ? discrete::upperPoint(x) : discrete::cdfPoint(x);
   if (!upperTail) {
     if (k < r) return 0.0;
     if (isGeometric(r)) return oneMinusComplementPower(p, k);
@@ -101,9 +133,10 @@ double mNegBinomialInvCdf(double p, double prob, double r) {
       return mGetMissingValueCode();
     }
     if (isGeometric(r)) {
-      double k = std::ceil(std::fabs(mLog(1.0 - p, true) / mLog(1.0 - prob, true)));
-      while (k > 1.0 && mNegBinomialCdf(k - 1.0, prob, r, false) >= p) k -= 1.0;
-      return k;
+      // The closed form ln(1 - p)/ln(1 - prob), checked by the bounded
+      // search (a unit walk from it would never end past 2^53).
+      const double k = std::ceil(std::log1p(-p) / std::log1p(-prob));
+      return smallestCountReaching(p, prob, r, std::max(r, std::isfinite(k) ? k : r));
     }
     // Cornish-Fisher start: mean r/prob, standard deviation sqrt(r(1-prob))/prob,
     // skewness correction (z^2 - 1)(2 - prob)/6 on the scale of prob.
@@ -112,30 +145,7 @@ double mNegBinomialInvCdf(double p, double prob, double r) {
     double start = std::ceil(
         (r + z * mSqrt(r * (1.0 - prob), true) + (z * z - 1.0) * (2.0 - prob) / 6.0) / prob + 0.5);
     if (start < r) start = r;
-    CmNegBinomialCdf f(prob, r, p, false);
-    f.mIntegerValued = true;
-    // The lower end r has F(r) = prob^r < p; widen the upper end by a quarter
-    // of its distance from r until F reaches p there.
-    double x1 = start, x2 = start;
-    double f2 = f(x2);
-    while (f2 < 0.0) {
-      x1 = x2;
-      x2 += std::ceil((x2 - r) / 4.0) + 1.0;
-      f2 = f(x2);
-      if (mIsNumericMissing(f2)) return f2;
-    }
-    if (x1 == x2) {
-      // The start already lies at or above the quantile: widen downwards.
-      double f1 = f(x1);
-      while (f1 >= 0.0 && x1 > r) {
-        x1 -= std::ceil((x1 - r) / 4.0);
-        if (x1 < r) x1 = r;
-        f1 = f(x1);
-        if (mIsNumericMissing(f1)) return f1;
-      }
-    }
-    int status = 0;
-    return mRootFinder(x1, x2, f, &status);
+    return smallestCountReaching(p, prob, r, start);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }

@@ -11,6 +11,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/pvalue.h"
+#include "utilities/distributions/standardize.h"
 #include "utilities/elv/normal_precise.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
@@ -57,7 +58,7 @@ double CmStandardNormalCdf::operator()(double x) {
 
 double mNormalPdf(double x, double mean, double sigma) {
   try {
-    const double z = (x - mean) / sigma;
+    const double z = mStandardize(x, mean, sigma);
     return mExponential(-z * z / 2.0, true) / (std::sqrt(mGetPi() + mGetPi()) * sigma);
   } catch (const std::runtime_error&) {
     return 0.0;
@@ -76,7 +77,7 @@ bool mNormalCdf(double x, double mean, double sigma, double* lower, double* uppe
   if (elv::elvPrecision() == elv::ElvPrecision::Full) {
     // Both tails straight from the double-precision tail, which also serves
     // the tails below the ELV routine's underflow limit.
-    const double z = (x - mean) / sigma;
+    const double z = mStandardize(x, mean, sigma);
     if (std::isnan(z)) {
       *lower = *upper = mGetMissingValueCode();
       return false;
@@ -86,7 +87,7 @@ bool mNormalCdf(double x, double mean, double sigma, double* lower, double* uppe
     *(z >= 0.0 ? lower : upper) = 1.0 - small;
     return true;
   }
-  if (ElvFailed(elv_normal_df((x - mean) / sigma, lower, upper))) {
+  if (ElvFailed(elv_normal_df(mStandardize(x, mean, sigma), lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
     return false;
   }

@@ -20,14 +20,22 @@ namespace qel {
 double mPoissonPdf(double x, double mean) {
   double k;
   if (!discrete::massPoint(x, &k) || k < 0.0) return 0.0;
-  return saddle::poissonMass(k, mean);
+  try {
+    return saddle::poissonMass(k, mean);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  } catch (const std::invalid_argument&) {
+    return mGetMissingValueCode();
+  }
 }
 
 // The upper tail P(X >= k) is P(X > k - 1).
 double mPoissonCdf(double x, double mean, bool upperTail) {
-  double k = discrete::cdfPoint(x);
-  if (upperTail) k -= 1.0;
+  const double k = upperTail ? discrete::upperPoint(x) - 1.0 : discrete::cdfPoint(x);
   if (k < 0.0) return upperTail ? 1.0 : 0.0;
+  // 2(k + 1) degrees of freedom beyond the double range: the count lies far
+  // above any finite mean's bulk (Chebyshev: mean + sqrt(mean) 1e150).
+  if (k > 1e300 && k > 2.0 * mean) return upperTail ? 0.0 : 1.0;
   double chiLower = 0.0, chiUpper = 1.0;
   if (mean > 0.0 &&
       ElvFailed(elv_chi2_ncdf(2.0 * mean, 2.0 * (k + 1.0), 0.0, &chiLower, &chiUpper))) {

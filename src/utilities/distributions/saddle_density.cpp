@@ -2,7 +2,9 @@
 // saddle_density.h.
 #include "utilities/distributions/saddle_density.h"
 
+#include <cfloat>
 #include <cmath>
+#include <stdexcept>
 
 namespace qel {
 namespace saddle {
@@ -47,6 +49,29 @@ const double kStirlingTable[31] = {
     5.5547335519628014e-3,
 };
 
+// glibc's libm is declared noexcept: a trap raised inside log or exp in an
+// armed thread cannot unwind and ends the process. These refuse the
+// arguments that would trap with an exception the kernels catch instead.
+double checkedLog(double v) {
+  if (!(v > 0.0)) throw std::invalid_argument("logarithm of a value that is not positive");
+  return std::log(v);
+}
+
+constexpr double kLargestExpArgument = 709.78;
+
+double checkedExp(double y) {
+  if (std::isnan(y)) throw std::invalid_argument("exponential of NaN");
+  if (y > kLargestExpArgument) throw std::overflow_error("exponential beyond the double range");
+  return std::exp(y);
+}
+
+// ln(x/m) for positive x and m, without forming a ratio beyond the double
+// range (ln x - ln m there, where no digits are lost to cancellation).
+double logRatio(double x, double m) {
+  const double lx = checkedLog(x), lm = checkedLog(m);
+  return std::fabs(lx - lm) < 700.0 ? std::log(x / m) : lx - lm;
+}
+
 }  // namespace
 
 double stirlerr(double n) {
@@ -55,7 +80,7 @@ double stirlerr(double n) {
     if (twice == std::floor(twice)) return kStirlingTable[static_cast<int>(twice)];
     // Off the table: ln Gamma of at most ln Gamma(16) = 27.9 costs a few
     // units of 1e-15 absolute, a relative error of the density of the same.
-    return std::lgamma(n + 1.0) - (n + 0.5) * std::log(n) + n - kLnSqrt2Pi;
+    return std::lgamma(n + 1.0) - (n + 0.5) * checkedLog(n) + n - kLnSqrt2Pi;
   }
   // Stirling's series: 1/12, 1/360, 1/1260, 1/1680, 1/1188 over odd powers.
   const double s0 = 1.0 / 12, s1 = 1.0 / 360, s2 = 1.0 / 1260, s3 = 1.0 / 1680, s4 = 1.0 / 1188;
@@ -85,14 +110,17 @@ double bd0(double x, double m) {
     return s;
   }
   if (x == 0.0) return m;
-  return x * std::log(x / m) + m - x;
+  const double lr = logRatio(x, m);
+  // A deviance beyond the double range: the mass is 0 to double precision.
+  if (lr > 0.0 && x > DBL_MAX / lr) return HUGE_VAL;
+  return x * lr + m - x;
 }
 
 double poissonMass(double x, double m) {
   if (m == 0.0) return x == 0.0 ? 1.0 : 0.0;
   if (x < 0.0) return 0.0;
-  if (x == 0.0) return std::exp(-m);
-  return std::exp(-stirlerr(x) - bd0(x, m)) / std::sqrt(k2Pi * x);
+  if (x == 0.0) return checkedExp(-m);
+  return checkedExp(-stirlerr(x) - bd0(x, m)) / std::sqrt(k2Pi * x);
 }
 
 double binomialMass(double x, double n, double p, double q) {
@@ -101,11 +129,11 @@ double binomialMass(double x, double n, double p, double q) {
   if (x < 0.0 || x > n) return 0.0;
   if (x == 0.0) {
     if (n == 0.0) return 1.0;
-    return std::exp(p < 0.1 ? -bd0(n, n * q) - n * p : n * std::log(q));
+    return checkedExp(p < 0.1 ? -bd0(n, n * q) - n * p : n * checkedLog(q));
   }
-  if (x == n) return std::exp(q < 0.1 ? -bd0(n, n * p) - n * q : n * std::log(p));
+  if (x == n) return checkedExp(q < 0.1 ? -bd0(n, n * p) - n * q : n * checkedLog(p));
   const double lc = stirlerr(n) - stirlerr(x) - stirlerr(n - x) - bd0(x, n * p) - bd0(n - x, n * q);
-  return std::exp(lc) * std::sqrt(n / (k2Pi * x * (n - x)));
+  return checkedExp(lc) * std::sqrt(n / (k2Pi * x * (n - x)));
 }
 
 // x^(a-1) e^-x / Gamma(a): a Poisson mass of mean x at a - 1.
@@ -144,9 +172,9 @@ double tDensity(double x, double n) {
   const double u = (n + 1.0) / 2.0, v = n / 2.0;
   const double r = std::fabs(x) / std::sqrt(n);
   // ln(1 + r^2), without forming r^2 where it would overflow.
-  const double lg = r > 1e100 ? 2.0 * std::log(r) : std::log1p(r * r);
+  const double lg = r > 1e100 ? 2.0 * checkedLog(r) : std::log1p(r * r);
   const double exponent = stirlerr(u) - stirlerr(v) - bd0(v, u) - u * lg;
-  return std::exp(exponent - kLnSqrt2Pi);
+  return checkedExp(exponent - kLnSqrt2Pi);
 }
 
 double hypergeometricMass(double k, double N, double M, double n) {

@@ -1,4 +1,8 @@
 // Triangular distribution on [lower, upper] with its peak at mode.
+//
+// Products of two distances (up to 1e308 each) would overflow; every form
+// below divides a distance by a larger one first, so that wide triangles
+// answer as narrow ones do.
 #include <cmath>
 
 #include "utilities/distributions/kernels.h"
@@ -8,9 +12,9 @@ namespace qel {
 
 double mTriangularPdf(double x, double lower, double mode, double upper) {
   if (x > upper || x < lower) return 0.0;
-  if (x > mode) return 2.0 * (upper - x) / ((upper - lower) * (upper - mode));
+  if (x > mode) return 2.0 * ((upper - x) / (upper - mode)) / (upper - lower);
   if (x == mode) return 2.0 / (upper - lower);
-  return 2.0 * (x - lower) / ((upper - lower) * (mode - lower));
+  return 2.0 * ((x - lower) / (mode - lower)) / (upper - lower);
 }
 
 // The tail on the far side of the mode is 1 - a^2/(b c) with a, b, c the
@@ -24,13 +28,13 @@ double mTriangularCdf(double x, double lower, double mode, double upper, bool up
   if (x <= mode) {
     const double a = x - lower;
     const double b = mode - lower;
-    if (!upperTail) return a * a / (width * b);
-    return ((mode - x) * width + a * (upper - x)) / (width * b);
+    if (!upperTail) return (a / width) * (a / b);
+    return (mode - x) / b + (a / b) * ((upper - x) / width);
   }
   const double a = upper - x;
   const double b = upper - mode;
-  if (upperTail) return a * a / (width * b);
-  return ((x - mode) * width + a * (x - lower)) / (width * b);
+  if (upperTail) return (a / width) * (a / b);
+  return (x - mode) / b + (a / b) * ((x - lower) / width);
 }
 
 double mTriangularInvCdf(double p, double lower, double mode, double upper) {
@@ -40,8 +44,10 @@ double mTriangularInvCdf(double p, double lower, double mode, double upper) {
   // A probability outside [0, 1] meets the square root of a negative number:
   // the checked root reports it as std::invalid_argument, as a trapped invalid
   // operation would.
-  if (p >= atMode) return upper - mSqrt((1.0 - p) * width * (upper - mode), true);
-  return lower + mSqrt(p * width * (mode - lower), true);
+  if (p >= atMode) {
+    return upper - mSqrt(1.0 - p, true) * mSqrt(width, true) * mSqrt(upper - mode, true);
+  }
+  return lower + mSqrt(p, true) * mSqrt(width, true) * mSqrt(mode - lower, true);
 }
 
 }  // namespace qel

@@ -15,6 +15,7 @@
 
 #include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -209,7 +210,7 @@ int beta_newton(double* x, char mode, double target, double a, double b) {
   for (int steps = 1; steps <= kNewtonSteps; ++steps) {
     double lower = 0.0, upper = 0.0, density = 0.0;
     beta_df(point, a, b, &lower, &upper, &density);
-    if (ELVerrno > 1 || !(density > 0.0)) {
+    if (qel::elv::threadStatus() > 1 || !(density > 0.0)) {
       ELVsteps1 = steps;
       ELVexit(name, 4, 'F');
       return 4;
@@ -284,7 +285,7 @@ int beta_quant(double* lower, double* upper, double p, double a, double b) {
   *lower = outcome.lower;
   *upper = outcome.upper;
   ELVmethod = method;
-  ELVerrno = outcome.code;
+  qel::elv::storeStatus(outcome.code);
   return outcome.code;
 }
 

@@ -5,13 +5,14 @@
 #include <climits>
 
 #include "utilities/elv/wrappers.h"
+#include "utilities/elv/thread_status.h"
 
 namespace qel {
 
 namespace {
 
 ElvStatus status() {
-  return static_cast<ElvStatus>(ELVerrno);
+  return static_cast<ElvStatus>(qel::elv::threadStatus());
 }
 
 // Counts beyond the signed range are refused by the routines themselves.

@@ -15,6 +15,7 @@
 
 #include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -76,7 +77,7 @@ int upperQuantile(long n, double p, double prob, long* k, double* f) {
   }
   double lower, upper, mass;
   binomial_df(start, n, prob, &lower, &upper, &mass);
-  if (ELVerrno >= 2) return 4;
+  if (qel::elv::threadStatus() >= 2) return 4;
   double r = p - upper;
   if (r < 0.0) return 4;  // the start lies below the quantile
   const double q = 1.0 - prob;
@@ -109,10 +110,10 @@ int lowerQuantile(long n, double p, double prob, long* k, double* f) {
   double below = 0.0, mass, lower, upper;
   if (j == 0) {
     binomial_df(0, n, prob, &lower, &upper, &mass);
-    if (ELVerrno >= 2) return 4;
+    if (qel::elv::threadStatus() >= 2) return 4;
   } else {
     binomial_df(j - 1, n, prob, &below, &upper, &mass);
-    if (ELVerrno >= 2) return 4;
+    if (qel::elv::threadStatus() >= 2) return 4;
     mass *= (n - j + 1.0) / j * (prob / q);
   }
   double r = p - below;

@@ -5,6 +5,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -28,7 +29,7 @@ void chi2_df(double x, double df, double* lower, double* upper, double* density)
   double gammaDensity = 0.0;
   gamma_df(x / 2.0, df / 2.0, lower, upper, &gammaDensity);
   // gamma_df leaves the density unwritten at 0 and on failure.
-  if (ELVerrno < 2 && ELVmethod != 1) *density = 0.5 * gammaDensity;
+  if (qel::elv::threadStatus() < 2 && ELVmethod != 1) *density = 0.5 * gammaDensity;
   ELVexit(name, 0, 'N');
 }
 
@@ -57,7 +58,7 @@ void chi2_upper_quant(double p, double df, double* q) {
     return;
   }
   gamma_upper_quant(p, df / 2.0, q);
-  if (ELVerrno < 2) *q *= 2.0;
+  if (qel::elv::threadStatus() < 2) *q *= 2.0;
   ELVexit(name, 0, 'N');
 }
 
@@ -70,7 +71,7 @@ void chi2_lower_quant(double p, double df, double* q) {
     return;
   }
   gamma_lower_quant(p, df / 2.0, q);
-  if (ELVerrno < 2) *q *= 2.0;
+  if (qel::elv::threadStatus() < 2) *q *= 2.0;
   ELVexit(name, 0, 'N');
 }
 

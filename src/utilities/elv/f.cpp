@@ -9,6 +9,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -98,7 +99,7 @@ void F_upper_quant(double p, double df1, double df2, double* q) {
     return;
   }
   *q = (d / (c * y)) * w;
-  ELVexit(name, ELVerrno, 'F');
+  ELVexit(name, qel::elv::threadStatus(), 'F');
 }
 
 // Point q with P(F <= q) = p: c q/(d + c q) is the lower p-quantile y of the
@@ -119,7 +120,7 @@ void F_lower_quant(double p, double df1, double df2, double* q) {
     return;
   }
   *q = (d / (c * w)) * y;
-  ELVexit(name, ELVerrno, 'F');
+  ELVexit(name, qel::elv::threadStatus(), 'F');
 }
 
 }  // extern "C"

@@ -10,6 +10,8 @@
 #include <cstdio>
 #include <cstring>
 
+#include "utilities/elv/thread_status.h"
+
 extern "C" {
 
 int ELVerrno = 0;
@@ -32,6 +34,9 @@ const char* const ELVerrlist[5] = {
 
 namespace {
 
+// The calling thread's code: ELVerrno's twin that no other thread writes.
+thread_local int threadErrno = 0;
+
 void storeRoutineName(const char* name) {
   if (name == nullptr) {
     ELVroutine[0] = '\0';
@@ -47,11 +52,13 @@ extern "C" {
 
 void ELVstartup(const char* name) {
   ELVerrno = 0;
+  threadErrno = 0;
   storeRoutineName(name);
 }
 
 void ELVexit(const char* name, int code, char mode) {
-  if (mode == 'F' || code > ELVerrno) {
+  if (mode == 'F' || code > threadErrno) {
+    threadErrno = code;
     ELVerrno = code;
     storeRoutineName(name);
   }
@@ -72,3 +79,18 @@ void ELVperror(const char* prefix) {
 }
 
 }  // extern "C"
+
+namespace qel {
+namespace elv {
+
+int threadStatus() {
+  return threadErrno;
+}
+
+void storeStatus(int code) {
+  threadErrno = code;
+  ELVerrno = code;
+}
+
+}  // namespace elv
+}  // namespace qel

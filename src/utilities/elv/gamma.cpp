@@ -18,6 +18,7 @@
 
 #include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -269,7 +270,7 @@ int gamma_newton(double* x, char mode, double target, double a) {
     *x += step;
     double lower, upper, density = 0.0;
     gamma_df(*x, a, &lower, &upper, &density);
-    if (ELVerrno >= 2 || !(density > 0.0)) {
+    if (qel::elv::threadStatus() >= 2 || !(density > 0.0)) {
       ELVexit(name, 4, 'F');
       return 4;
     }

@@ -15,6 +15,7 @@
 
 #include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -280,17 +281,17 @@ void hypergeo_lower_quant(unsigned long N, unsigned long M, unsigned long n, uns
   // unsampled count are hypergeometric too).
   if (M > N - M && n <= N - n) {
     hypergeo_upper_quant(N, N - M, n, k, f, p);
-    if (ELVerrno < 2) *k = n - *k;
+    if (qel::elv::threadStatus() < 2) *k = n - *k;
     return;
   }
   if (M > N - M) {
     hypergeo_lower_quant(N, N - M, N - n, k, f, p);
-    if (ELVerrno < 2) *k = M - N + n + *k;
+    if (qel::elv::threadStatus() < 2) *k = M - N + n + *k;
     return;
   }
   if (n > N - n) {
     hypergeo_upper_quant(N, M, N - n, k, f, p);
-    if (ELVerrno < 2) *k = M - *k;
+    if (qel::elv::threadStatus() < 2) *k = M - *k;
     return;
   }
   const QuantileStart start = quantileStart(N, M, n, p);
@@ -307,7 +308,7 @@ void hypergeo_lower_quant(unsigned long N, unsigned long M, unsigned long n, uns
     sum = lower;
     mass *= upRatio(kk, dN, dM, dn);
   }
-  if (ELVerrno >= 2) return quantileFailed(name);
+  if (qel::elv::threadStatus() >= 2) return quantileFailed(name);
   double remainder = p - sum;
   if (remainder < 0.0) return quantileFailed(name);
   int steps = 0;
@@ -336,17 +337,17 @@ void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned long n, uns
   }
   if (M > N - M && n <= N - n) {
     hypergeo_lower_quant(N, N - M, n, k, f, p);
-    if (ELVerrno < 2) *k = n - *k;
+    if (qel::elv::threadStatus() < 2) *k = n - *k;
     return;
   }
   if (M > N - M) {
     hypergeo_upper_quant(N, N - M, N - n, k, f, p);
-    if (ELVerrno < 2) *k = M - N + n + *k;
+    if (qel::elv::threadStatus() < 2) *k = M - N + n + *k;
     return;
   }
   if (n > N - n) {
     hypergeo_lower_quant(N, M, N - n, k, f, p);
-    if (ELVerrno < 2) *k = M - *k;
+    if (qel::elv::threadStatus() < 2) *k = M - *k;
     return;
   }
   const QuantileStart start = quantileStart(N, M, n, p);
@@ -360,7 +361,7 @@ void hypergeo_upper_quant(unsigned long N, unsigned long M, unsigned long n, uns
     kk = std::min(top, 3.0);
   double lower = 0.0, upper = 0.0, mass = 0.0;
   hypergeo_df(static_cast<unsigned long>(kk), N, M, n, &lower, &upper, &mass);
-  if (ELVerrno >= 2) return quantileFailed(name);
+  if (qel::elv::threadStatus() >= 2) return quantileFailed(name);
   double remainder = p - upper;
   if (remainder < 0.0) return quantileFailed(name);
   int steps = 0;

@@ -7,6 +7,7 @@
 
 #include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
+#include "utilities/elv/thread_status.h"
 
 namespace qel {
 namespace elv {
@@ -58,7 +59,7 @@ long descendingMixtureStart(double L) {
   double f = 0.0;
   ELVstartup("poisson_upper_quant");
   poissonUpperQuantile(&k, &f, mixtureStop(), L);
-  return ELVerrno >= 2 ? -1 : k;
+  return qel::elv::threadStatus() >= 2 ? -1 : k;
 }
 
 long ascendingMixtureStart(double L) {
@@ -66,7 +67,7 @@ long ascendingMixtureStart(double L) {
   double f = 0.0;
   ELVstartup("poisson_lower_quant");
   poissonLowerQuantile(&k, &f, mixtureStop(), L);
-  return ELVerrno >= 2 ? -1 : k;
+  return qel::elv::threadStatus() >= 2 ? -1 : k;
 }
 
 MixtureResult descendingMixtureSum(const MixtureComponents& components, long k,

@@ -11,6 +11,7 @@
 #include "utilities/elv/limits.h"
 #include "utilities/elv/normal_precise.h"
 #include "utilities/elv/precision.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -58,7 +59,7 @@ void normal_df(double x, double* lower, double* upper) {
     *lower = 0.5 * erfcByGamma(-x / kSqrt2);
     *upper = 1.0 - *lower;
   }
-  if (ELVerrno >= 2) *lower = *upper = -kHuge;
+  if (qel::elv::threadStatus() >= 2) *lower = *upper = -kHuge;
   ELVexit("normal_df", 0, 'N');
 }
 
@@ -71,7 +72,7 @@ void inv_normal_df(double p, double* z) {
   }
   if (p < 0.5) {
     normal_upper_quant(p, z);
-    if (ELVerrno < 2) *z = -*z;
+    if (qel::elv::threadStatus() < 2) *z = -*z;
   } else {
     // p = 1 gives 1 - p = 0, which the upper quantile refuses with code 2.
     normal_upper_quant(1.0 - p, z);

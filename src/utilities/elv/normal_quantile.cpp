@@ -11,6 +11,7 @@
 #include "utilities/elv/limits.h"
 #include "utilities/elv/normal_precise.h"
 #include "utilities/elv/precision.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -85,7 +86,7 @@ void normal_lower_quant(double p, double* z) {
   }
   ELVstartup("normal_upper_quant");
   upperNormalQuantile(p, z);
-  if (ELVerrno < 2) *z = -*z;
+  if (qel::elv::threadStatus() < 2) *z = -*z;
 }
 
 }  // extern "C"

@@ -12,6 +12,7 @@
 #include "utilities/elv/limits.h"
 #include "utilities/elv/mixture.h"
 #include "utilities/elv/precision.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -210,7 +211,7 @@ void poissonUpperQuantile(long* k, double* f, double p, double m) {
   double lower, upper, mass;
   poisson_df(j, m, &lower, &upper, &mass);
   double r = p - upper;
-  if (ELVerrno >= 2 || r < 0.0) {
+  if (qel::elv::threadStatus() >= 2 || r < 0.0) {
     ELVexit(name, 4, 'F');
     return;
   }
@@ -249,7 +250,7 @@ void poissonLowerQuantile(long* k, double* f, double p, double m) {
     poisson_df(j - 1, m, &lower, &upper, &massBefore);
     mass = massBefore * m / j;
     r = p - lower;
-    if (ELVerrno >= 2 || r < 0.0) {
+    if (qel::elv::threadStatus() >= 2 || r < 0.0) {
       ELVexit(name, 4, 'F');
       return;
     }

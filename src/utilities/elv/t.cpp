@@ -8,6 +8,7 @@
 #include <cmath>
 
 #include "utilities/elv/limits.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -35,7 +36,7 @@ void upperTQuantile(double p, double df, double* q) {
   } else {
     beta_quant(&y, &w, 1.0 - v, 0.5, 0.5 * df);
   }
-  const int inner = ELVerrno;
+  const int inner = qel::elv::threadStatus();
   if (w == 0.0) {
     *q = -kHuge;
     ELVexit(name, 4, 'F');
@@ -80,7 +81,7 @@ void t_df(double t, double df, double* lower, double* upper) {
   } else {
     beta_df(df / (df + u), 0.5 * df, 0.5, &outside, &inside, &density);
   }
-  const int inner = ELVerrno;
+  const int inner = qel::elv::threadStatus();
   if (inner >= 2) {
     ELVexit(name, inner, 'F');
     return;
@@ -115,7 +116,7 @@ void t_lower_quant(double p, double df, double* q) {
   }
   ELVstartup("t_upper_qt");
   upperTQuantile(p, df, q);
-  if (ELVerrno < 2) *q = -*q;
+  if (qel::elv::threadStatus() < 2) *q = -*q;
 }
 
 }  // extern "C"

@@ -23,6 +23,7 @@
 #include "utilities/elv/limits.h"
 #include "utilities/elv/mixture.h"
 #include "utilities/elv/t_internal.h"
+#include "utilities/elv/thread_status.h"
 
 namespace {
 
@@ -200,8 +201,8 @@ Tails core(double t, double df, double delta, double saddle) {
     beta_ncdf2(y, b, 0.5, L, &betaUpper, &betaLower);
     base = 1000;
   }
-  out.code = std::max(out.code, ELVerrno);
-  if (ELVerrno >= 2) return out;
+  out.code = std::max(out.code, qel::elv::threadStatus());
+  if (qel::elv::threadStatus() >= 2) return out;
   const double A = 0.5 * betaLower, B = 0.5 * betaUpper;
   ELVmethod = base;
   const bool xForm = df >= u;
@@ -358,7 +359,7 @@ void t_ncdf(double t, double df, double delta, double* lower, double* upper) {
   if (delta == 0.0) {
     t_df(t, df, lower, upper);
     ELVmethod = 0;
-    const int code = ELVerrno;
+    const int code = qel::elv::threadStatus();
     ELVexit(kName, code, 'F');
     return;
   }

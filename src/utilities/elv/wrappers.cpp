@@ -1,5 +1,6 @@
 // Forwarding wrappers around the ELV routines (see wrappers.h).
 #include "utilities/elv/wrappers.h"
+#include "utilities/elv/thread_status.h"
 
 #include <qel/elv.h>
 
@@ -10,7 +11,7 @@ namespace qel {
 namespace {
 
 ElvStatus status() {
-  return static_cast<ElvStatus>(ELVerrno);
+  return static_cast<ElvStatus>(qel::elv::threadStatus());
 }
 
 // A count beyond the range of the routines' signed index is refused by the

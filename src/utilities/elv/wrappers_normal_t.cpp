@@ -3,13 +3,14 @@
 #include <qel/elv.h>
 
 #include "utilities/elv/wrappers.h"
+#include "utilities/elv/thread_status.h"
 
 namespace qel {
 
 namespace {
 
 ElvStatus currentStatus() {
-  return static_cast<ElvStatus>(ELVerrno);
+  return static_cast<ElvStatus>(qel::elv::threadStatus());
 }
 
 }  // namespace
