@@ -46,6 +46,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printQuadUsage(out);
   qelcalc::printSintUsage(out);
   qelcalc::printRangeUsage(out);
+  qelcalc::printTukeyUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -81,6 +82,7 @@ int main(int argc, char** argv) {
     if (mode == "quad") return qelcalc::runQuadMode(argc, argv, std::cout);
     if (mode == "sint") return qelcalc::runSintMode(argc, argv, std::cout);
     if (mode == "range") return qelcalc::runRangeMode(argc, argv, std::cout);
+    if (mode == "tukey") return qelcalc::runTukeyMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";
