@@ -7,7 +7,8 @@
 //   P(Q > q) = int g(t) U(q e^t) dt,   U = 1 - W_k, the normal range upper tail
 // computed in its own right by mNormalRangeCdf. Below the point a where
 // W_k(q e^a) <= k (q e^a phi(0))^(k-1) < 1e-13, U is 1 to that accuracy and the
-// piece is the chi-square lower tail P(chi2_df < df e^(2a)). Above a the
+// piece is the chi-square lower tail P(chi2_df < df e^(2a)); a is raised to
+// where that piece is below 1e-16 of a lower bound of the answer. Above a the
 // integral is taken by 16-point Gauss-Legendre panels whose width follows the
 // local scales of g (1/sqrt(df)) and of U (2/r^2 at r = q e^t), until a
 // log-concavity bound on the rest falls below 1e-17 of the sum. Against
@@ -69,7 +70,15 @@ class OuterIntegrand : public CmRealFunction {
 double upperTail(double q, int k, double df) {
   const LogChi g(df);
   // Where the normal range cdf is below 1e-13 (W_k(r) <= k (r phi(0))^(k-1)).
-  const double a = std::log(std::pow(1e-13 / k, 1.0 / (k - 1)) / (q * kPhi0));
+  double a = std::log(std::pow(1e-13 / k, 1.0 / (k - 1)) / (q * kPhi0));
+  // The tail is at least L = U(q) P(s <= 1); below the chi-square quantile
+  // at 1e-16 L lies less mass of s than 1e-16 of the answer, so the panels
+  // start there when it lies above a.
+  const double lowerBound = mNormalRangeCdf(q, k, true) * mChiSqCdf(df, df, 0.0, false);
+  if (lowerBound > 1e-290) {
+    const double x = mChiSqInvCdf(1e-16 * lowerBound, df, 0.0);
+    if (!mIsNumericMissing(x) && x > 0.0) a = std::max(a, 0.5 * std::log(x / df));
+  }
   const double e2a = std::exp(std::max(2.0 * a, -700.0));
   double sum = mChiSqCdf(df * e2a, df, 0.0, false);
   OuterIntegrand f(g, q, k);
