@@ -331,6 +331,15 @@ QEL_API bool IsStudentizedMaximumModulusPossible(int k, double df, double alpha)
 QEL_API double GetStudentizedRangeCritValue(double alpha, int k, double df);
 QEL_API double GetStudentizedRangePValue(double q, int k, double df);
 
+namespace v0 {
+
+// The range of k independent standard normal variables: P(R <= r) or, with
+// upperTail, P(R > r), each tail to full relative precision; and the r with
+// P(R <= r) = p. Armed frame; NaN for k < 2, NaN arguments or p outside [0, 1).
+QEL_API double NormalRangeCdf(double r, int k, bool upperTail);
+QEL_API double NormalRangeInvCdf(double p, int k);
+
+}  // namespace v0
 }  // namespace qel
 
 #endif

@@ -10,6 +10,7 @@
 #include "reference_data.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/normal_range.h"
 #include "utilities/distributions/studentized_range.h"
 
 namespace {
@@ -101,6 +102,13 @@ TEST(StudentizedRange, BadInputAndState) {
   }
   EXPECT_EQ(qel::GetStudentizedRangePValue(0.0, 3, 10.0), 1.0);
   EXPECT_EQ(qel::GetStudentizedRangePValue(INFINITY, 3, 10.0), 0.0);
+  EXPECT_EQ(fegetexcept(), 0);
+  // The exported normal range: NaN where the kernel has no answer.
+  EXPECT_TRUE(std::isnan(qel::v0::NormalRangeCdf(1.0, 1, false)) &&
+              std::isnan(qel::v0::NormalRangeCdf(nan, 3, true)) &&
+              std::isnan(qel::v0::NormalRangeInvCdf(1.0, 3)));
+  EXPECT_EQ(qel::v0::NormalRangeCdf(2.0, 4, true), qel::mNormalRangeCdf(2.0, 4, true));
+  EXPECT_EQ(qel::v0::NormalRangeInvCdf(0.95, 4), qel::mNormalRangeInvCdf(0.95, 4));
   EXPECT_EQ(fegetexcept(), 0);
 }
 

@@ -1,7 +1,10 @@
 // Exported studentized range functions: the armed frame around the kernels,
-// with the missing value passed back as it is.
+// with the missing value passed back as it is; the normal range in the armed
+// frame with NaN for the missing value.
+#include "interfaces/math/frames.h"
 #include "qel/distributions.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/normal_range.h"
 #include "utilities/distributions/studentized_range.h"
 #include "utilities/elv/limits.h"
 
@@ -40,4 +43,15 @@ double GetStudentizedRangePValue(double q, int k, double df) {
   return armedBare(mStudentizedRangePValue, q, k, df);
 }
 
+namespace v0 {
+
+double NormalRangeCdf(double r, int k, bool upperTail) {
+  return frame::armed(mNormalRangeCdf, r, k, upperTail);
+}
+
+double NormalRangeInvCdf(double p, int k) {
+  return frame::armed(mNormalRangeInvCdf, p, k);
+}
+
+}  // namespace v0
 }  // namespace qel
