@@ -347,3 +347,10 @@ run(0 "^cdf 2\\.08848758376254[0-9]*e-45\n$" range cdf 20 --k 2 --upper)
 run(0 "^inv 3\\.314493[0-9]*\n$" range inv 0.95 --k 3)
 run(2 "^$" range cdf 1 --k 1)
 run(2 "^$" range inv 0.95 --k 3 --upper)
+
+# tukey: the published 5 percent point 3.88 (k = 3, df = 10); R's
+# ptukey(3.5, 4, 20, lower.tail = FALSE) = 0.0949584505485567.
+run(0 "^crit 3\\.8(8|79999)[0-9]*\npossible true\n$" tukey crit 0.05 --k 3 --df 10)
+run(0 "^pvalue 0\\.09495845054[0-9]*\npossible true\n$" tukey pvalue 3.5 --k 4 --df 20)
+run(2 "^$" tukey crit 0.05 --k 3)
+run(2 "^$" tukey crit 1.5 --k 3 --df 10)
