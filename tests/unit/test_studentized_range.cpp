@@ -102,6 +102,11 @@ TEST(StudentizedRange, BadInputAndState) {
   }
   EXPECT_EQ(qel::GetStudentizedRangePValue(0.0, 3, 10.0), 1.0);
   EXPECT_EQ(qel::GetStudentizedRangePValue(INFINITY, 3, 10.0), 0.0);
+  // Far range, df = 1 (s = |Z|): P(Q > q) -> E[R_3] 2 phi(0) / q, E[R_3] = 3/sqrt(pi).
+  EXPECT_LE(relativeError(qel::GetStudentizedRangePValue(1e12, 3, 1.0),
+                          3.0 / std::sqrt(M_PI) * std::sqrt(2.0 / M_PI) / 1e12),
+            1e-9);
+  EXPECT_EQ(qel::mNormalRangeCdf(1e12, 3, true), 0.0);
   EXPECT_EQ(fegetexcept(), 0);
   // The exported normal range: NaN where the kernel has no answer.
   EXPECT_TRUE(std::isnan(qel::v0::NormalRangeCdf(1.0, 1, false)) &&

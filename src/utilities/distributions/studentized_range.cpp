@@ -79,8 +79,11 @@ double upperTail(double q, int k, double df) {
     const double x = mChiSqInvCdf(1e-16 * lowerBound, df, 0.0);
     if (!mIsNumericMissing(x) && x > 0.0) a = std::max(a, 0.5 * std::log(x / df));
   }
-  const double e2a = std::exp(std::max(2.0 * a, -700.0));
-  double sum = mChiSqCdf(df * e2a, df, 0.0, false);
+  // P(chi2_df < x); below x = e^-600 its leading term (x/2)^(df/2) / Gamma(df/2 + 1).
+  const double logX = std::log(df) + 2.0 * a;
+  double sum = logX < -600.0
+                   ? safeExp(0.5 * df * (logX - std::log(2.0)) - mLogGamma(0.5 * df + 1.0))
+                   : mChiSqCdf(std::exp(logX), df, 0.0, false);
   OuterIntegrand f(g, q, k);
   const double sqrtDf = std::sqrt(df);
   double t = a;
