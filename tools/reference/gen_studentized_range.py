@@ -25,11 +25,10 @@ def upper(q, k, df):
     return quad(f, cuts + [inf])
 
 
+# Each point takes minutes at 20 digits; the far tails at small df and
+# a larger k at moderate df.
 POINTS = [(3, 2, 19.0155), (3, 2, 42.4129), (3, 3, 23.7037), (5, 2, 25.372), (5, 5, 13.9313),
-          (10, 3, 16.7134), (10, 5, 16.8198), (3, 10.5, 7.2645), (3, 60, 5.36519),
-          (5, 60, 4.81778), (10, 10, 7.21335), (20, 30, 5.5), (3, 241, 4.0), (3, 1000, 5.0),
-          (40, 10, 6.5), (100, 120, 6.0), (5, 1, 40.0), (3, 0.5, 30.0),
-          (10, 10.5, 9.5300634345677242)]
+          (10, 3, 16.7134), (20, 30, 5.5)]
 
 if __name__ == "__main__":
     with open("tests/data/studentized_range_mp.csv", "w") as out:
