@@ -424,3 +424,10 @@ run(2 "^$" describe --file ${WORK}/qelcalc_empty.txt)
 run(2 "^$" normal cdf --file ${WORK}/qelcalc_empty.txt)
 file(WRITE ${WORK}/qelcalc_huge.txt "1e999\n")
 run(2 "^$" describe --file ${WORK}/qelcalc_huge.txt)
+
+# tukey: the published 5 percent point 3.88 (k = 3, df = 10); R's
+# ptukey(3.5, 4, 20, lower.tail = FALSE) = 0.0949584505485567.
+run(0 "^crit 3\\.8(8|79999)[0-9]*\npossible true\n$" tukey crit 0.05 --k 3 --df 10)
+run(0 "^pvalue 0\\.09495845054[0-9]*\npossible true\n$" tukey pvalue 3.5 --k 4 --df 20)
+run(2 "^$" tukey crit 0.05 --k 3)
+run(2 "^$" tukey crit 1.5 --k 3 --df 10)

@@ -52,6 +52,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printSortUsage(out);
   qelcalc::printGroupUsage(out);
   qelcalc::printRanksUsage(out);
+  qelcalc::printTukeyUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -90,6 +91,7 @@ int main(int argc, char** argv) {
     if (mode == "sort") return qelcalc::runSortMode(argc, argv, std::cout);
     if (mode == "group") return qelcalc::runGroupMode(argc, argv, std::cout);
     if (mode == "ranks") return qelcalc::runRanksMode(argc, argv, std::cout);
+    if (mode == "tukey") return qelcalc::runTukeyMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

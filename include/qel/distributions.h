@@ -329,6 +329,26 @@ QEL_API double TPValue(double t, double df, EAlternative alternative);
 QEL_API double TCritValue(double alpha, double df, EAlternative alternative, int k);
 QEL_API double TSidakCritValue(double alpha, double df, EAlternative alternative, int k);
 
+// Studentized range (Tukey). The Is...Possible rules mark where critical
+// values are trusted and are asked first. The P-value and critical value run
+// in the armed frame and return the missing value itself (not NaN) for bad
+// arguments (k < 2, df <= 0, alpha outside (0, 1), NaN). Critical values are
+// rounded to two decimals except for k = 2.
+QEL_API bool IsStudentizedRangePossible(int k, double df, double alpha);
+QEL_API bool IsStudentizedMaximumPossible(int k, double df, double alpha);
+QEL_API bool IsStudentizedMaximumModulusPossible(int k, double df, double alpha);
+QEL_API double GetStudentizedRangeCritValue(double alpha, int k, double df);
+QEL_API double GetStudentizedRangePValue(double q, int k, double df);
+
+namespace v0 {
+
+// The range of k independent standard normal variables: P(R <= r) or, with
+// upperTail, P(R > r), each tail to full relative precision; and the r with
+// P(R <= r) = p. Armed frame; NaN for k < 2, NaN arguments or p outside [0, 1).
+QEL_API double NormalRangeCdf(double r, int k, bool upperTail);
+QEL_API double NormalRangeInvCdf(double p, int k);
+
+}  // namespace v0
 }  // namespace qel
 
 #endif

@@ -95,6 +95,10 @@ double mNormalRangeCdf(double r, int k, bool upperTail) {
   if (std::isinf(r)) return upperTail ? 0.0 : 1.0;
   // k = 2: R = sqrt(2) |Z|.
   if (k == 2) return upperTail ? std::erfc(0.5 * r) : std::erf(0.5 * r);
+  // P(R > r) <= C(k, 2) P(|Z1 - Z2| > r) = C(k, 2) erfc(r/2): once that bound
+  // underflows the tails are 0 and 1 (and the panels, which reach down to
+  // -r/2, are not walked).
+  if (0.5 * k * (k - 1.0) * std::erfc(0.5 * r) == 0.0) return upperTail ? 0.0 : 1.0;
   const double p = integrate(k, r, upperTail);
   return std::max(0.0, std::min(1.0, p));
 }

@@ -1,0 +1,120 @@
+// The studentized range against mpmath double integrals
+// (tools/reference/gen_studentized_range.py) and R's ptukey
+// (tools/reference/studentized_range_r.R), its table, rules and edges.
+#include <gtest/gtest.h>
+
+#include <cfenv>
+#include <cmath>
+
+#include "qel/distributions.h"
+#include "reference_data.h"
+#include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/kernels.h"
+#include "utilities/distributions/normal_range.h"
+#include "utilities/distributions/studentized_range.h"
+
+namespace {
+
+using qeltest::relativeError;
+
+TEST(StudentizedRange, UpperTailMatchesMpmath) {
+  const auto rows = qeltest::loadReferenceData("studentized_range_mp.csv", 0);
+  ASSERT_EQ(rows.size(), 7u);
+  for (const auto& row : rows) {
+    const auto& v = row.numbers;
+    EXPECT_LE(relativeError(qel::mStudentizedRangePValue(v[2], int(v[0]), v[1]), v[3]), 1e-7)
+        << row.line;
+  }
+}
+
+// R's ptukey holds about 1e-8 from df = 10 on down to P = 0.01 (in the far
+// tail at df = 2 to 5 it is off by up to a factor of 3 against mpmath and
+// the exact k = 2 law, so those rows are not compared).
+TEST(StudentizedRange, UpperTailMatchesPtukey) {
+  for (const auto& row : qeltest::loadReferenceData("studentized_range_r.csv", 0)) {
+    const auto& v = row.numbers;
+    const int k = int(v[0]);
+    if ((k != 3 && k != 10) || (v[1] != 10.5 && v[1] != 60 && v[1] != 241)) continue;
+    const double tol = v[3] < 0.005 ? 1e-6 : 1e-8;
+    EXPECT_LE(relativeError(qel::mStudentizedRangePValue(v[2], k, v[1]), v[3]), tol) << row.line;
+  }
+}
+
+TEST(StudentizedRange, CriticalValues) {
+  // k = 2: sqrt(2) times the t quantile, unrounded.
+  EXPECT_LE(relativeError(qel::mStudentizedRangeCritValue(0.05, 2, 10.0),
+                          std::sqrt(2.0) * qel::mTInvCdf(0.975, 10.0, 0.0)),
+            1e-14);
+  // The table: the published 5 percent points (Harter 1960) at its corners.
+  const double table[][3] = {{1, 3, 26.98}, {1, 10, 49.07}, {10, 3, 3.88}, {60, 10, 4.65}};
+  for (const auto& t : table) {
+    double q = 0;
+    EXPECT_TRUE(qel::mTukeyTable(t[0], int(t[1]), 0.05, &q));
+    EXPECT_EQ(q, t[2]);
+    EXPECT_EQ(qel::GetStudentizedRangeCritValue(0.05, int(t[1]), t[0]), t[2]);
+  }
+  double q = 0;
+  EXPECT_FALSE(qel::mTukeyTable(10.5, 3, 0.05, &q) || qel::mTukeyTable(61, 3, 0.05, &q) ||
+               qel::mTukeyTable(10, 11, 0.05, &q) || qel::mTukeyTable(10, 3, 0.05 + 1e-11, &q));
+  // The search: the root of the R reference tail, rounded to two decimals
+  // (rows away from a rounding border).
+  for (const auto& row : qeltest::loadReferenceData("studentized_range_r.csv", 0)) {
+    const auto& v = row.numbers;
+    const int k = int(v[0]);
+    if (k != 5 || v[1] != 10.5 || v[3] > 0.05 || v[3] < 0.01) continue;
+    const double scaled = 100 * v[2];
+    if (std::fabs(scaled - std::floor(scaled) - 0.5) < 0.02) continue;
+    EXPECT_EQ(qel::mStudentizedRangeCritValue(v[3], k, v[1]), std::round(scaled) / 100) << row.line;
+  }
+}
+
+TEST(StudentizedRange, PossibleRules) {
+  EXPECT_TRUE(qel::IsStudentizedRangePossible(2, 1.0, 0.001));
+  EXPECT_TRUE(qel::IsStudentizedRangePossible(3, 2.0, 0.05));
+  EXPECT_FALSE(qel::IsStudentizedRangePossible(3, 2.0, 0.01));
+  EXPECT_FALSE(qel::IsStudentizedRangePossible(41, 20.0, 0.005));
+  EXPECT_FALSE(qel::IsStudentizedRangePossible(11, 2.0, 0.05));
+  EXPECT_FALSE(qel::IsStudentizedRangePossible(40, 5.0, 0.05));
+  EXPECT_TRUE(qel::IsStudentizedRangePossible(40, 5.5, 0.05));
+  EXPECT_TRUE(qel::IsStudentizedRangePossible(14, 10.0, 0.005));
+  EXPECT_FALSE(qel::IsStudentizedRangePossible(15, 10.0, 0.005));
+  EXPECT_TRUE(qel::IsStudentizedRangePossible(40, 11.0, 0.005));
+  EXPECT_FALSE(qel::IsStudentizedRangePossible(41, 11.0, 0.0099));
+  EXPECT_TRUE(qel::IsStudentizedRangePossible(41, 11.0, 0.01));
+  EXPECT_TRUE(qel::IsStudentizedMaximumPossible(1, 1.0, 0.001));
+  EXPECT_FALSE(qel::IsStudentizedMaximumPossible(3, 2.0, 0.05));
+  EXPECT_FALSE(qel::IsStudentizedMaximumModulusPossible(40, 5.0, 0.05));
+  EXPECT_FALSE(qel::IsStudentizedMaximumModulusPossible(20, 10.0, 0.001));
+  EXPECT_TRUE(qel::IsStudentizedMaximumModulusPossible(20, 10.0, 0.01));
+}
+
+TEST(StudentizedRange, BadInputAndState) {
+  const double missing = qel::mGetMissingValueCode();
+  const double nan = std::nan("");
+  const double bad[][3] = {
+      {3.0, 1, 10.0}, {3.0, 3, 0.0}, {3.0, 3, -1.0}, {nan, 3, 10.0}, {3.0, 3, nan}};
+  for (const auto& b : bad) {
+    EXPECT_EQ(qel::GetStudentizedRangePValue(b[0], int(b[1]), b[2]), missing);
+    EXPECT_EQ(fegetexcept(), 0);
+  }
+  for (double alpha : {0.0, 1.0, -0.5, nan}) {
+    EXPECT_EQ(qel::GetStudentizedRangeCritValue(alpha, 3, 10.0), missing);
+  }
+  EXPECT_EQ(qel::GetStudentizedRangePValue(0.0, 3, 10.0), 1.0);
+  EXPECT_EQ(qel::GetStudentizedRangePValue(INFINITY, 3, 10.0), 0.0);
+  // Far range, df = 1 (s = |Z|): P(Q > q) -> E[R_3] 2 phi(0) / q, E[R_3] = 3/sqrt(pi).
+  EXPECT_LE(relativeError(qel::GetStudentizedRangePValue(1e12, 3, 1.0),
+                          3.0 / std::sqrt(M_PI) * std::sqrt(2.0 / M_PI) / 1e12),
+            1e-9);
+  EXPECT_EQ(qel::mNormalRangeCdf(1e12, 3, true), 0.0);
+  EXPECT_EQ(fegetexcept(), 0);
+  // The exported normal range: NaN where the kernel has no answer.
+  EXPECT_TRUE(std::isnan(qel::v0::NormalRangeCdf(1.0, 1, false)) &&
+              std::isnan(qel::v0::NormalRangeCdf(nan, 3, true)) &&
+              std::isnan(qel::v0::NormalRangeInvCdf(1.0, 3)));
+  EXPECT_EQ(qel::v0::NormalRangeCdf(2.0, 4, true), qel::mNormalRangeCdf(2.0, 4, true));
+  EXPECT_EQ(qel::v0::NormalRangeInvCdf(0.95, 4), qel::mNormalRangeInvCdf(0.95, 4));
+  EXPECT_EQ(fegetexcept(), 0);
+}
+
+}  // namespace
