@@ -160,7 +160,8 @@ CmCmndPowerFactorial::CmCmndPowerFactorial()
       mCenterPointsInModel(false),
       mBlocksInModel(false),
       mPlackettBurman(false),
-      mStorageCPBlock(nullptr) {}
+      mStorageCPBlock(nullptr),
+      mUnusedBool(false) {}
 
 CmCmndPowerFactorial::~CmCmndPowerFactorial() = default;
 
@@ -312,6 +313,23 @@ void CmCmndPowerFactorial::mStoreRow(int row, int r, double effect, double power
   const double total = static_cast<double>(std::max(cp, 0)) * mBlockCt +
                        static_cast<double>(std::max(r, 0)) * mRunsPerRep;
   mResultTotalRuns.push_back(total < 2147483647.0 ? static_cast<int>(total) : -1);
+  const EErrorType kind = mGetErrorType(r, cp, effect, power);
+  mErrorTypes.push_back(kind);
+  if (kind == eNoErrorDF) mNoErrorDFRows.push_back(row);
+  if (kind == eTargetNotReached) mNotReachedRows.push_back(row);
+  if (kind == eTooManyRuns) mTooManyRunsRows.push_back(row);
+}
+
+EErrorType CmCmndPowerFactorial::mGetErrorType(int r, int cp, double effect, double power) const {
+  if (r == kNotReached || cp == kNotReached) return eTargetNotReached;
+  if (isNumber(effect) && isNumber(power)) return eNoError;
+  if (r < 1 || cp < 0) return eNotComputable;
+  // The error df, as the F test of mFactorialCalcOnePower counts them.
+  const int cpDf = mGetDFCenterPoint(cp, false);
+  if (!mIsReplicateBlockCombinationAllowed(r, mBlockCt, cpDf)) return eTooManyRuns;
+  const double df = static_cast<double>(mRunsPerRep) * r - mGetUniqueCornerPointCt() + mOmitted +
+                    cpDf - mGetNonConfoundedDFBlock(r);
+  return df <= 0.0 ? eNoErrorDF : eNotComputable;
 }
 
 bool CmCmndPowerFactorial::mComputeAndStore() {

@@ -28,6 +28,16 @@ double mFactorialCalcOnePower(int r, int blocks, int uniqueCorners, int runsPerR
                               int cpDf, double level, double sigma, double effect,
                               bool blocksInModel);
 
+// Why a row of a factorial design holds a missing or marked result; the
+// host picks its message from it.
+enum EErrorType {
+  eNoError = 0,
+  eNoErrorDF,         // the design leaves no error degrees of freedom
+  eTargetNotReached,  // no replicate or center point count reaches the power
+  eTooManyRuns,       // the error df pass the limit of an accurate noncentral F
+  eNotComputable      // another missing input (e.g. sigma 0)
+};
+
 class CmCmndPowerFactorial : public CmCmndPower {
  public:
   CmCmndPowerFactorial();
@@ -73,6 +83,15 @@ class CmCmndPowerFactorial : public CmCmndPower {
   const std::vector<int>& mGetResultCenterPoints() const { return mResultCenterPoints; }
   const std::vector<int>& mGetResultTotalRuns() const { return mResultTotalRuns; }
   int mGetLengthOfTotalRunCt() const { return static_cast<int>(mResultTotalRuns.size()); }
+  // Per stored row, its error kind; and the row numbers (from 1) of the rows
+  // without error df, of those whose target is not reached, and of those
+  // past the df limit.
+  const std::vector<EErrorType>& mGetErrorTypes() const { return mErrorTypes; }
+  const std::vector<int>& mGetNoErrorDFRows() const { return mNoErrorDFRows; }
+  const std::vector<int>& mGetNotReachedRows() const { return mNotReachedRows; }
+  const std::vector<int>& mGetTooManyRunsRows() const { return mTooManyRunsRows; }
+  // The error kind of a row with r replicates and cp center points per block.
+  EErrorType mGetErrorType(int r, int cp, double effect, double power) const;
 
  protected:
   void mStoreRow(int row, int r, double effect, double power, int cp, double target);
@@ -92,6 +111,11 @@ class CmCmndPowerFactorial : public CmCmndPower {
   std::vector<double>* mStorageCPBlock;
   std::vector<int> mResultCenterPoints;
   std::vector<int> mResultTotalRuns;
+  std::vector<int> mNoErrorDFRows;
+  std::vector<int> mNotReachedRows;
+  std::vector<int> mTooManyRunsRows;
+  std::vector<EErrorType> mErrorTypes;
+  bool mUnusedBool;
 };
 
 // Power minus target of a factorial design; x is the effect, or with the

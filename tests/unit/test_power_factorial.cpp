@@ -167,3 +167,72 @@ TEST(OnewayPower, ModelDegreesOfFreedomAndBadLevels) {
 }
 
 }  // namespace
+
+namespace {
+
+TEST(FactorialPower, RowErrorKindsAndSuggestedExtents) {
+  // 2^3 with all seven effects in the model and no center points: one
+  // replicate leaves 8 - 8 = 0 error df (row 1), two leave 8 (row 2).
+  CmCmndPowerFactorial c;
+  design(c, {3, 8, 1, 0, 0, 0, 0, 0, 0, 1.0, 0.05});
+  c.mSetSampleSizes({1, 2});
+  c.mSetEffects({1.0});
+  c.mComputeAndStore();
+  ASSERT_EQ(c.mGetErrorTypes().size(), 2u);
+  EXPECT_EQ(c.mGetErrorTypes()[0], qel::eNoErrorDF);
+  EXPECT_EQ(c.mGetErrorTypes()[1], qel::eNoError);
+  EXPECT_EQ(c.mGetNoErrorDFRows(), std::vector<int>{1});
+  EXPECT_TRUE(c.mGetNotReachedRows().empty() && c.mGetTooManyRunsRows().empty());
+
+  // The smallest stored n is 1, where no effect is solvable (0 error df):
+  // d falls back to 6 sigma / 1 = 6, ends -6 and 6.
+  double lo = 0.0, hi = 0.0;
+  c.mGetSuggestedXMinXMax({}, &lo, &hi);
+  EXPECT_EQ(lo, -6.0);
+  EXPECT_EQ(hi, 6.0);
+  // With n = 2 stored the ends are -d, d, d the effect of power 0.99.
+  CmCmndPowerFactorial two;
+  design(two, {3, 8, 1, 0, 0, 0, 0, 0, 0, 1.0, 0.05});
+  two.mSetSampleSizes({2});
+  two.mSetEffects({1.0});
+  two.mComputeAndStore();
+  two.mGetSuggestedXMinXMax({}, &lo, &hi);
+  EXPECT_DOUBLE_EQ(lo, -hi);
+  EXPECT_NEAR(two.mPowerAt(2, 0, hi), 0.99, 1e-7);
+  // Data beyond the ends widen them by 1.5 percent of the width: from
+  // [-d, d] the lower end is -100 - 0.015 (2 d); the upper stays d, as
+  // 0 + 0.015 (d + 100 + 0.03 d) is below d for d above about 1.6.
+  const double d = hi;
+  two.mGetSuggestedXMinXMax({-100.0, 0.0}, &lo, &hi);
+  EXPECT_NEAR(lo, -100.0 - 0.03 * d, 1e-12);
+  EXPECT_EQ(hi, d);
+  // Sigma 0: d falls back to 6 sigma / n = 0, and equal ends open to
+  // [0, 0 + max(|0|, 1)] = [0, 1].
+  CmCmndPowerFactorial z;
+  design(z, {3, 8, 1, 0, 0, 0, 0, 0, 0, 0.0, 0.05});
+  z.mSetSampleSizes({2});
+  z.mGetSuggestedXMinXMax({}, &lo, &hi);
+  EXPECT_EQ(lo, 0.0);
+  EXPECT_EQ(hi, 1.0);
+}
+
+TEST(OnewayPower, SuggestedExtentsReachHighPower) {
+  // One factor with 3 levels, 4 replicates: ends 0 and the maximum
+  // difference d whose sum of squares d^2 / 2 gives the high power.
+  qel::CmCmndPowerGFF g;
+  g.mSetGroupCt(3);
+  g.mSetLevels({3});
+  g.mSetOrder(1);
+  g.mSetSigma(1.0);
+  g.mSetLevel(0.05);
+  g.mSetSampleSizes({4});
+  g.mSetEffects({0.5});
+  g.mComputeAndStore();
+  double lo = -1.0, hi = 0.0;
+  g.mGetSuggestedXMinXMax({}, &lo, &hi);
+  EXPECT_EQ(lo, 0.0);
+  ASSERT_GT(hi, 0.0);
+  EXPECT_NEAR(g.mPowerAt(4, hi * hi / 2.0), 0.99, 1e-7);
+}
+
+}  // namespace

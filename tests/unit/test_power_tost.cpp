@@ -2,6 +2,7 @@
 // sample-size solves: targets, mirrors, markers and warm-started lists.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <vector>
 
@@ -236,6 +237,30 @@ TEST(TOSTPower, ScaleEndsFollowTheAlternativeAndRatio) {
     else
       EXPECT_NEAR(high, 1.25, 1e-15);
   }
+}
+
+TEST(TOSTPower, SuggestedExtentsOneSidedEndAndData) {
+  // One-sided: both ends start at d, the difference of power 0.99 at the
+  // smallest n (15); equal ends then open to [d, d + max(|d|, 1)].
+  qel::CmCmndPowerTOST c;
+  c.mSetLimits(-1.0, 1.0);
+  c.mSetAlternative(static_cast<qel::EAlternative>(1));
+  c.mSetSampleSizes({15});
+  c.mSetPowers({0.8});
+  c.mComputeAndStore();
+  double lo = 0.0, hi = 0.0;
+  c.mGetSuggestedXMinXMax({}, &lo, &hi);
+  EXPECT_NEAR(c.mCalcTOSTPower(lo, 15), 0.99, 1e-7);
+  EXPECT_DOUBLE_EQ(hi, lo + std::max(std::fabs(lo), 1.0));
+  // Two-sided: the ends come from the data alone, missing values skipped:
+  // from [0, 0], lo = min(-0.5 - 0, 0) = -0.5 and
+  // hi = max(0.7 + 0.015 (0 - (-0.5)), 0) = 0.7075.
+  qel::CmCmndPowerTOST t;
+  t.mSetLimits(-1.0, 1.0);
+  lo = hi = 0.0;
+  t.mGetSuggestedXMinXMax({-0.5, qel::mGetMissingValueCode(), 0.7}, &lo, &hi);
+  EXPECT_EQ(lo, -0.5);
+  EXPECT_NEAR(hi, 0.7075, 1e-15);
 }
 
 }  // namespace
