@@ -323,6 +323,9 @@ void CmCmndPowerFactorial::mStoreRow(int row, int r, double effect, double power
 EErrorType CmCmndPowerFactorial::mGetErrorType(int r, int cp, double effect, double power) const {
   if (r == kNotReached || cp == kNotReached) return eTargetNotReached;
   if (isNumber(effect) && isNumber(power)) return eNoError;
+  // A replicate solve that finds no count reaching the target stores -1.
+  const bool solvable = isNumber(effect) && mSigma > 0.0 && mRunsPerRep >= 1;
+  if (r < 1 && !mSampleSizesGiven && solvable) return eTargetNotReached;
   if (r < 1 || cp < 0) return eNotComputable;
   // The error df, as the F test of mFactorialCalcOnePower counts them.
   const int cpDf = mGetDFCenterPoint(cp, false);

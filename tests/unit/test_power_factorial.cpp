@@ -183,6 +183,16 @@ TEST(FactorialPower, RowErrorKindsAndSuggestedExtents) {
   EXPECT_EQ(c.mGetErrorTypes()[1], qel::eNoError);
   EXPECT_EQ(c.mGetNoErrorDFRows(), std::vector<int>{1});
   EXPECT_TRUE(c.mGetNotReachedRows().empty() && c.mGetTooManyRunsRows().empty());
+  // Effect 0 never lifts the power above the level: the replicate solve
+  // reaches no target (row 1); sigma 0 computes nothing.
+  for (double sigma : {1.0, 0.0}) {
+    CmCmndPowerFactorial n;
+    design(n, {3, 8, 1, 0, 0, 0, 0, 0, 0, sigma, 0.05});
+    n.mSetEffects({0.0});
+    n.mSetPowers({0.8});
+    n.mComputeAndStore();
+    EXPECT_EQ(n.mGetErrorTypes().at(0), sigma > 0 ? qel::eTargetNotReached : qel::eNotComputable);
+  }
 
   // The smallest stored n is 1, where no effect is solvable (0 error df):
   // d falls back to 6 sigma / 1 = 6, ends -6 and 6.
