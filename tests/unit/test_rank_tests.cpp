@@ -30,9 +30,8 @@ Cases loadCases() {
 // All differences x[i] - y[j], sorted.
 std::vector<double> allDifferences(std::vector<double> const& x, std::vector<double> const& y) {
   std::vector<double> d;
-  for (double a : x) {
+  for (double a : x)
     for (double b : y) d.push_back(a - b);
-  }
   std::sort(d.begin(), d.end());
   return d;
 }
@@ -66,9 +65,7 @@ TEST(MannWhitney, MatchesR) {
     EXPECT_EQ(r.statistic, ref[3]) << name;
     const bool ties = ref[5] != 0.0;
     EXPECT_LT(qeltest::relativeError(ties ? r.adjustedPValue : r.pValue, ref[4]), 1e-9) << name;
-    if (!ties) {
-      EXPECT_EQ(r.adjustedPValue, -1.0) << name;
-    }
+    if (!ties) { EXPECT_EQ(r.adjustedPValue, -1.0) << name; }
     EXPECT_NEAR(r.estimate, ref[6], 1e-12) << name;
     EXPECT_NEAR(r.lowerLimit, ref[7], 1e-12) << name;
     EXPECT_NEAR(r.upperLimit, ref[8], 1e-12) << name;
@@ -90,10 +87,8 @@ TEST(MannWhitney, ShiftAndLimitsAgreeWithAllDifferences) {
   std::mt19937 rng(5);
   std::normal_distribution<double> normal;
   for (int trial = 0; trial < 40; ++trial) {
-    int n1 = 2 + int(rng() % 30);
-    int n2 = 2 + int(rng() % 30);
-    bool rounded = trial % 2 == 1;
-    std::vector<double> x(n1), y(n2);
+    const bool rounded = trial % 2 == 1;
+    std::vector<double> x(2 + rng() % 30), y(2 + rng() % 30);
     for (double& v : x) v = rounded ? std::round(2 * normal(rng)) : normal(rng) + 0.4;
     for (double& v : y) v = rounded ? std::round(2 * normal(rng)) : normal(rng);
     std::vector<double> d = allDifferences(x, y);
@@ -109,15 +104,11 @@ TEST(MannWhitney, ShiftAndLimitsAgreeWithAllDifferences) {
         std::count_if(d.begin(), d.end(), [&](double v) { return v < two.upperLimit - 1e-9; });
     auto lowerRank =
         std::count_if(d.begin(), d.end(), [&](double v) { return v <= two.lowerLimit + 1e-9; });
-    EXPECT_TRUE(std::binary_search(d.begin(), d.end(), two.lowerLimit) ||
-                std::any_of(d.begin(), d.end(),
+    EXPECT_TRUE(std::any_of(d.begin(), d.end(),
                             [&](double v) { return std::fabs(v - two.lowerLimit) < 1e-12; }));
-    EXPECT_LE(lowerRank, long(N));
     EXPECT_LE(two.lowerLimit, two.estimate);
     EXPECT_GE(two.upperLimit, two.estimate);
-    if (!rounded) {
-      EXPECT_EQ(std::size_t(lowerRank), N - std::size_t(upperRank)) << trial;
-    }
+    if (!rounded) { EXPECT_EQ(std::size_t(lowerRank), N - std::size_t(upperRank)) << trial; }
     // One-sided limits sit further in than the two-sided ones at the same
     // confidence and the other side is infinite.
     EXPECT_EQ(upper.lowerLimit, -INFINITY);
@@ -158,11 +149,6 @@ int runGroups(Record& r, std::vector<std::vector<double>> const& data, std::vect
   return run(&r);
 }
 
-int runKruskalWallis(qel::v0::KruskalWallis& r, std::vector<std::vector<double>> const& data,
-                     std::vector<qel::v0::KruskalWallisGroup>& groups) {
-  return runGroups(r, data, groups, qel::v0::RunLynKruskalWallis);
-}
-
 int runMood(qel::v0::Mood& r, std::vector<std::vector<double>> const& data,
             std::vector<qel::v0::MoodGroup>& groups) {
   return runGroups(r, data, groups, qel::v0::RunLynMood);
@@ -188,7 +174,7 @@ TEST(KruskalWallis, MatchesR) {
     std::vector<double> const& ref = rows.at("kw");
     qel::v0::KruskalWallis r;
     std::vector<qel::v0::KruskalWallisGroup> groups;
-    ASSERT_EQ(runKruskalWallis(r, data, groups), 0) << name;
+    ASSERT_EQ(runGroups(r, data, groups, qel::v0::RunLynKruskalWallis), 0) << name;
     const bool ties = ref[3] != 0.0;
     EXPECT_LT(qeltest::relativeError(ties ? r.adjustedStatistic : r.statistic, ref[0]), 1e-12)
         << name;
@@ -219,7 +205,7 @@ TEST(KruskalWallis, OneGroupHasNoDegreesOfFreedom) {
   std::vector<std::vector<double>> data{{3.0, 1.0, 2.0, 5.0}};
   qel::v0::KruskalWallis r;
   std::vector<qel::v0::KruskalWallisGroup> groups;
-  EXPECT_EQ(runKruskalWallis(r, data, groups), 0);
+  EXPECT_EQ(runGroups(r, data, groups, qel::v0::RunLynKruskalWallis), 0);
   EXPECT_EQ(r.degreesOfFreedom, 0.0);
   EXPECT_EQ(r.statistic, 0.0);
   EXPECT_EQ(groups[0].median, 2.5);
@@ -358,18 +344,16 @@ TEST(Friedman, AdditiveTableIsFittedExactly) {
   const std::vector<double> a{0.0, 1.5, -2.0, 4.0};
   const std::vector<double> c{10.0, 12.0, 7.0, 30.0, 8.0};  // median 10
   std::vector<std::vector<double>> columns(a.size());
-  for (std::size_t i = 0; i < a.size(); ++i) {
+  for (std::size_t i = 0; i < a.size(); ++i)
     for (double block : c) columns[i].push_back(a[i] + block);
-  }
   std::vector<std::vector<double>> original = columns;
   qel::v0::Friedman r;
   std::vector<qel::v0::FriedmanTreatment> treatments;
   ASSERT_EQ(runFriedman(r, columns, treatments), 0);
   for (std::size_t i = 0; i < a.size(); ++i) {
     EXPECT_NEAR(treatments[i].estimatedMedian, a[i] + 10.0, 1e-12) << i;
-    for (std::size_t t = 0; t < c.size(); ++t) {
+    for (std::size_t t = 0; t < c.size(); ++t)
       EXPECT_NEAR(columns[i][t], original[i][t], 1e-12) << i << " " << t;
-    }
   }
   // Every block ranks the treatments alike: S = b (k - 1), no ties.
   EXPECT_DOUBLE_EQ(r.statistic, 5.0 * 3.0);
