@@ -249,9 +249,7 @@ TEST(Grouping, MergeSortIsStableInBothDirections) {
       ASSERT_GE(k1[a], k1[b]) << n;
       if (k1[a] == k1[b] && !std::isnan(k2[a]) && !std::isnan(k2[b])) {
         ASSERT_LE(k2[a], k2[b]) << n;
-        if (k2[a] == k2[b]) {
-          ASSERT_LT(a, b) << n;
-        }
+        if (k2[a] == k2[b]) { ASSERT_LT(a, b) << n; }
       }
     }
     std::sort(index.begin(), index.end());
