@@ -41,6 +41,18 @@ double sortedMedian(std::vector<double> const& d) {
   return n % 2 ? d[n / 2] : 0.5 * (d[n / 2 - 1] + d[n / 2]);
 }
 
+// Runs `check` on every case holding the row `tag`, which must be `expected` cases.
+template <class Check>
+void forEachCase(const char* tag, int expected, Check check) {
+  int checked = 0;
+  for (auto const& [name, rows] : loadCases().byCase) {
+    if (!rows.count(tag)) continue;
+    check(name, rows, rows.at(tag));
+    ++checked;
+  }
+  EXPECT_EQ(checked, expected) << tag;
+}
+
 int runMannWhitney(qel::v0::MannWhitney& r, std::vector<double> const& x,
                    std::vector<double> const& y, double confidence, int type, int alternative) {
   r.firstN = static_cast<int>(x.size());
@@ -53,13 +65,10 @@ int runMannWhitney(qel::v0::MannWhitney& r, std::vector<double> const& x,
 }  // namespace
 
 TEST(MannWhitney, MatchesR) {
-  Cases cases = loadCases();
-  int checked = 0;
-  for (auto const& [name, rows] : cases.byCase) {
-    if (!rows.count("mw")) continue;
+  forEachCase("mw", 9, [](std::string const& name, auto const& rows,
+                           std::vector<double> const& ref) {
     std::vector<double> const& x = rows.at("mw_x");
     std::vector<double> const& y = rows.at("mw_y");
-    std::vector<double> const& ref = rows.at("mw");
     qel::v0::MannWhitney r;
     ASSERT_EQ(runMannWhitney(r, x, y, ref[1], int(ref[2]), int(ref[0])), 0) << name;
     EXPECT_EQ(r.statistic, ref[3]) << name;
@@ -75,9 +84,7 @@ TEST(MannWhitney, MatchesR) {
     EXPECT_DOUBLE_EQ(r.firstMedian, sortedMedian(sx)) << name;
     EXPECT_DOUBLE_EQ(r.secondMedian, sortedMedian(sy)) << name;
     EXPECT_GT(r.achievedConfidence, ref[1] - 0.02) << name;
-    ++checked;
-  }
-  EXPECT_EQ(checked, 9);
+  });
 }
 
 // Random sizes, with and without heavy ties, one- and two-sided: the shift
@@ -166,12 +173,9 @@ std::vector<std::vector<double>> numbered(std::map<std::string, std::vector<doub
 }  // namespace
 
 TEST(KruskalWallis, MatchesR) {
-  Cases cases = loadCases();
-  int checked = 0;
-  for (auto const& [name, rows] : cases.byCase) {
-    if (!rows.count("kw")) continue;
+  forEachCase("kw", 3, [](std::string const& name, auto const& rows,
+                           std::vector<double> const& ref) {
     std::vector<std::vector<double>> data = numbered(rows, "kw_g");
-    std::vector<double> const& ref = rows.at("kw");
     qel::v0::KruskalWallis r;
     std::vector<qel::v0::KruskalWallisGroup> groups;
     ASSERT_EQ(runGroups(r, data, groups, qel::v0::RunLynKruskalWallis), 0) << name;
@@ -196,9 +200,7 @@ TEST(KruskalWallis, MatchesR) {
       rankTotal += groups[g].meanRank * double(sorted.size());
     }
     EXPECT_NEAR(rankTotal, N * (N + 1) / 2, 1e-9) << name;
-    ++checked;
-  }
-  EXPECT_EQ(checked, 3);
+  });
 }
 
 TEST(KruskalWallis, OneGroupHasNoDegreesOfFreedom) {
@@ -213,12 +215,9 @@ TEST(KruskalWallis, OneGroupHasNoDegreesOfFreedom) {
 }
 
 TEST(Mood, MatchesR) {
-  Cases cases = loadCases();
-  int checked = 0;
-  for (auto const& [name, rows] : cases.byCase) {
-    if (!rows.count("md")) continue;
+  forEachCase("md", 3, [](std::string const& name, auto const& rows,
+                           std::vector<double> const& ref) {
     std::vector<std::vector<double>> data = numbered(rows, "md_g");
-    std::vector<double> const& ref = rows.at("md");
     qel::v0::Mood r;
     std::vector<qel::v0::MoodGroup> groups;
     ASSERT_EQ(runMood(r, data, groups), 0) << name;
@@ -242,9 +241,7 @@ TEST(Mood, MatchesR) {
     } else {
       EXPECT_TRUE(std::isnan(r.lowerLimit) && std::isnan(r.achievedConfidence)) << name;
     }
-    ++checked;
-  }
-  EXPECT_EQ(checked, 3);
+  });
 }
 
 // n = 5 cannot reach 95%: the whole range. A confidence equal to the
@@ -308,12 +305,9 @@ int runFriedman(qel::v0::Friedman& r, std::vector<std::vector<double>>& columns,
 }  // namespace
 
 TEST(Friedman, MatchesR) {
-  Cases cases = loadCases();
-  int checked = 0;
-  for (auto const& [name, rows] : cases.byCase) {
-    if (!rows.count("fr")) continue;
+  forEachCase("fr", 3, [](std::string const& name, auto const& rows,
+                           std::vector<double> const& ref) {
     std::vector<std::vector<double>> columns = numbered(rows, "fr_t");
-    std::vector<double> const& ref = rows.at("fr");
     qel::v0::Friedman r;
     std::vector<qel::v0::FriedmanTreatment> treatments;
     ASSERT_EQ(runFriedman(r, columns, treatments), 0) << name;
@@ -332,9 +326,7 @@ TEST(Friedman, MatchesR) {
     for (auto const& t : treatments) rankTotal += t.rankSum;
     const double k = double(columns.size()), b = double(columns[0].size());
     EXPECT_EQ(rankTotal, b * k * (k + 1) / 2) << name;
-    ++checked;
-  }
-  EXPECT_EQ(checked, 3);
+  });
 }
 
 // An exactly additive table x_i[t] = a_i + c_t: the effects recover a_i
