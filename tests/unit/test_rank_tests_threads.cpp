@@ -50,14 +50,21 @@ std::vector<std::vector<double>> makeGroups(int count, unsigned seed) {
   return groups;
 }
 
+// Group records lending the first `count` samples.
+template <class Group>
+std::vector<Group> lend(const std::vector<std::vector<double>>& data, std::size_t count) {
+  std::vector<Group> groups(count);
+  for (std::size_t g = 0; g < count; ++g) {
+    groups[g].data = data[g].data();
+    groups[g].n = static_cast<unsigned int>(data[g].size());
+  }
+  return groups;
+}
+
 TEST(RankTestThreads, KruskalWallisAgreesOnOneAndFourThreads) {
   const auto data = makeGroups(10, 11);
   const Fields one = expectSameOnOneAndFourThreads([&] {
-    std::vector<qel::v0::KruskalWallisGroup> groups(data.size());
-    for (std::size_t g = 0; g < data.size(); ++g) {
-      groups[g].data = data[g].data();
-      groups[g].n = static_cast<unsigned int>(data[g].size());
-    }
+    auto groups = lend<qel::v0::KruskalWallisGroup>(data, data.size());
     qel::v0::KruskalWallis r;
     r.groups = groups.data();
     r.groupCount = static_cast<unsigned int>(data.size());
@@ -75,11 +82,7 @@ TEST(RankTestThreads, MoodAgreesOnOneAndFourThreads) {
   const auto many = makeGroups(9, 23);
   for (std::size_t count : {many.size(), std::size_t{2}}) {
     const Fields one = expectSameOnOneAndFourThreads([&] {
-      std::vector<qel::v0::MoodGroup> groups(count);
-      for (std::size_t g = 0; g < count; ++g) {
-        groups[g].data = many[g].data();
-        groups[g].n = static_cast<unsigned int>(many[g].size());
-      }
+      auto groups = lend<qel::v0::MoodGroup>(many, count);
       qel::v0::Mood r;
       r.groups = groups.data();
       r.groupCount = static_cast<unsigned int>(count);
