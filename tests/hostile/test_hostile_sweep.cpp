@@ -124,13 +124,7 @@ void sweepPoint(Sweep& sweep, const Family& f, const Values& v) {
       [&] { f.cdfArray(out.data(), in, n, v, true); }, [&] { f.invArray(out.data(), in, n, v); }};
   for (int a = 0; a < 4; ++a) {
     const int before = sweep.exceptions;
-    sweep.run(
-        describe(f, "array", a, v),
-        [&] {
-          arrays[a]();
-          return 0.0;
-        },
-        0, 0, kSlowCall * n);
+    sweep.run(describe(f, "array", a, v), [&] { return arrays[a](), 0.0; }, 0, 0, kSlowCall * n);
     if (sweep.exceptions != before) continue;  // the array is partly written
     for (unsigned long i = 0; i < n; ++i) {
       const double s = scalar[a][i];

@@ -14,9 +14,7 @@ namespace {
 
 using qel::CmCmndPowerTOST;
 const double kMissing = qel::mGetMissingValueCode();
-bool missing(double x) {
-  return qel::mIsNumericMissing(x);
-}
+bool missing(double x) { return qel::mIsNumericMissing(x); }
 
 double power(const std::vector<double>& c) {
   return CmCmndPowerTOST::mTOSTPower(
@@ -200,42 +198,30 @@ TEST(TOSTPower, OneSidedSolvesReachTarget) {
     c.mSetSampleSizes({15});
     c.mSetPowers({0.8});
     c.mComputeAndStore();
-    const double d = c.mGetResultEffects()[0];
+    const double d = c.mGetResultEffects()[0], e = alt > 0 ? -0.4 : 0.4;
     EXPECT_NEAR(c.mCalcTOSTPower(d, 15), 0.8, 1e-7) << alt;
     EXPECT_TRUE(alt > 0 ? d > -1.0 : d < 1.0);
-
     CmCmndPowerTOST s;
     s.mSetLimits(-1.0, 1.0);
     s.mSetAlternative(static_cast<qel::EAlternative>(alt));
-    s.mSetEffects({alt > 0 ? -0.4 : 0.4});
+    s.mSetEffects({e});
     s.mSetPowers({0.8});
     s.mComputeAndStore();
     const int n = s.mGetResultSampleSizes()[0];
-    EXPECT_GE(s.mCalcTOSTPower(alt > 0 ? -0.4 : 0.4, n), 0.8);
-    EXPECT_LT(s.mCalcTOSTPower(alt > 0 ? -0.4 : 0.4, n - 1), 0.8);
+    EXPECT_GE(s.mCalcTOSTPower(e, n), 0.8);
+    EXPECT_LT(s.mCalcTOSTPower(e, n - 1), 0.8);
   }
 }
 
-}  // namespace
-
-namespace {
-
 TEST(TOSTPower, ScaleEndsFollowTheAlternativeAndRatio) {
   for (int alt : {-1, 0, 1}) {
-    qel::CmCmndPowerTOST c;
-    c.mSetRatio(true);
-    c.mSetLimits(0.8, 1.25);
+    CmCmndPowerTOST c;
+    setUp(c, 0.8, 1.25, true);
     c.mSetAlternative(static_cast<qel::EAlternative>(alt));
     double low = 0.0, high = 0.0;
     c.mGetScaleMinMax(nullptr, nullptr, low, high);
-    if (alt < 0)
-      EXPECT_TRUE(qel::mIsNumericMissing(low));
-    else
-      EXPECT_NEAR(low, 0.8, 1e-15);
-    if (alt > 0)
-      EXPECT_TRUE(qel::mIsNumericMissing(high));
-    else
-      EXPECT_NEAR(high, 1.25, 1e-15);
+    EXPECT_TRUE(alt < 0 ? missing(low) : std::fabs(low - 0.8) < 1e-15) << alt;
+    EXPECT_TRUE(alt > 0 ? missing(high) : std::fabs(high - 1.25) < 1e-15) << alt;
   }
 }
 

@@ -30,16 +30,28 @@ Cases loadCases() {
 // All differences x[i] - y[j], sorted.
 std::vector<double> allDifferences(std::vector<double> const& x, std::vector<double> const& y) {
   std::vector<double> d;
-  for (double a : x) {
+  for (double a : x)
     for (double b : y) d.push_back(a - b);
-  }
   std::sort(d.begin(), d.end());
   return d;
 }
 
-double sortedMedian(std::vector<double> const& d) {
+double median(std::vector<double> d) {
+  std::sort(d.begin(), d.end());
   std::size_t n = d.size();
   return n % 2 ? d[n / 2] : 0.5 * (d[n / 2 - 1] + d[n / 2]);
+}
+
+// Runs `check` on every case holding the row `tag`, which must be `expected` cases.
+template <class Check>
+void forEachCase(const char* tag, int expected, Check check) {
+  int checked = 0;
+  for (auto const& [name, rows] : loadCases().byCase) {
+    if (!rows.count(tag)) continue;
+    check(name, rows, rows.at(tag));
+    ++checked;
+  }
+  EXPECT_EQ(checked, expected) << tag;
 }
 
 int runMannWhitney(qel::v0::MannWhitney& r, std::vector<double> const& x,
@@ -54,33 +66,23 @@ int runMannWhitney(qel::v0::MannWhitney& r, std::vector<double> const& x,
 }  // namespace
 
 TEST(MannWhitney, MatchesR) {
-  Cases cases = loadCases();
-  int checked = 0;
-  for (auto const& [name, rows] : cases.byCase) {
-    if (!rows.count("mw")) continue;
+  forEachCase("mw", 9, [](std::string const& name, auto const& rows,
+                           std::vector<double> const& ref) {
     std::vector<double> const& x = rows.at("mw_x");
     std::vector<double> const& y = rows.at("mw_y");
-    std::vector<double> const& ref = rows.at("mw");
     qel::v0::MannWhitney r;
     ASSERT_EQ(runMannWhitney(r, x, y, ref[1], int(ref[2]), int(ref[0])), 0) << name;
     EXPECT_EQ(r.statistic, ref[3]) << name;
     const bool ties = ref[5] != 0.0;
     EXPECT_LT(qeltest::relativeError(ties ? r.adjustedPValue : r.pValue, ref[4]), 1e-9) << name;
-    if (!ties) {
-      EXPECT_EQ(r.adjustedPValue, -1.0) << name;
-    }
+    if (!ties) { EXPECT_EQ(r.adjustedPValue, -1.0) << name; }
     EXPECT_NEAR(r.estimate, ref[6], 1e-12) << name;
     EXPECT_NEAR(r.lowerLimit, ref[7], 1e-12) << name;
     EXPECT_NEAR(r.upperLimit, ref[8], 1e-12) << name;
-    std::vector<double> sx = x, sy = y;
-    std::sort(sx.begin(), sx.end());
-    std::sort(sy.begin(), sy.end());
-    EXPECT_DOUBLE_EQ(r.firstMedian, sortedMedian(sx)) << name;
-    EXPECT_DOUBLE_EQ(r.secondMedian, sortedMedian(sy)) << name;
+    EXPECT_DOUBLE_EQ(r.firstMedian, median(x)) << name;
+    EXPECT_DOUBLE_EQ(r.secondMedian, median(y)) << name;
     EXPECT_GT(r.achievedConfidence, ref[1] - 0.02) << name;
-    ++checked;
-  }
-  EXPECT_EQ(checked, 9);
+  });
 }
 
 // Random sizes, with and without heavy ties, one- and two-sided: the shift
@@ -90,10 +92,8 @@ TEST(MannWhitney, ShiftAndLimitsAgreeWithAllDifferences) {
   std::mt19937 rng(5);
   std::normal_distribution<double> normal;
   for (int trial = 0; trial < 40; ++trial) {
-    int n1 = 2 + int(rng() % 30);
-    int n2 = 2 + int(rng() % 30);
-    bool rounded = trial % 2 == 1;
-    std::vector<double> x(n1), y(n2);
+    const bool rounded = trial % 2 == 1;
+    std::vector<double> x(2 + rng() % 30), y(2 + rng() % 30);
     for (double& v : x) v = rounded ? std::round(2 * normal(rng)) : normal(rng) + 0.4;
     for (double& v : y) v = rounded ? std::round(2 * normal(rng)) : normal(rng);
     std::vector<double> d = allDifferences(x, y);
@@ -102,22 +102,18 @@ TEST(MannWhitney, ShiftAndLimitsAgreeWithAllDifferences) {
     if (runMannWhitney(two, x, y, 0.9, 0, 0) != 0) continue;  // a constant rounded sample
     ASSERT_EQ(runMannWhitney(upper, x, y, 0.9, -1, 0), 0);
     ASSERT_EQ(runMannWhitney(lower, x, y, 0.9, 1, 0), 0);
-    EXPECT_NEAR(two.estimate, sortedMedian(d), 1e-12) << trial;
+    EXPECT_NEAR(two.estimate, median(d), 1e-12) << trial;
     EXPECT_EQ(two.estimate, upper.estimate);
     // The two-sided limits are symmetric in rank.
     auto upperRank =
         std::count_if(d.begin(), d.end(), [&](double v) { return v < two.upperLimit - 1e-9; });
     auto lowerRank =
         std::count_if(d.begin(), d.end(), [&](double v) { return v <= two.lowerLimit + 1e-9; });
-    EXPECT_TRUE(std::binary_search(d.begin(), d.end(), two.lowerLimit) ||
-                std::any_of(d.begin(), d.end(),
+    EXPECT_TRUE(std::any_of(d.begin(), d.end(),
                             [&](double v) { return std::fabs(v - two.lowerLimit) < 1e-12; }));
-    EXPECT_LE(lowerRank, long(N));
     EXPECT_LE(two.lowerLimit, two.estimate);
     EXPECT_GE(two.upperLimit, two.estimate);
-    if (!rounded) {
-      EXPECT_EQ(std::size_t(lowerRank), N - std::size_t(upperRank)) << trial;
-    }
+    if (!rounded) { EXPECT_EQ(std::size_t(lowerRank), N - std::size_t(upperRank)) << trial; }
     // One-sided limits sit further in than the two-sided ones at the same
     // confidence and the other side is infinite.
     EXPECT_EQ(upper.lowerLimit, -INFINITY);
@@ -158,11 +154,6 @@ int runGroups(Record& r, std::vector<std::vector<double>> const& data, std::vect
   return run(&r);
 }
 
-int runKruskalWallis(qel::v0::KruskalWallis& r, std::vector<std::vector<double>> const& data,
-                     std::vector<qel::v0::KruskalWallisGroup>& groups) {
-  return runGroups(r, data, groups, qel::v0::RunLynKruskalWallis);
-}
-
 int runMood(qel::v0::Mood& r, std::vector<std::vector<double>> const& data,
             std::vector<qel::v0::MoodGroup>& groups) {
   return runGroups(r, data, groups, qel::v0::RunLynMood);
@@ -180,15 +171,12 @@ std::vector<std::vector<double>> numbered(std::map<std::string, std::vector<doub
 }  // namespace
 
 TEST(KruskalWallis, MatchesR) {
-  Cases cases = loadCases();
-  int checked = 0;
-  for (auto const& [name, rows] : cases.byCase) {
-    if (!rows.count("kw")) continue;
+  forEachCase("kw", 3, [](std::string const& name, auto const& rows,
+                           std::vector<double> const& ref) {
     std::vector<std::vector<double>> data = numbered(rows, "kw_g");
-    std::vector<double> const& ref = rows.at("kw");
     qel::v0::KruskalWallis r;
     std::vector<qel::v0::KruskalWallisGroup> groups;
-    ASSERT_EQ(runKruskalWallis(r, data, groups), 0) << name;
+    ASSERT_EQ(runGroups(r, data, groups, qel::v0::RunLynKruskalWallis), 0) << name;
     const bool ties = ref[3] != 0.0;
     EXPECT_LT(qeltest::relativeError(ties ? r.adjustedStatistic : r.statistic, ref[0]), 1e-12)
         << name;
@@ -203,23 +191,19 @@ TEST(KruskalWallis, MatchesR) {
     // The mean ranks average to (N + 1) / 2; the medians are those of the data.
     double N = 0.0, rankTotal = 0.0;
     for (std::size_t g = 0; g < data.size(); ++g) {
-      std::vector<double> sorted = data[g];
-      std::sort(sorted.begin(), sorted.end());
-      EXPECT_EQ(groups[g].median, sortedMedian(sorted)) << name << " group " << g;
-      N += double(sorted.size());
-      rankTotal += groups[g].meanRank * double(sorted.size());
+      EXPECT_EQ(groups[g].median, median(data[g])) << name << " group " << g;
+      N += double(data[g].size());
+      rankTotal += groups[g].meanRank * double(data[g].size());
     }
     EXPECT_NEAR(rankTotal, N * (N + 1) / 2, 1e-9) << name;
-    ++checked;
-  }
-  EXPECT_EQ(checked, 3);
+  });
 }
 
 TEST(KruskalWallis, OneGroupHasNoDegreesOfFreedom) {
   std::vector<std::vector<double>> data{{3.0, 1.0, 2.0, 5.0}};
   qel::v0::KruskalWallis r;
   std::vector<qel::v0::KruskalWallisGroup> groups;
-  EXPECT_EQ(runKruskalWallis(r, data, groups), 0);
+  EXPECT_EQ(runGroups(r, data, groups, qel::v0::RunLynKruskalWallis), 0);
   EXPECT_EQ(r.degreesOfFreedom, 0.0);
   EXPECT_EQ(r.statistic, 0.0);
   EXPECT_EQ(groups[0].median, 2.5);
@@ -227,12 +211,9 @@ TEST(KruskalWallis, OneGroupHasNoDegreesOfFreedom) {
 }
 
 TEST(Mood, MatchesR) {
-  Cases cases = loadCases();
-  int checked = 0;
-  for (auto const& [name, rows] : cases.byCase) {
-    if (!rows.count("md")) continue;
+  forEachCase("md", 3, [](std::string const& name, auto const& rows,
+                           std::vector<double> const& ref) {
     std::vector<std::vector<double>> data = numbered(rows, "md_g");
-    std::vector<double> const& ref = rows.at("md");
     qel::v0::Mood r;
     std::vector<qel::v0::MoodGroup> groups;
     ASSERT_EQ(runMood(r, data, groups), 0) << name;
@@ -256,9 +237,7 @@ TEST(Mood, MatchesR) {
     } else {
       EXPECT_TRUE(std::isnan(r.lowerLimit) && std::isnan(r.achievedConfidence)) << name;
     }
-    ++checked;
-  }
-  EXPECT_EQ(checked, 3);
+  });
 }
 
 // n = 5 cannot reach 95%: the whole range. A confidence equal to the
@@ -322,12 +301,9 @@ int runFriedman(qel::v0::Friedman& r, std::vector<std::vector<double>>& columns,
 }  // namespace
 
 TEST(Friedman, MatchesR) {
-  Cases cases = loadCases();
-  int checked = 0;
-  for (auto const& [name, rows] : cases.byCase) {
-    if (!rows.count("fr")) continue;
+  forEachCase("fr", 3, [](std::string const& name, auto const& rows,
+                           std::vector<double> const& ref) {
     std::vector<std::vector<double>> columns = numbered(rows, "fr_t");
-    std::vector<double> const& ref = rows.at("fr");
     qel::v0::Friedman r;
     std::vector<qel::v0::FriedmanTreatment> treatments;
     ASSERT_EQ(runFriedman(r, columns, treatments), 0) << name;
@@ -346,9 +322,7 @@ TEST(Friedman, MatchesR) {
     for (auto const& t : treatments) rankTotal += t.rankSum;
     const double k = double(columns.size()), b = double(columns[0].size());
     EXPECT_EQ(rankTotal, b * k * (k + 1) / 2) << name;
-    ++checked;
-  }
-  EXPECT_EQ(checked, 3);
+  });
 }
 
 // An exactly additive table x_i[t] = a_i + c_t: the effects recover a_i
@@ -358,18 +332,16 @@ TEST(Friedman, AdditiveTableIsFittedExactly) {
   const std::vector<double> a{0.0, 1.5, -2.0, 4.0};
   const std::vector<double> c{10.0, 12.0, 7.0, 30.0, 8.0};  // median 10
   std::vector<std::vector<double>> columns(a.size());
-  for (std::size_t i = 0; i < a.size(); ++i) {
+  for (std::size_t i = 0; i < a.size(); ++i)
     for (double block : c) columns[i].push_back(a[i] + block);
-  }
   std::vector<std::vector<double>> original = columns;
   qel::v0::Friedman r;
   std::vector<qel::v0::FriedmanTreatment> treatments;
   ASSERT_EQ(runFriedman(r, columns, treatments), 0);
   for (std::size_t i = 0; i < a.size(); ++i) {
     EXPECT_NEAR(treatments[i].estimatedMedian, a[i] + 10.0, 1e-12) << i;
-    for (std::size_t t = 0; t < c.size(); ++t) {
+    for (std::size_t t = 0; t < c.size(); ++t)
       EXPECT_NEAR(columns[i][t], original[i][t], 1e-12) << i << " " << t;
-    }
   }
   // Every block ranks the treatments alike: S = b (k - 1), no ties.
   EXPECT_DOUBLE_EQ(r.statistic, 5.0 * 3.0);

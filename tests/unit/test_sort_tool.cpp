@@ -37,10 +37,7 @@ TEST(SortTool, MultiKeyRefineMatchesStableSortModel) {
     std::shuffle(rowList.begin(), rowList.end(), g);
     const bool subset = trial % 2 == 1;
     CbRows rows;
-    if (subset)
-      rows.mInitialize(rowList);
-    else
-      rows.mUseAllRows(n);
+    if (subset) rows.mInitialize(rowList); else rows.mUseAllRows(n);
     const bool up1 = g() % 2, up2 = g() % 2;
 
     // Model: a stable sort of positions on the (major, minor) tuple, each

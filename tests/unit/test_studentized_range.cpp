@@ -69,18 +69,13 @@ TEST(StudentizedRange, CriticalValues) {
 }
 
 TEST(StudentizedRange, PossibleRules) {
-  EXPECT_TRUE(qel::IsStudentizedRangePossible(2, 1.0, 0.001));
-  EXPECT_TRUE(qel::IsStudentizedRangePossible(3, 2.0, 0.05));
-  EXPECT_FALSE(qel::IsStudentizedRangePossible(3, 2.0, 0.01));
-  EXPECT_FALSE(qel::IsStudentizedRangePossible(41, 20.0, 0.005));
-  EXPECT_FALSE(qel::IsStudentizedRangePossible(11, 2.0, 0.05));
-  EXPECT_FALSE(qel::IsStudentizedRangePossible(40, 5.0, 0.05));
-  EXPECT_TRUE(qel::IsStudentizedRangePossible(40, 5.5, 0.05));
-  EXPECT_TRUE(qel::IsStudentizedRangePossible(14, 10.0, 0.005));
-  EXPECT_FALSE(qel::IsStudentizedRangePossible(15, 10.0, 0.005));
-  EXPECT_TRUE(qel::IsStudentizedRangePossible(40, 11.0, 0.005));
-  EXPECT_FALSE(qel::IsStudentizedRangePossible(41, 11.0, 0.0099));
-  EXPECT_TRUE(qel::IsStudentizedRangePossible(41, 11.0, 0.01));
+  // k, df, alpha, possible
+  const double range[][4] = {{2, 1, 0.001, 1},   {3, 2, 0.05, 1},     {3, 2, 0.01, 0},
+                             {41, 20, 0.005, 0}, {11, 2, 0.05, 0},    {40, 5, 0.05, 0},
+                             {40, 5.5, 0.05, 1}, {14, 10, 0.005, 1},  {15, 10, 0.005, 0},
+                             {40, 11, 0.005, 1}, {41, 11, 0.0099, 0}, {41, 11, 0.01, 1}};
+  for (const auto& r : range)
+    EXPECT_EQ(qel::IsStudentizedRangePossible(int(r[0]), r[1], r[2]), r[3] != 0) << r[0] << " " << r[1];
   EXPECT_TRUE(qel::IsStudentizedMaximumPossible(1, 1.0, 0.001));
   EXPECT_FALSE(qel::IsStudentizedMaximumPossible(3, 2.0, 0.05));
   EXPECT_FALSE(qel::IsStudentizedMaximumModulusPossible(40, 5.0, 0.05));

@@ -162,8 +162,8 @@ TEST(VariancesMultiTest, BadInputs) {
   many[3] = two;
   many[3][1] = 2.5;
   const Outcome small = run(many, 0.95, false);
-  EXPECT_TRUE(std::isnan(small.samples[3].thirdWorkValue));
-  EXPECT_TRUE(std::isnan(small.samples[3].fourthWorkValue));
+  EXPECT_TRUE(std::isnan(small.samples[3].thirdWorkValue) &&
+              std::isnan(small.samples[3].fourthWorkValue));
   EXPECT_TRUE(std::isfinite(small.samples[0].thirdWorkValue));
   EXPECT_GE(small.test.levenePValue, 0.0);
 }
@@ -182,14 +182,10 @@ TEST(VariancesMultiTest, ThreadCountDoesNotMatter) {
     const VariancesTest &t1 = runs[form].test, &t4 = runs[form + 2].test;
     EXPECT_NEAR(t4.mainPValue, t1.mainPValue, 1e-13);
     EXPECT_LT(relativeError(t4.mainStatistic, t1.mainStatistic), 1e-13);
-    if (form == 0) {
-      EXPECT_NEAR(t4.levenePValue, t1.levenePValue, 1e-13);
-    }
-    for (std::size_t i = 0; i < xs.size(); ++i) {
+    if (form == 0) { EXPECT_NEAR(t4.levenePValue, t1.levenePValue, 1e-13); }
+    for (std::size_t i = 0; i < xs.size(); ++i)
       EXPECT_LT(relativeError(runs[form + 2].samples[i].fourthWorkValue,
-                              runs[form].samples[i].fourthWorkValue),
-                1e-13);
-    }
+                              runs[form].samples[i].fourthWorkValue), 1e-13);
   }
 }
 
