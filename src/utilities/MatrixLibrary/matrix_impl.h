@@ -52,6 +52,10 @@ class UTmatrix;
 template <class T>
 class Dmatrix;
 
+// Elements of a packed triangle of the given order (the diagonal included).
+inline std::size_t packedTriangleSize(int order) {
+  return order <= 0 ? 0 : static_cast<std::size_t>(order) * (order + 1) / 2;
+}
 inline std::size_t packedIndexLower(int i, int j) {
   return static_cast<std::size_t>(i) * (i + 1) / 2 + j;
 }
@@ -143,9 +147,7 @@ class Smatrix {
     m_ = order < 0 ? 0 : order;
     v_.assign(calculate_size(m_), value);
   }
-  static std::size_t calculate_size(int order) {
-    return order <= 0 ? 0 : static_cast<std::size_t>(order) * (order + 1) / 2;
-  }
+  static std::size_t calculate_size(int order) { return packedTriangleSize(order); }
   T& operator()(int i, int j) {
     return i >= j ? v_[packedIndexLower(i, j)] : v_[packedIndexLower(j, i)];
   }
@@ -184,9 +186,7 @@ class UTmatrix {
     m_ = order < 0 ? 0 : order;
     v_.assign(calculate_size(m_), value);
   }
-  static std::size_t calculate_size(int order) {
-    return order <= 0 ? 0 : static_cast<std::size_t>(order) * (order + 1) / 2;
-  }
+  static std::size_t calculate_size(int order) { return packedTriangleSize(order); }
   T& operator()(int i, int j) {
     if (i > j) {
       zero_ = T();
