@@ -1,6 +1,7 @@
 #include "cli.h"
 
 #include <cerrno>
+#include <charconv>
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
@@ -110,12 +111,46 @@ std::vector<double> readNumbers(const std::string& path) {
   return values;
 }
 
+namespace {
+
+// 0: the shortest form that reads back to the same double.
+int significantDigits = 0;
+
+}  // namespace
+
+void setSignificantDigits(int digits) {
+  significantDigits = digits;
+}
+
+// std::to_chars without a precision gives the shortest text that parses back
+// to exactly the same double (round-trip guarantee of the C++17 charconv
+// rules), switching to exponent form where that is shorter.
 std::string formatNumber(double value) {
   if (std::isnan(value)) return "NaN";
   if (std::isinf(value)) return value > 0 ? "Inf" : "-Inf";
   char buffer[64];
-  std::snprintf(buffer, sizeof buffer, "%.17g", value);
-  return buffer;
+  const std::to_chars_result r = significantDigits > 0
+                                     ? std::to_chars(buffer, buffer + sizeof buffer, value,
+                                                     std::chars_format::general, significantDigits)
+                                     : std::to_chars(buffer, buffer + sizeof buffer, value);
+  return std::string(buffer, r.ptr);
+}
+
+int takeGlobalOptions(int argc, char** argv) {
+  int kept = 1;
+  for (int i = 1; i < argc; ++i) {
+    if (std::string(argv[i]) != "--digits") {
+      argv[kept++] = argv[i];
+      continue;
+    }
+    if (i + 1 >= argc) throw UsageError("option --digits needs a value");
+    const double d = parseNumber(argv[++i], "--digits");
+    if (!(d >= 1 && d <= 17) || d != std::floor(d))
+      throw UsageError("--digits: a whole number from 1 to 17, not " + quoted(argv[i]));
+    setSignificantDigits(static_cast<int>(d));
+  }
+  argv[kept] = nullptr;
+  return kept;
 }
 
 }  // namespace qelcalc

@@ -45,8 +45,18 @@ std::vector<double> readNumbers(const std::string& path);
 // for "-". An unreadable file is a UsageError.
 std::istream& openInput(const std::string& path, std::ifstream& file);
 
-// Formats a result with 17 significant digits, NaN as "NaN".
+// Formats a result in the shortest form that reads back to the same double,
+// or with the fixed count of significant digits set by --digits; NaN as
+// "NaN", infinities as "Inf" and "-Inf".
 std::string formatNumber(double value);
+
+// The count of significant digits for formatNumber, 1 to 17; 0 restores the
+// shortest round-trip form.
+void setSignificantDigits(int digits);
+
+// Takes the global options (--digits N) out of argv, wherever they stand,
+// and applies them; returns the new argc. A bad value is a UsageError.
+int takeGlobalOptions(int argc, char** argv);
 
 }  // namespace qelcalc
 

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "cli.h"
+#include "domain.h"
 
 namespace qelcalc {
 
@@ -60,7 +61,7 @@ Values collectParameters(const Family& family, const Arguments& args) {
   for (const auto& p : family.parameters) {
     const auto it = args.options.find(p.name);
     if (it != args.options.end()) {
-      values.push_back(parseNumber(it->second, "--" + p.name));
+      values.push_back(checkParameter(parseNumber(it->second, "--" + p.name), p.name));
     } else if (std::isnan(p.defaultValue)) {
       throw UsageError(family.name + " needs --" + p.name);
     } else {
@@ -125,7 +126,8 @@ int runDistributionMode(int argc, char** argv, std::ostream& out) {
 
   if (args.positional.size() == 3) {
     if (args.options.count("file")) throw UsageError("give either X or --file, not both");
-    const double x = parseNumber(args.positional[2], "X");
+    double x = parseNumber(args.positional[2], "X");
+    if (function == "inv") x = checkDomain(x, "X", Domain::kProbability);
     double result;
     if (function == "pdf") {
       result = family->pdf(x, params);

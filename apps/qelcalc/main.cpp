@@ -16,6 +16,7 @@
 #include "gof_mode.h"
 #include "proportion_variance_mode.h"
 #include "group_mode.h"
+#include "help.h"
 #include "pvalue_mode.h"
 #include "quad_mode.h"
 #include "rank_test_mode.h"
@@ -63,6 +64,8 @@ int main(int argc, char** argv) {
     std::cerr << "qelcalc: cannot install the floating-point signal handler\n";
     return 1;
   }
+  const int answered = qelcalc::runGlobalOptions(argc, argv, printUsage);
+  if (answered >= 0) return answered;
   if (argc < 2 || std::string(argv[1]) == "--help" || std::string(argv[1]) == "-h") {
     printUsage(argc < 2 ? std::cerr : std::cout);
     return argc < 2 ? 2 : 0;

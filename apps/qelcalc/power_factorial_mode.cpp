@@ -15,6 +15,7 @@
 
 #include "basic_statistics/PowerFactorial.h"
 #include "cli.h"
+#include "domain.h"
 #include "test_input.h"
 #include "utilities/LYNBasicTypes.h"
 
@@ -69,15 +70,13 @@ void checkOptions(const Arguments& args, const std::vector<std::string>& known) 
 }
 
 double sigmaOf(const Arguments& args) {
-  const double sigma = numberOption(args, "sigma", 1.0);
-  if (!(sigma > 0.0) || !std::isfinite(sigma)) throw UsageError("--sigma must be positive");
+  const double sigma = domainOption(args, "sigma", 1.0, Domain::kPositive);
   return sigma;
 }
 
 void setCommon(qel::CmCmndPower& c, const Arguments& args, bool hasReps, bool hasEffect,
                bool hasPower) {
-  const double level = numberOption(args, "alpha", 0.05);
-  if (!(level > 0.0 && level < 1.0)) throw UsageError("--alpha must lie in (0, 1)");
+  const double level = domainOption(args, "alpha", 0.05, Domain::kLevel);
   c.mSetLevel(level);
   c.mSetSigma(sigmaOf(args));
   if (hasReps) c.mSetSampleSizes(counts(args, "reps", 1));

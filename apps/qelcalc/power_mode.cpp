@@ -18,6 +18,7 @@
 #include "basic_statistics/Power.h"
 #include "basic_statistics/PowerTOST.h"
 #include "cli.h"
+#include "domain.h"
 #include "power_factorial_mode.h"
 #include "test_input.h"
 #include "utilities/LYNBasicTypes.h"
@@ -123,8 +124,7 @@ void runT(const Request& r, const Arguments& args, std::ostream& out) {
   setUp(c, r, args);
   c.mSetZTest(r.design == "z");
   c.mSetPair(r.design == "paired");
-  const double sigma = numberOption(args, "sigma", 1.0);
-  if (!(sigma > 0.0) || !std::isfinite(sigma)) throw UsageError("--sigma must be positive");
+  const double sigma = domainOption(args, "sigma", 1.0, Domain::kPositive);
   c.mSetSigma(sigma);
   finish(c, r, out);
 }
@@ -132,8 +132,7 @@ void runT(const Request& r, const Arguments& args, std::ostream& out) {
 void runProportion(const Request& r, const Arguments& args, std::ostream& out) {
   qel::CmCmndPowerProportion c;
   setUp(c, r, args);
-  const double null = numberOption(args, "null", 0.5);
-  if (!(null > 0.0 && null < 1.0)) throw UsageError("--null must lie in (0, 1)");
+  const double null = domainOption(args, "null", 0.5, Domain::kLevel);
   c.mSetNull(null);
   checkEffects(c, null, 0.0, 1.0);
   finish(c, r, out);
@@ -161,8 +160,7 @@ void runVariance(const Request& r, const Arguments& args, std::ostream& out) {
 void runPoisson(const Request& r, const Arguments& args, std::ostream& out) {
   qel::CmCmndPowerPoisson c;
   setUp(c, r, args);
-  const double rate = numberOption(args, "rate", 1.0);
-  if (!(rate > 0.0) || !std::isfinite(rate)) throw UsageError("--rate must be positive");
+  const double rate = domainOption(args, "rate", 1.0, Domain::kPositive);
   c.mSetRate(rate);
   if (args.options.count("length")) {
     const std::vector<double> lengths = numberList(args, "length");
@@ -179,9 +177,8 @@ void runPoisson(const Request& r, const Arguments& args, std::ostream& out) {
 // each sample.
 void runWelch(const Request& r, const Arguments& args, std::ostream& out) {
   if (r.extents) throw UsageError("--extents is not available for welch");
-  const double s1 = numberOption(args, "sd1", 1.0), s2 = numberOption(args, "sd2", 1.0);
-  if (!(s1 > 0.0) || !(s2 > 0.0) || !std::isfinite(s1) || !std::isfinite(s2))
-    throw UsageError("--sd1 and --sd2 must be positive");
+  const double s1 = domainOption(args, "sd1", 1.0, Domain::kPositive);
+  const double s2 = domainOption(args, "sd2", 1.0, Domain::kPositive);
   const std::vector<int> ns = r.hasN ? sizeList(args) : std::vector<int>{};
   const std::vector<double> es = r.hasEffect ? numberList(args, "effect") : std::vector<double>{};
   const std::vector<double> ps = r.hasPower ? numberList(args, "power") : std::vector<double>{};
@@ -217,8 +214,7 @@ void runTOST(const Request& r, const Arguments& args, std::ostream& out) {
     throw UsageError("power tost needs --lower and --upper");
   qel::CmCmndPowerTOST c;
   setUp(c, r, args);
-  const double sigma = numberOption(args, "sigma", 1.0);
-  if (!(sigma > 0.0) || !std::isfinite(sigma)) throw UsageError("--sigma must be positive");
+  const double sigma = domainOption(args, "sigma", 1.0, Domain::kPositive);
   c.mSetSigma(sigma);
   c.mSetRatio(r.ratio);
   c.mSetLimits(numberOption(args, "lower", 0.0), numberOption(args, "upper", 0.0));
@@ -294,8 +290,7 @@ int runPowerMode(int argc, char** argv, std::ostream& out) {
   r.hasPower = args.options.count("power") != 0;
   if ((r.hasN ? 1 : 0) + (r.hasEffect ? 1 : 0) + (r.hasPower ? 1 : 0) != 2)
     throw UsageError("give exactly two of --n, --effect and --power");
-  r.level = numberOption(args, "alpha", 0.05);
-  if (!(r.level > 0.0 && r.level < 1.0)) throw UsageError("--alpha must lie in (0, 1)");
+  r.level = domainOption(args, "alpha", 0.05, Domain::kLevel);
   r.alternative = alternativeOf(args);
 
   // Rows are written only when the whole request has passed its checks.

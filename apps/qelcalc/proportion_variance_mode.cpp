@@ -13,6 +13,7 @@
 #include <string>
 #include <vector>
 
+#include "domain.h"
 #include "test_input.h"
 
 namespace qelcalc {
@@ -31,9 +32,7 @@ void allowOnly(const Arguments& args, const std::string& name, const std::set<st
 }
 
 double confidenceOf(const Arguments& args) {
-  const double c = numberOption(args, "confidence", 0.95);
-  if (!(c > 0.0 && c < 1.0)) throw UsageError("--confidence must lie strictly between 0 and 1");
-  return c;
+  return domainOption(args, "confidence", 0.95, Domain::kLevel);
 }
 
 // A whole count in [0, 2^32).
@@ -81,7 +80,7 @@ int runProportion(const Arguments& args, std::ostream& out) {
   const qel::AlternativeHypothesis alternative = alternativeOf(args);
   const qel::IntervalType type = intervalOf(args, alternative);
   const double confidence = confidenceOf(args);
-  const double p0 = numberOption(args, "p0", 0.5);
+  const double p0 = domainOption(args, "p0", 0.5, Domain::kProbability);
   if (!(p0 > 0.0 && p0 < 1.0)) throw UsageError("--p0 must lie strictly between 0 and 1");
   const std::string method = args.options.count("method") ? args.options.at("method") : "exact";
 
@@ -172,8 +171,7 @@ int runVariance(const Arguments& args, std::ostream& out) {
   allowOnly(args, "variance", {"column", "variance0", "alternative", "confidence", "interval"}, {});
   const std::vector<double> x = columnOf(args, "column", 1);
   const qel::AlternativeHypothesis alternative = alternativeOf(args);
-  const double variance0 = numberOption(args, "variance0", 1.0);
-  if (!(variance0 > 0.0)) throw UsageError("--variance0 must be positive");
+  const double variance0 = domainOption(args, "variance0", 1.0, Domain::kPositive);
   qel::v0::OneVariance r;
   r.n = static_cast<unsigned int>(x.size());
   checkCode(qel::v0::RunOneVariance(&r, x.data(), confidenceOf(args), intervalOf(args, alternative),

@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "cli.h"
+#include "domain.h"
 
 namespace qelcalc {
 
@@ -30,7 +31,7 @@ qel::EAlternative alternativeOf(const Options& options) {
 double number(const Options& options, const std::string& name) {
   const auto it = options.find(name);
   if (it == options.end()) throw UsageError("needs --" + name);
-  return parseNumber(it->second, "--" + name);
+  return checkParameter(parseNumber(it->second, "--" + name), name);
 }
 
 int whole(const Options& options, const std::string& name) {
@@ -133,7 +134,8 @@ int runPValueMode(int argc, char** argv, std::ostream& out) {
     for (const auto& p : it->second.parameters) known = known || p == option.first;
     if (!known) throw UsageError(args.positional[0] + " has no parameter --" + option.first);
   }
-  const double value = parseNumber(args.positional[1], mode == "pvalue" ? "X" : "ALPHA");
+  double value = parseNumber(args.positional[1], mode == "pvalue" ? "X" : "ALPHA");
+  if (mode == "crit") value = checkDomain(value, "ALPHA", Domain::kProbability);
   out << formatNumber(it->second.evaluate(value, options, alternativeOf(options))) << "\n";
   return 0;
 }

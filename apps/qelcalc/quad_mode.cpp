@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "cli.h"
+#include "domain.h"
 #include "test_input.h"
 #include "utilities/MathUtilities.h"
 
@@ -93,9 +94,7 @@ int runSintMode(int argc, char** argv, std::ostream& out) {
   }
   if (!args.options.count("confidence")) throw UsageError("sint needs --confidence");
   const int n = countArgument(args.positional[0], "N", 1, 1e8);
-  const double confidence = numberOption(args, "confidence", 0.95);
-  if (!(confidence > 0.0 && confidence < 1.0))
-    throw UsageError("--confidence: must lie between 0 and 1");
+  const double confidence = domainOption(args, "confidence", 0.95, Domain::kLevel);
   std::vector<double> levels;
   int d = 0, kind = 0;
   double lambda = 0.0;

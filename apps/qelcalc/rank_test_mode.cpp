@@ -17,6 +17,7 @@
 #include <string>
 #include <vector>
 
+#include "domain.h"
 #include "test_input.h"
 
 namespace qelcalc {
@@ -239,7 +240,7 @@ int runSign(const Arguments& args, std::ostream& out) {
   const std::vector<double> x = oneSample(args);
   const qel::AlternativeHypothesis alternative = alternativeOf(args);
   const qel::IntervalType type = intervalOf(args, alternative);
-  const double confidence = numberOption(args, "confidence", 0.95);
+  const double confidence = domainOption(args, "confidence", 0.95, Domain::kLevel);
   const double mu = numberOption(args, "mu", 0.0);
   qel::v0::OneSampleSign r;
   r.n = static_cast<unsigned int>(x.size());
@@ -275,7 +276,8 @@ int runWilcoxon(const Arguments& args, std::ostream& out) {
   const qel::IntervalType type = intervalOf(args, alternative);
   qel::v0::OneSampleWilcoxon r;
   r.n = static_cast<int>(x.size());
-  checkCode(qel::v0::RunLynOneSampleWilcoxon(&r, x.data(), numberOption(args, "confidence", 0.95),
+  checkCode(qel::v0::RunLynOneSampleWilcoxon(&r, x.data(),
+                                             domainOption(args, "confidence", 0.95, Domain::kLevel),
                                              type, alternative, numberOption(args, "mu", 0.0)));
   out << "n " << r.n << "\n";
   writeField(out, "estimate", r.estimatedMedian);
@@ -318,7 +320,8 @@ int runMannWhitney(const Arguments& args, std::ostream& out) {
   r.firstN = static_cast<int>(groups.samples[0].size());
   r.secondN = static_cast<int>(groups.samples[1].size());
   checkCode(qel::v0::RunLynMannWhitney(&r, groups.samples[0].data(), groups.samples[1].data(),
-                                       numberOption(args, "confidence", 0.95), type, alternative));
+                                       domainOption(args, "confidence", 0.95, Domain::kLevel), type,
+                                       alternative));
   out << "first " << groups.labels[0] << "\nsecond " << groups.labels[1] << "\n";
   out << "first_n " << r.firstN << "\nsecond_n " << r.secondN << "\n";
   writeField(out, "first_median", r.firstMedian);
@@ -488,10 +491,7 @@ int runVariances(const Arguments& args, std::ostream& out) {
   checkOptions(args, "variances", allowed, {"normal"});
   const Groups groups = gatherGroups(args, false);
   requireGroupCount(groups, "variances", false);
-  const double confidence = numberOption(args, "confidence", 0.95);
-  if (!(confidence > 0.0 && confidence < 1.0)) {
-    throw UsageError("--confidence must lie strictly between 0 and 1");
-  }
+  const double confidence = domainOption(args, "confidence", 0.95, Domain::kLevel);
   const bool normal = std::find(args.flags.begin(), args.flags.end(), "normal") != args.flags.end();
   std::vector<qel::v0::VariancesTestSample> records(groups.samples.size());
   for (std::size_t g = 0; g < records.size(); ++g) {

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "cli.h"
+#include "domain.h"
 
 namespace qelcalc {
 namespace {
@@ -167,9 +168,11 @@ int runSampleMode(int argc, char** argv, std::ostream& out) {
   std::size_t used = 0;
   for (const auto& param : family->params) {
     const auto given = args.options.find(param.first);
-    params.push_back(given == args.options.end()
-                         ? param.second
-                         : parseNumber(given->second, std::string("--") + param.first));
+    params.push_back(
+        given == args.options.end()
+            ? param.second
+            : checkParameter(parseNumber(given->second, std::string("--") + param.first),
+                             param.first));
     used += given != args.options.end();
   }
   if (const auto given = args.options.find("seed"); given != args.options.end()) {

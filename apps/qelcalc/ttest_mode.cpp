@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "cli.h"
+#include "domain.h"
 #include "proportion_variance_mode.h"
 #include "rank_test_mode.h"
 #include "test_input.h"
@@ -77,7 +78,7 @@ int runLocationTest(Kind kind, const std::vector<double>& x, const std::vector<d
                     bool pooled, const Arguments& args, std::ostream& out) {
   const qel::AlternativeHypothesis alternative = alternativeOf(args);
   const qel::IntervalType type = intervalOf(args, alternative);
-  const double confidence = numberOption(args, "confidence", 0.95);
+  const double confidence = domainOption(args, "confidence", 0.95, Domain::kLevel);
   const double mu = numberOption(args, "mu", 0.0);
   const auto n = static_cast<unsigned int>(x.size());
   if (kind == Kind::PairedT || kind == Kind::TwoSampleT) {
@@ -123,7 +124,7 @@ int runLocationTest(Kind kind, const std::vector<double>& x, const std::vector<d
   if (kind == Kind::OneSampleZ) {
     qel::v0::OneSampleZ r;
     r.n = n;
-    const double sigma = numberOption(args, "sigma", 1.0);
+    const double sigma = domainOption(args, "sigma", 1.0, Domain::kPositive);
     checkCode(qel::v0::RunOneSampleZ(&r, x.data(), sigma, confidence, type, alternative, mu));
     out << "n " << r.n << "\n";
     writeField(out, "mean", r.mean);
@@ -162,7 +163,8 @@ void printTestUsage(std::ostream& out) {
 }
 
 int runTestMode(int argc, char** argv, std::ostream& out) {
-  const Arguments args = parseArguments(argc, argv, 2, {"pooled", "approximate", "levene", "normal"});
+  const Arguments args =
+      parseArguments(argc, argv, 2, {"pooled", "approximate", "levene", "normal"});
   if (args.positional.empty()) throw UsageError("test takes a test name and a data file");
   const std::string& name = args.positional[0];
   if (isRankTest(name)) return runRankTest(args, out);

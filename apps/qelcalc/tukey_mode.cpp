@@ -4,6 +4,7 @@
 #include <string>
 
 #include "cli.h"
+#include "domain.h"
 #include "qel/distributions.h"
 #include "quad_mode.h"
 #include "test_input.h"
@@ -35,8 +36,7 @@ int runTukeyMode(int argc, char** argv, std::ostream& out) {
   const double k = parseNumber(args.options.at("k"), "--k");
   if (!(k >= 2 && k <= 1e6) || k != static_cast<int>(k))
     throw UsageError("--k: a whole number from 2 to 1000000");
-  const double df = parseNumber(args.options.at("df"), "--df");
-  if (!(df > 0)) throw UsageError("--df: a positive number");
+  const double df = checkParameter(parseNumber(args.options.at("df"), "--df"), "df");
   const std::string& what = args.positional[0];
   const double x = parseNumber(args.positional[1], "X");
   const int n = static_cast<int>(k);
