@@ -5,15 +5,18 @@
 // position, its score, and the fitted line at the value in score units.
 #include "fit_mode.h"
 
+#include <qel/distributions.h>
 #include <qel/fits.h>
 
 #include <algorithm>
 #include <cmath>
+#include <cstdio>
 #include <fstream>
 #include <limits>
 #include <string>
 #include <vector>
 
+#include "charts.h"
 #include "cli.h"
 
 namespace qelcalc {
@@ -37,8 +40,9 @@ qel::PlottingMethod parseMethod(const std::string& name) {
   throw UsageError("unknown --method '" + name + "' (median, mean, midpoint or step)");
 }
 
-// Reads FILE (positional) with --dist, --method and, for pplot, --out.
-Plot makePlot(int argc, char** argv, bool allowOut, std::string* outPath) {
+// Reads FILE (positional) with --dist, --method and, for pplot, --out and
+// --svg (paths[0] and paths[1]).
+Plot makePlot(int argc, char** argv, bool allowOut, std::string* paths) {
   const Arguments args = parseArguments(argc, argv, 2, {});
   if (args.positional.size() != 1) throw UsageError("expected one FILE argument (or -)");
   std::string method = "median";
@@ -49,7 +53,9 @@ Plot makePlot(int argc, char** argv, bool allowOut, std::string* outPath) {
     } else if (option.first == "method") {
       method = option.second;
     } else if (option.first == "out" && allowOut) {
-      *outPath = option.second;
+      paths[0] = option.second;
+    } else if (option.first == "svg" && allowOut) {
+      paths[1] = option.second;
     } else {
       throw UsageError(std::string(argv[1]) + " has no option --" + option.first);
     }
@@ -108,8 +114,55 @@ void printFitUsage(std::ostream& out) {
          "    Maximum-likelihood fit of a column of numbers: the parameters, their\n"
          "    covariances and the Anderson-Darling statistic and P-value.\n"
          "  qelcalc pplot FILE|- --dist D [--method median|mean|midpoint|step] [--out CSV]\n"
-         "    Probability-plot data as CSV (x,probability,score,fitted), to --out or stdout.\n";
+         "                [--svg PICTURE]\n"
+         "    Probability-plot data as CSV (x,probability,score,fitted), to --out or stdout;\n"
+         "    --svg also draws the plot (points, fitted line, percent scale, AD test).\n";
 }
+
+namespace {
+
+// A number of a note: four significant digits.
+std::string shortNumber(double v) {
+  char buffer[32];
+  std::snprintf(buffer, sizeof buffer, "%.4g", v);
+  return std::isfinite(v) ? buffer : formatNumber(v);
+}
+
+// The probability plot as a picture: data on a log axis where the score is
+// linear in log x; the probability axis in normal scores for the normal and
+// lognormal, in log(-log(1 - p)) for the exponential and Weibull.
+void writePlotPicture(const Plot& plot, const std::string& path) {
+  ProbabilityPlotPicture picture;
+  const bool normal = plot.dist == "normal" || plot.dist == "lognormal";
+  std::string name = plot.dist;
+  name[0] = static_cast<char>(name[0] - 'a' + 'A');
+  picture.title = name + " probability plot";
+  picture.x = plot.x;
+  picture.scores = plot.scores;
+  picture.logAxis = plot.dist != "normal";
+  picture.fitted = [&plot](double x) { return fittedScore(plot, x); };
+  if (normal)
+    picture.scoreOf = [](double p) { return qel::NormalInvCdf(p, 0.0, 1.0); };
+  else
+    picture.scoreOf = [](double p) { return std::log(-std::log1p(-p)); };
+  const char* bound = plot.status == qel::qelWarnADPValueUpperBound   ? " <= "
+                      : plot.status == qel::qelWarnADPValueLowerBound ? " >= "
+                                                                      : " = ";
+  picture.notes = {"n = " + std::to_string(plot.x.size()), "AD = " + shortNumber(plot.statistic),
+                   "P-value" + std::string(bound) + shortNumber(plot.pValue)};
+  const double* q = plot.parameters;
+  if (plot.dist == "normal")
+    picture.notes.push_back("mean " + shortNumber(q[0]) + ", stddev " + shortNumber(q[1]));
+  else if (plot.dist == "lognormal")
+    picture.notes.push_back("location " + shortNumber(q[0]) + ", scale " + shortNumber(q[1]));
+  else if (plot.dist == "exponential")
+    picture.notes.push_back("scale " + shortNumber(q[0]));
+  else
+    picture.notes.push_back("shape " + shortNumber(q[0]) + ", scale " + shortNumber(q[1]));
+  writeProbabilityPlot(picture, path);
+}
+
+}  // namespace
 
 int runFitMode(int argc, char** argv, std::ostream& out) {
   const Plot plot = makePlot(argc, argv, false, nullptr);
@@ -134,8 +187,10 @@ int runFitMode(int argc, char** argv, std::ostream& out) {
 }
 
 int runPPlotMode(int argc, char** argv, std::ostream& out) {
-  std::string outPath;
-  const Plot plot = makePlot(argc, argv, true, &outPath);
+  std::string paths[2];
+  const Plot plot = makePlot(argc, argv, true, paths);
+  const std::string& outPath = paths[0];
+  if (!paths[1].empty()) writePlotPicture(plot, paths[1]);
   std::ofstream file;
   std::ostream* sink = &out;
   if (!outPath.empty()) {
