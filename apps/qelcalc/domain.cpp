@@ -38,9 +38,9 @@ const char* rangeText(Domain domain) {
     case Domain::kLevel:
       return "a level strictly between 0 and 1 (0, 1)";
     case Domain::kCount:
-      return "a whole number 0, 1, 2, ... up to 2147483647";
+      return "a whole number in [0, 2147483647]";
     case Domain::kWhole:
-      return "a whole number from -2147483647 to 2147483647";
+      return "a whole number in [-2147483647, 2147483647]";
     case Domain::kAny:
       break;
   }
