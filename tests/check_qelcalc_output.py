@@ -119,7 +119,7 @@ def near(a, b, what):
 
 def pplot_svg():
     x = [4.1, 5.3, 2.2, 6.8, 5.0, 3.9, 4.4, 7.5, 5.9, 4.8, 3.1, 5.6]
-    path = os.path.join(WORK, "people_plot.svg")
+    path = os.path.join(WORK, WHAT + "_plot.svg")
     r = run(["pplot", "-", "--dist", "normal", "--svg", path], "\n".join(map(str, x)) + "\n")
     check(r.returncode == 0, f"pplot --svg: {r.stderr}")
     x.sort()
@@ -145,7 +145,7 @@ def pplot_svg():
 
 def boxplot_svg():
     x = [3, 5, 4, 6, 5, 19, 4.5, 5.5, 6.1, 3.9, 4.2, 5.2, -4]  # n = 13: hinges at depth 4
-    path = os.path.join(WORK, "people_box.svg")
+    path = os.path.join(WORK, WHAT + "_box.svg")
     r = run(["summary", "-", "--svg", path], "\n".join(map(str, x)) + "\n")
     check(r.returncode == 0, f"summary --svg: {r.stderr}")
     s = sorted(x)
@@ -177,7 +177,7 @@ def render():
         sys.exit(77)
     pplot_svg()
     boxplot_svg()
-    for name, size in [("people_plot", (640, 480)), ("people_box", (420, 480))]:
+    for name, size in [(WHAT + "_plot", (640, 480)), (WHAT + "_box", (420, 480))]:
         png = os.path.join(WORK, name + ".png")
         if os.path.exists(png):
             os.remove(png)
