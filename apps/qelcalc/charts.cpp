@@ -44,10 +44,12 @@ std::string tickLabel(double v) {
 }
 
 // Ticks of an axis over [lo, hi] from the library's tick search (4 to 11
-// ticks, up to 5% of the range beyond the data at either end).
+// ticks); the scale reaches 2% to 8% of the range beyond the data at either
+// end, so that no point sits on the frame.
 qel::deprecated::TickCalculationResult axisTicks(double lo, double hi) {
   qel::deprecated::TickCalculationResult r;
-  qel::deprecated::ComputeTicks(&r, 4, 11, 0, 0.05, 0, 0.05, -DBL_MAX, DBL_MAX, 0.5, 0.5, lo, hi);
+  qel::deprecated::ComputeTicks(&r, 4, 11, 0.02, 0.08, 0.02, 0.08, -DBL_MAX, DBL_MAX, 0.5, 0.5, lo,
+                                hi);
   if (!(r.tickCount > 0) || !std::isfinite(r.scaleMinimum) || !std::isfinite(r.scaleMaximum))
     throw UsageError("no axis for data from " + formatNumber(lo) + " to " + formatNumber(hi));
   return r;
