@@ -1,20 +1,21 @@
-// Location tests with their confidence intervals: one-sample t, one-sample z
-// (known sigma), paired t and two-sample t (pooled or Welch).
-//
-// Every test has a caller-owned record. Its constructor sets every double to
-// NaN and every count to 0; the caller sets the sample size(s) and calls a
-// Run function. Each Run function exists in four forms: raw data or summary
-// values, interval only or interval and test. The summary forms read the
-// estimate and its deviation from the record instead of computing them. A
-// field that a call does not compute is left as it stands, so on a fresh
-// record NaN means "not computed".
-//
-// Return codes: 0, or 30002 for an IntervalType outside -1, 0, 1 or a
-// confidence outside (0, 1) (limits NaN), or 30001 when memory runs out
-// (paired t only). The data are not checked: NaN in the data or too few
-// observations give NaN in the concerned fields and code 0.
-// The functions run outside the armed floating-point frame; each
-// distribution call enters and leaves it by itself.
+/// \file
+/// Location tests with their confidence intervals: one-sample t, one-sample z
+/// (known sigma), paired t and two-sample t (pooled or Welch).
+///
+/// Every test has a caller-owned record. Its constructor sets every double to
+/// NaN and every count to 0; the caller sets the sample size(s) and calls a
+/// Run function. Each Run function exists in four forms: raw data or summary
+/// values, interval only or interval and test. The summary forms read the
+/// estimate and its deviation from the record instead of computing them. A
+/// field that a call does not compute is left as it stands, so on a fresh
+/// record NaN means "not computed".
+///
+/// Return codes: 0, or 30002 for an IntervalType outside -1, 0, 1 or a
+/// confidence outside (0, 1) (limits NaN), or 30001 when memory runs out
+/// (paired t only). The data are not checked: NaN in the data or too few
+/// observations give NaN in the concerned fields and code 0.
+/// The functions run outside the armed floating-point frame; each
+/// distribution call enters and leaves it by itself.
 #ifndef QEL_LOCATION_TESTS_H
 #define QEL_LOCATION_TESTS_H
 
@@ -24,34 +25,34 @@
 namespace qel {
 namespace v0 {
 
-// One-sample t on n observations.
+/// One-sample t on n observations.
 struct OneSampleT {
   QEL_API OneSampleT();
-  double mean;               // input of the summary forms
-  double standardDeviation;  // input of the summary forms
-  double standardError;      // of the mean
+  double mean;               ///< input of the summary forms
+  double standardDeviation;  ///< input of the summary forms
+  double standardError;      ///< of the mean
   double lowerLimit;
   double upperLimit;
-  double statistic;  // t
+  double statistic;  ///< t
   double pValue;
   unsigned int n;
 };
 
-// One-sample z with a known sigma. The data forms write the sample standard
-// deviation into the record although the z interval does not use it.
+/// One-sample z with a known sigma. The data forms write the sample standard
+/// deviation into the record although the z interval does not use it.
 struct OneSampleZ {
   QEL_API OneSampleZ();
-  double mean;               // input of the summary forms
-  double standardDeviation;  // sample deviation; never read
-  double standardError;      // sigma / sqrt(n)
+  double mean;               ///< input of the summary forms
+  double standardDeviation;  ///< sample deviation; never read
+  double standardError;      ///< sigma / sqrt(n)
   double lowerLimit;
   double upperLimit;
-  double statistic;  // z
+  double statistic;  ///< z
   double pValue;
   unsigned int n;
 };
 
-// Paired t on n pairs, through the differences x[i] - y[i].
+/// Paired t on n pairs, through the differences x[i] - y[i].
 struct PairedT {
   QEL_API PairedT();
   double firstMean;
@@ -60,40 +61,40 @@ struct PairedT {
   double secondStandardDeviation;
   double firstStandardError;
   double secondStandardError;
-  double meanDifference;                  // input of the summary forms
-  double standardDeviationOfDifferences;  // input of the summary forms
+  double meanDifference;                  ///< input of the summary forms
+  double standardDeviationOfDifferences;  ///< input of the summary forms
   double standardErrorOfDifferences;
   double lowerLimit;
   double upperLimit;
-  double statistic;  // t
+  double statistic;  ///< t
   double pValue;
-  unsigned int n;  // number of pairs
+  unsigned int n;  ///< number of pairs
 };
 
-// Two-sample t. Pooled: n1 + n2 - 2 degrees of freedom. Welch: the
-// Satterthwaite degrees of freedom rounded down to a whole number.
+/// Two-sample t. Pooled: n1 + n2 - 2 degrees of freedom. Welch: the
+/// Satterthwaite degrees of freedom rounded down to a whole number.
 struct TwoSampleT {
   QEL_API TwoSampleT();
-  double firstMean;                // input of the summary forms
-  double secondMean;               // input of the summary forms
-  double firstStandardDeviation;   // input of the summary forms
-  double secondStandardDeviation;  // input of the summary forms
+  double firstMean;                ///< input of the summary forms
+  double secondMean;               ///< input of the summary forms
+  double firstStandardDeviation;   ///< input of the summary forms
+  double secondStandardDeviation;  ///< input of the summary forms
   double firstStandardError;
   double secondStandardError;
-  double difference;               // first mean - second mean
-  double pooledStandardDeviation;  // written only when pooled
+  double difference;               ///< first mean - second mean
+  double pooledStandardDeviation;  ///< written only when pooled
   double degreesOfFreedom;
   double lowerLimit;
   double upperLimit;
-  double statistic;  // t
+  double statistic;  ///< t
   double pValue;
   unsigned int firstN;
   unsigned int secondN;
 };
 
-// confidence is a fraction in (0, 1); type -1 gives (-inf, upper], 0 a
-// two-sided interval, 1 [lower, +inf). The alternative is passed unchanged to
-// the P-value: -1 less, 0 not equal, 1 greater than mu0 (delta0).
+/// confidence is a fraction in (0, 1); type -1 gives (-inf, upper], 0 a
+/// two-sided interval, 1 [lower, +inf). The alternative is passed unchanged to
+/// the P-value: -1 less, 0 not equal, 1 greater than mu0 (delta0).
 QEL_API int RunOneSampleT(OneSampleT* record, double const* x, double confidence,
                           IntervalType type);
 QEL_API int RunOneSampleT(OneSampleT* record, double const* x, double confidence, IntervalType type,
