@@ -49,17 +49,22 @@
 namespace qel {
 namespace deprecated {
 
+/// The ticks and extent of one axis, filled by ComputeTicks.
 struct TickCalculationResult {
   /// The five doubles NaN, the count 0.
   QEL_API TickCalculationResult();
-  double firstTick;
-  double lastTick;
-  double scaleMinimum;
-  double scaleMaximum;
-  double increment;
-  int tickCount;
+  double firstTick;  ///< value of the first tick
+  double lastTick;  ///< value of the last tick
+  double scaleMinimum;  ///< lower end of the axis
+  double scaleMaximum;  ///< upper end of the axis
+  double increment;  ///< distance between ticks
+  int tickCount;  ///< number of ticks
 };
 
+/// Finds the ticks and the extent of the axis for the data range
+/// [dataMin, dataMax] under the arguments described in the file description,
+/// and writes them to *result. Bad input gives the defined results listed
+/// there; nothing is reported.
 QEL_API void ComputeTicks(TickCalculationResult* result, int minTicks, int maxTicks,
                           double belowMinMargin, double belowMaxMargin, double aboveMinMargin,
                           double aboveMaxMargin, double lowerLimit, double upperLimit,

@@ -18,12 +18,13 @@ namespace v1 {
 /// Second-order sample moments. The constructor sets the doubles to NaN and
 /// n to 0; the caller sets n before GetSecondSampleMoments.
 struct SecondSampleMoments {
+  /// Doubles NaN, n 0.
   QEL_API SecondSampleMoments();
   double variance;      ///< denominator n - 1
   double sumOfSquares;  ///< raw sum of squares: n*mean*mean + (n-1)*variance
-  double mean;
+  double mean;  ///< sample mean
   double sum;  ///< n*mean
-  unsigned int n;
+  unsigned int n;  ///< number of observations; set by the caller
 };
 
 /// Mean: NaN for n = 0.

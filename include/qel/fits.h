@@ -17,12 +17,18 @@
 
 namespace qel {
 
+/// \name Anderson-Darling P-value status
 /// Status of an Anderson-Darling P-value besides 0 (computed or
 /// interpolated): the statistic lies beyond the largest tabled point and the
 /// true P-value is below the one returned; or (Weibull) below the smallest
 /// tabled point and the true P-value is above the one returned.
+///@{
+/// Beyond the largest tabled point: the true P-value is below the one returned.
 constexpr int qelWarnADPValueUpperBound = 10003;
+/// Below the smallest tabled point (Weibull): the true P-value is above the
+/// one returned.
 constexpr int qelWarnADPValueLowerBound = 10004;
+///@}
 
 namespace v1 {
 
@@ -31,6 +37,8 @@ namespace v1 {
 /// the logarithms of the data). n < 2 gives NaN in both outputs and status 0.
 QEL_API int RunLynNormalADTest(double const* sorted, double const* parameters, double* statistic,
                                double* pValue, unsigned n);
+/// The same against a lognormal law: the normal test on the logarithms of the
+/// data, parameters[0] and parameters[1] their location and scale.
 QEL_API int RunLynLogNormalADTest(double const* sorted, double const* parameters, double* statistic,
                                   double* pValue, unsigned n);
 
@@ -47,6 +55,8 @@ QEL_API int CreatePointProbabilities(double* probabilities, unsigned n, Plotting
 QEL_API int RunLynNormalPPlot(double const* sorted, double* scores, double* probabilities,
                               double* parameters, double* covariances, double* adStatistic,
                               double* adPValue, unsigned n, PlottingMethod method);
+/// The same for the lognormal law: scores and the Anderson-Darling test on
+/// the logarithms of the data.
 QEL_API int RunLynLogNormalPPlot(double const* sorted, double* scores, double* probabilities,
                                  double* parameters, double* covariances, double* adStatistic,
                                  double* adPValue, unsigned n, PlottingMethod method);
@@ -69,6 +79,7 @@ QEL_API int RunLynWeibullADTest(double const* sorted, double const* parameters, 
 QEL_API int RunLynExponentialPPlot(double const* sorted, double* scores, double* probabilities,
                                    double* parameter, double* covariance, double* adStatistic,
                                    double* adPValue, unsigned n, PlottingMethod method);
+/// The Weibull plot: shape and scale with their packed 2x2 covariance.
 QEL_API int RunLynWeibullPPlot(double const* sorted, double* scores, double* probabilities,
                                double* parameters, double* covariances, double* adStatistic,
                                double* adPValue, unsigned n, PlottingMethod method);
@@ -81,7 +92,10 @@ namespace v2 {
 /// standard deviation (denominator n - 1). The lognormal: the same of the
 /// logarithms. All return 0.
 QEL_API int FitExponential(double const* x, double* parameter, unsigned n);
+/// Normal: parameters[0] the mean, parameters[1] the standard deviation
+/// (denominator n - 1). Returns 0.
 QEL_API int FitLynNormal(double const* x, double* parameters, unsigned n);
+/// Lognormal: the mean and standard deviation of the logarithms. Returns 0.
 QEL_API int FitLynLogNormal(double const* x, double* parameters, unsigned n);
 /// Weibull shape (Newton's method on the likelihood equation of the centred
 /// logarithms) and scale. Returns 0; 20004 when 50 Newton steps do not

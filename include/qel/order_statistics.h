@@ -30,6 +30,7 @@ QEL_API double GetTypicalMedian(double const* sorted, unsigned int n);
 /// The library's 5% trimmed mean: floor(0.05 n + 0.5) observations dropped
 /// at each end, NaN when nothing is left. *status gets 0, or 30001.
 QEL_API double GetLynTrimmedMean(double const* x, unsigned int n, int* status);
+/// The same 5% trimmed mean of data already sorted ascending.
 QEL_API double LynTrimmedMeanOnSorted(double const* sorted, unsigned int n);
 
 /// Trimmed mean with fractional end weights: h = n*trim observations dropped
@@ -40,6 +41,7 @@ QEL_API double LynTrimmedMeanOnSorted(double const* sorted, unsigned int n, doub
 /// Mean of whole observations after dropping floor(n*trim) at each end; NaN
 /// when nothing is left. GetTrimmedMean sets *status to 0, or 30001.
 QEL_API double GetTrimmedMean(double const* x, unsigned int n, double trim, int* status);
+/// The same trimmed mean of data already sorted ascending.
 QEL_API double TrimmedMeanOnSorted(double const* sorted, unsigned int n, double trim);
 
 /// The most frequent values (exact equality). At most `capacity` modes are

@@ -17,12 +17,13 @@ namespace v1 {
 
 /// Minimum, quartiles, median and maximum; all NaN from the constructor.
 struct FiveNumberSummary {
+  /// All fields NaN.
   QEL_API FiveNumberSummary();
-  double minimum;
-  double firstQuartile;
-  double median;
-  double thirdQuartile;
-  double maximum;
+  double minimum;  ///< smallest value
+  double firstQuartile;  ///< type-6 quantile at 0.25
+  double median;  ///< type-6 quantile at 0.5
+  double thirdQuartile;  ///< type-6 quantile at 0.75
+  double maximum;  ///< largest value
 };
 
 /// What a boxplot needs; all NaN from the constructor. The quartiles and the
@@ -30,18 +31,19 @@ struct FiveNumberSummary {
 /// sit at depth (n+3)/4 from either end; the limits are a confidence
 /// interval of the median from the sign test.
 struct LynBoxplotHelper {
+  /// All fields NaN.
   QEL_API LynBoxplotHelper();
-  double minimum;
-  double maximum;
-  double firstQuartile;
-  double median;
-  double thirdQuartile;
-  double medianLowerLimit;
-  double medianUpperLimit;
-  double lowerHinge;
-  double upperHinge;
-  double mean;
-  double standardDeviation;
+  double minimum;  ///< smallest value
+  double maximum;  ///< largest value
+  double firstQuartile;  ///< type-6 quantile at 0.25
+  double median;  ///< type-6 quantile at 0.5
+  double thirdQuartile;  ///< type-6 quantile at 0.75
+  double medianLowerLimit;  ///< lower limit of the median's sign-test interval (the notch)
+  double medianUpperLimit;  ///< upper limit of the median's sign-test interval (the notch)
+  double lowerHinge;  ///< order statistic at depth (n+3)/4 from the bottom
+  double upperHinge;  ///< order statistic at depth (n+3)/4 from the top
+  double mean;  ///< sample mean
+  double standardDeviation;  ///< sample standard deviation (denominator n - 1)
 };
 
 /// Type-6 quantiles at 0, 0.25, 0.5, 0.75 and 1. Answers the code of

@@ -25,23 +25,25 @@ namespace v0 {
 struct VariancesTestSample {
   QEL_API VariancesTestSample();
   double variance;  ///< output
-  double lowerLimit;
-  double upperLimit;
+  double lowerLimit;  ///< simultaneous lower limit of the variance
+  double upperLimit;  ///< simultaneous upper limit of the variance
   double thirdWorkValue;   ///< kurtosis, then lower comparison limit
   double fourthWorkValue;  ///< V_i, then upper comparison limit
   double const* data;      ///< input
   unsigned int n;          ///< input
 };
 
+/// The test of equal variances over k caller-owned samples, with its
+/// results.
 struct VariancesTest {
   QEL_API VariancesTest();
   double leveneStatistic;  ///< NaN under normality
-  double levenePValue;
+  double levenePValue;  ///< P-value of Levene's test
   double mainStatistic;  ///< Bartlett or F; NaN for the comparison test with k > 2
-  double mainPValue;
-  double individualConfidence;
+  double mainPValue;  ///< P-value of the main statistic (of the multiple comparison test in the general form)
+  double individualConfidence;  ///< 1 - (1 - confidence) / k, the level of each sample's limits
   VariancesTestSample* samples;  ///< caller-owned, k of them
-  unsigned int k;
+  unsigned int k;  ///< number of samples; set by the caller
 };
 
 /// assumeNormal: chi-square limits, F (k = 2) or Bartlett's test; otherwise
