@@ -34,31 +34,35 @@
 namespace qel {
 namespace v0 {
 
+/// One binomial proportion: its interval and test.
 struct OneProportion {
+  /// Doubles NaN, counts 0.
   QEL_API OneProportion();
   double proportion;  ///< events / trials
-  double lowerLimit;
-  double upperLimit;
+  double lowerLimit;  ///< lower limit of the interval
+  double upperLimit;  ///< upper limit of the interval
   double statistic;  ///< z, where the test has one
-  double pValue;
+  double pValue;  ///< P-value of the test
   unsigned int events;  ///< input of the summary forms, output of the data forms
   unsigned int trials;  ///< always set by the caller
 };
 
+/// The difference of two proportions: its interval and tests.
 struct TwoProportion {
+  /// Doubles NaN, counts 0.
   QEL_API TwoProportion();
-  double firstProportion;
-  double secondProportion;
+  double firstProportion;  ///< firstEvents / firstTrials
+  double secondProportion;  ///< secondEvents / secondTrials
   double difference;  ///< first minus second
-  double lowerLimit;
-  double upperLimit;
+  double lowerLimit;  ///< lower limit of the interval of the difference
+  double upperLimit;  ///< upper limit of the interval of the difference
   double statistic;  ///< z
   double pValue;     ///< of the z test
   /// Fisher's exact test, written only when the hypothesised difference is
   /// exactly 0.
   double exactPValue;
-  unsigned int firstEvents;
-  unsigned int secondEvents;
+  unsigned int firstEvents;  ///< input of the summary forms, output of the data forms
+  unsigned int secondEvents;  ///< input of the summary forms, output of the data forms
   unsigned int firstTrials;   ///< set by the caller
   unsigned int secondTrials;  ///< set by the caller
 };
@@ -66,25 +70,38 @@ struct TwoProportion {
 /// events / trials as a double (NaN for 0 / 0).
 QEL_API double GetSampleProportion(unsigned int events, unsigned int trials);
 
+/// Interval from the data: events holds trials int entries whose sum is the
+/// number of events; Wald (useNormal) or Clopper-Pearson.
 QEL_API int RunLynOneProportion(OneProportion* record, int const* events, bool useNormal,
                                 double confidence, IntervalType type);
+/// Interval and test of p0 from the data; the z test (useNormal) or the exact
+/// binomial test.
 QEL_API int RunLynOneProportion(OneProportion* record, int const* events, bool useNormal,
                                 double confidence, IntervalType type,
                                 AlternativeHypothesis alternative, double p0);
+/// Interval from the summary fields events and trials.
 QEL_API int RunLynOneProportion(OneProportion* record, bool useNormal, double confidence,
                                 IntervalType type);
+/// Test of p0 only, from the summary fields.
 QEL_API int RunLynOneProportion(OneProportion* record, bool useNormal,
                                 AlternativeHypothesis alternative, double p0);
+/// Interval and test of p0 from the summary fields.
 QEL_API int RunLynOneProportion(OneProportion* record, bool useNormal, double confidence,
                                 IntervalType type, AlternativeHypothesis alternative, double p0);
 
+/// Interval from the data (trials int entries summed to the events): Wilson
+/// score (useScore) or Clopper-Pearson.
 QEL_API int RunOneProportion(OneProportion* record, int const* events, bool useScore,
                              double confidence, IntervalType type);
+/// Interval and test of p0 from the data: the z test (useScore) or the exact
+/// test.
 QEL_API int RunOneProportion(OneProportion* record, int const* events, bool useScore,
                              double confidence, IntervalType type,
                              AlternativeHypothesis alternative, double p0);
+/// Interval from the summary fields events and trials.
 QEL_API int RunOneProportion(OneProportion* record, bool useScore, double confidence,
                              IntervalType type);
+/// Interval and test of p0 from the summary fields.
 QEL_API int RunOneProportion(OneProportion* record, bool useScore, double confidence,
                              IntervalType type, AlternativeHypothesis alternative, double p0);
 
@@ -103,6 +120,7 @@ QEL_API int RunOneProportionWilson(OneProportion* record, bool continuityCorrect
 /// two-sided P-value twice the smaller tail (each tail holding x), at most 1.
 QEL_API int RunOneProportionClopperPearson(OneProportion* record, double confidence,
                                            IntervalType type);
+/// The exact binomial test of p0.
 QEL_API int RunOneProportionClopperPearson(OneProportion* record, AlternativeHypothesis alternative,
                                            double p0);
 
@@ -118,6 +136,7 @@ QEL_API int RunOneProportionAgrestiCoullCI(OneProportion* record, bool addTwoFou
 /// Mid-P interval and test (Lancaster, 1961): the exact tails less half the
 /// probability of the observed count.
 QEL_API int RunOneProportionMidP(OneProportion* record, double confidence, IntervalType type);
+/// The mid-P test of p0.
 QEL_API int RunOneProportionMidP(OneProportion* record, AlternativeHypothesis alternative,
                                  double p0);
 /// The p at which P(X >= x) - P(X = x) / 2 (lower bound) or
@@ -125,15 +144,22 @@ QEL_API int RunOneProportionMidP(OneProportion* record, AlternativeHypothesis al
 /// the lower bound is 0 for x = 0 and the upper bound 1 for x = n. NaN for
 /// n = 0 or x > n.
 QEL_API double GetLowerMidPBound(unsigned int events, unsigned int trials, double alpha);
+/// The upper mid-P bound: the p at which P(X <= x) - P(X = x) / 2 equals
+/// alpha; 1 for x = n.
 QEL_API double GetUpperMidPBound(unsigned int events, unsigned int trials, double alpha);
 
 /// Difference of two proportions: the unpooled Wald interval; the z test,
 /// pooled only when asked for and delta0 is exactly 0 (a non-zero delta0
 /// always uses the unpooled variance); Fisher's exact P-value when delta0 is
 /// exactly 0.
+///
+/// This form reads the data: first and second hold firstTrials and
+/// secondTrials int entries whose sums are the events.
 QEL_API int RunLynTwoProportion(TwoProportion* record, int const* first, int const* second,
                                 bool pooled, double confidence, IntervalType type,
                                 AlternativeHypothesis alternative, double delta0);
+/// Interval and tests from the summary fields (events and trials of each
+/// sample).
 QEL_API int RunLynTwoProportion(TwoProportion* record, bool pooled, double confidence,
                                 IntervalType type, AlternativeHypothesis alternative,
                                 double delta0);
