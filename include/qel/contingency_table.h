@@ -64,8 +64,12 @@ enum EContingencyResult : unsigned {
   kTableMHCTest = 0x800000,                ///< 4 values (see SetupMHCTest)
 };
 
+/// One two-way table and the buffers of its requested results; made by
+/// MakeIContingencyTable, freed by DeleteIContingencyTable. The calling
+/// order, the marks and the codes are in the file description.
 class IContingencyTable {
  public:
+  /// Frees the object (hosts call DeleteIContingencyTable).
   virtual ~IContingencyTable() {}
 
   /// Column c of the observed counts: `rows` values.
@@ -75,15 +79,27 @@ class IContingencyTable {
   /// Kept for the interface; no computation reads the proportions.
   virtual void SetupTestProportions(double const* proportions) = 0;
 
+  /// \name Column-wise results
   /// Column-wise results: column c of the result, `rows` values.
+  ///@{
+  /// Expected counts e = row total * column total / N.
   virtual void SetupExpectedCounts(double* column, unsigned c) = 0;
+  /// Raw residuals o - e.
   virtual void SetupRawResiduals(double* column, unsigned c) = 0;
+  /// Standardized residuals (o - e) / sqrt(e).
   virtual void SetupStandardizedResiduals(double* column, unsigned c) = 0;
+  /// Haberman's adjusted residuals (o - e) / sqrt(e (1 - column total / N)
+  /// (1 - row total / N)).
   virtual void SetupAdjustedResiduals(double* column, unsigned c) = 0;
+  /// Contributions (o - e)^2 / e to the Pearson statistic.
   virtual void SetupChisquareContributions(double* column, unsigned c) = 0;
+  /// Percentages of the column total.
   virtual void SetupColumnPercentages(double* column, unsigned c) = 0;
+  /// Percentages of the row total.
   virtual void SetupRowPercentages(double* column, unsigned c) = 0;
+  /// Percentages of the grand total.
   virtual void SetupPercentages(double* column, unsigned c) = 0;
+  ///@}
 
   virtual void SetupColumnTotals(double* result) = 0;            ///< C values
   virtual void SetupRowTotals(double* result) = 0;               ///< R values
@@ -100,6 +116,7 @@ class IContingencyTable {
   /// With b = cell (1, 0) and c = cell (0, 1): estimate (b - c) / N, lower and
   /// upper bound at 95% with a continuity term, exact binomial P-value.
   virtual void SetupMcNemarTest(double* result) = 0;
+  /// Cramer's V squared: chi-square / (N (min(R', C') - 1)).
   virtual void SetupCramerVSquare(double* result) = 0;
   /// levelMarks line up the levels of the two margins: walking with column
   /// and row index from 0, a mark of -1.0 skips a row level, 1.0 skips a
@@ -108,6 +125,7 @@ class IContingencyTable {
   virtual void SetupKappa(double const* levelMarks, double* result, unsigned markCount) = 0;
   /// Correlations on the table: index scores (Pearson), midranks (Spearman).
   virtual void SetupPearsonR(double* result) = 0;
+  /// Spearman's rho on the midranks of the margins.
   virtual void SetupSpearmanRho(double* result) = 0;
   /// lambda of rows given columns, lambda of columns given rows, tau of rows
   /// given columns, tau of columns given rows.
