@@ -56,7 +56,7 @@ enum BasicRng : int {
 /// 20003 and above failures. The warnings are named where they arise
 /// (qelWarnADPValueUpperBound in <qel/fits.h>, the sign and Mood tests); the
 /// \ref mainpage "main page" lists every code.
-///@{
+//@{
 constexpr int qelOk = 0;                         ///< success
 constexpr int qelFailRandomVariate = 20003;      ///< a random variate could not be drawn
 constexpr int qelFailNoFit = 20004;              ///< an iterative fit did not converge
@@ -71,11 +71,11 @@ constexpr int qelFailRootNoValue = 30020;        ///< root search: no function v
 constexpr int qelFailRootNoBracket = 30021;      ///< root search: no sign change
 constexpr int qelFailDegenerateData = 30023;     ///< degenerate data (all values identical)
 constexpr int qelFailSignalHandler = 99998;      ///< the SIGFPE handler could not be installed
-///@}
+//@}
 
 /// \name Markers at the exported boundary
 /// Markers at the exported boundary: NaN means "not available".
-///@{
+//@{
 /// True when x is a NaN.
 QEL_API bool IsNaN(double x);
 /// True when a result is "not available": a NaN.
@@ -86,14 +86,14 @@ QEL_API bool IsInfinity(double x);
 QEL_API bool IsPlusInfinity(double x);
 /// True for -inf.
 QEL_API bool IsMinusInfinity(double x);
-///@}
+//@}
 
 /// \name Floating-point states
 /// The two floating-point states. SetLynFpuStates arms the thread: double
 /// precision, round to nearest, traps on invalid operation, division by zero
 /// and overflow, denormal operands read as zero. ResetFpuStates restores the
 /// fixed default state (everything masked); it does not restore a saved state.
-///@{
+//@{
 /// Arms the calling thread: double precision, round to nearest, traps on
 /// invalid operation, division by zero and overflow, denormal operands read
 /// as zero.
@@ -102,7 +102,7 @@ QEL_API void SetLynFpuStates();
 /// masked); it does not restore a saved state. The recovery step after an
 /// exception from an armed call.
 QEL_API void ResetFpuStates();
-///@}
+//@}
 
 /// Installs the SIGFPE handler that turns a trap in an armed thread into a C++
 /// exception at the faulting instruction. Returns 0 or qelFailSignalHandler.

@@ -81,7 +81,7 @@ class IContingencyTable {
 
   /// \name Column-wise results
   /// Column-wise results: column c of the result, `rows` values.
-  ///@{
+  //@{
   /// Expected counts e = row total * column total / N.
   virtual void SetupExpectedCounts(double* column, unsigned c) = 0;
   /// Raw residuals o - e.
@@ -99,7 +99,7 @@ class IContingencyTable {
   virtual void SetupRowPercentages(double* column, unsigned c) = 0;
   /// Percentages of the grand total.
   virtual void SetupPercentages(double* column, unsigned c) = 0;
-  ///@}
+  //@}
 
   virtual void SetupColumnTotals(double* result) = 0;            ///< C values
   virtual void SetupRowTotals(double* result) = 0;               ///< R values

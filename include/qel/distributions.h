@@ -30,7 +30,7 @@ namespace qel {
 
 /// \name Beta
 /// Beta(a, b) on [0, 1].
-///@{
+//@{
 /// Density at x.
 QEL_API double BetaPdf(double x, double a, double b);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -44,12 +44,12 @@ QEL_API void BetaCdf(double* out, const double* x, unsigned long count, double a
                      bool upperTail);
 /// BetaInvCdf at each of count values of p, into out.
 QEL_API void BetaInvCdf(double* out, const double* p, unsigned long count, double a, double b);
-///@}
+//@}
 
 /// \name Binomial
 /// Binomial(n, p). Pdf and InvCdf take an int n, Cdf a double n.
 /// The upper tail includes the point: P(X >= x).
-///@{
+//@{
 /// Mass at x.
 QEL_API double BinomialPdf(double x, int n, double p);
 /// P(X <= x), or P(X >= x) when upperTail is true.
@@ -64,11 +64,11 @@ QEL_API void BinomialCdf(double* out, const double* x, unsigned long count, doub
 /// BinomialInvCdf at each of count values of probability, into out.
 QEL_API void BinomialInvCdf(double* out, const double* probability, unsigned long count, int n,
                             double p);
-///@}
+//@}
 
 /// \name Cauchy
 /// Cauchy(location, scale).
-///@{
+//@{
 /// Density at x.
 QEL_API double CauchyPdf(double x, double location, double scale);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -84,12 +84,12 @@ QEL_API void CauchyCdf(double* out, const double* x, unsigned long count, double
 /// CauchyInvCdf at each of count values of p, into out.
 QEL_API void CauchyInvCdf(double* out, const double* p, unsigned long count, double location,
                           double scale);
-///@}
+//@}
 
 /// \name ChiSq
 /// Chi-square with df degrees of freedom and a noncentrality (0: central).
 /// The density is that of the central law.
-///@{
+//@{
 /// Density at x.
 QEL_API double ChiSqPdf(double x, double df);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -104,11 +104,11 @@ QEL_API void ChiSqCdf(double* out, const double* x, unsigned long count, double 
 /// ChiSqInvCdf at each of count values of p, into out.
 QEL_API void ChiSqInvCdf(double* out, const double* p, unsigned long count, double df,
                          double noncentrality);
-///@}
+//@}
 
 /// \name Exponential
 /// Exponential(scale) shifted by threshold.
-///@{
+//@{
 /// Density at x.
 QEL_API double ExponentialPdf(double x, double scale, double threshold);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -124,11 +124,11 @@ QEL_API void ExponentialCdf(double* out, const double* x, unsigned long count, d
 /// ExponentialInvCdf at each of count values of p, into out.
 QEL_API void ExponentialInvCdf(double* out, const double* p, unsigned long count, double scale,
                                double threshold);
-///@}
+//@}
 
 /// \name F
 /// F(df1, df2) with a noncentrality (0: central). The density is central.
-///@{
+//@{
 /// Density at x.
 QEL_API double FPdf(double x, double df1, double df2);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -143,11 +143,11 @@ QEL_API void FCdf(double* out, const double* x, unsigned long count, double df1,
 /// FInvCdf at each of count values of p, into out.
 QEL_API void FInvCdf(double* out, const double* p, unsigned long count, double df1, double df2,
                      double noncentrality);
-///@}
+//@}
 
 /// \name Gamma
 /// Gamma(shape, scale) shifted by threshold.
-///@{
+//@{
 /// Density at x.
 QEL_API double GammaPdf(double x, double shape, double scale, double threshold);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -163,12 +163,12 @@ QEL_API void GammaCdf(double* out, const double* x, unsigned long count, double 
 /// GammaInvCdf at each of count values of p, into out.
 QEL_API void GammaInvCdf(double* out, const double* p, unsigned long count, double shape,
                          double scale, double threshold);
-///@}
+//@}
 
 /// \name Geometric
 /// Geometric: the number of trials up to the first success (negative
 /// binomial with r = 1).
-///@{
+//@{
 /// Mass at x.
 QEL_API double GeometricPdf(double x, double p);
 /// P(X <= x), or P(X >= x) when upperTail is true.
@@ -182,11 +182,11 @@ QEL_API void GeometricCdf(double* out, const double* x, unsigned long count, dou
                           bool upperTail);
 /// GeometricInvCdf at each of count values of probability, into out.
 QEL_API void GeometricInvCdf(double* out, const double* probability, unsigned long count, double p);
-///@}
+//@}
 
 /// \name HalfNormal
 /// Half-normal(scale) above location.
-///@{
+//@{
 /// Density at x.
 QEL_API double HalfNormalPdf(double x, double scale, double location);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -202,12 +202,12 @@ QEL_API void HalfNormalCdf(double* out, const double* x, unsigned long count, do
 /// HalfNormalInvCdf at each of count values of p, into out.
 QEL_API void HalfNormalInvCdf(double* out, const double* p, unsigned long count, double scale,
                               double location);
-///@}
+//@}
 
 /// \name Hypergeometric
 /// Hypergeometric: population N, M of them marked, sample n. The upper
 /// tail includes the point.
-///@{
+//@{
 /// Mass at x.
 QEL_API double HypergeometricPdf(double x, int N, int M, int n);
 /// P(X <= x), or P(X >= x) when upperTail is true.
@@ -223,11 +223,11 @@ QEL_API void HypergeometricCdf(double* out, const double* x, unsigned long count
 /// HypergeometricInvCdf at each of count values of p, into out.
 QEL_API void HypergeometricInvCdf(double* out, const double* p, unsigned long count, int N, int M,
                                   int n);
-///@}
+//@}
 
 /// \name IntegerUniform
 /// Discrete uniform on the integers lower..upper.
-///@{
+//@{
 /// Mass at x.
 QEL_API double IntegerUniformPdf(double x, int lower, int upper);
 /// P(X <= x), or P(X >= x) when upperTail is true.
@@ -243,11 +243,11 @@ QEL_API void IntegerUniformCdf(double* out, const double* x, unsigned long count
 /// IntegerUniformInvCdf at each of count values of p, into out.
 QEL_API void IntegerUniformInvCdf(double* out, const double* p, unsigned long count, int lower,
                                   int upper);
-///@}
+//@}
 
 /// \name LargestExtremeValue
 /// Largest extreme value (Gumbel) distribution.
-///@{
+//@{
 /// Density at x.
 QEL_API double LargestExtremeValuePdf(double x, double location, double scale);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -263,11 +263,11 @@ QEL_API void LargestExtremeValueCdf(double* out, const double* x, unsigned long 
 /// LargestExtremeValueInvCdf at each of count values of p, into out.
 QEL_API void LargestExtremeValueInvCdf(double* out, const double* p, unsigned long count,
                                        double location, double scale);
-///@}
+//@}
 
 /// \name Lambda
 /// Tukey's lambda distribution.
-///@{
+//@{
 /// Density at x.
 QEL_API double LambdaPdf(double x, double lambda, double location, double scale);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -283,11 +283,11 @@ QEL_API void LambdaCdf(double* out, const double* x, unsigned long count, double
 /// LambdaInvCdf at each of count values of p, into out.
 QEL_API void LambdaInvCdf(double* out, const double* p, unsigned long count, double lambda,
                           double location, double scale);
-///@}
+//@}
 
 /// \name Laplace
 /// Laplace(location, scale).
-///@{
+//@{
 /// Density at x.
 QEL_API double LaplacePdf(double x, double location, double scale);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -303,11 +303,11 @@ QEL_API void LaplaceCdf(double* out, const double* x, unsigned long count, doubl
 /// LaplaceInvCdf at each of count values of p, into out.
 QEL_API void LaplaceInvCdf(double* out, const double* p, unsigned long count, double location,
                            double scale);
-///@}
+//@}
 
 /// \name Logistic
 /// Logistic(location, scale).
-///@{
+//@{
 /// Density at x.
 QEL_API double LogisticPdf(double x, double location, double scale);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -323,11 +323,11 @@ QEL_API void LogisticCdf(double* out, const double* x, unsigned long count, doub
 /// LogisticInvCdf at each of count values of p, into out.
 QEL_API void LogisticInvCdf(double* out, const double* p, unsigned long count, double location,
                             double scale);
-///@}
+//@}
 
 /// \name LogLogistic
 /// Log-logistic: log(X - threshold) is Logistic(location, scale).
-///@{
+//@{
 /// Density at x.
 QEL_API double LogLogisticPdf(double x, double location, double scale, double threshold);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -344,11 +344,11 @@ QEL_API void LogLogisticCdf(double* out, const double* x, unsigned long count, d
 /// LogLogisticInvCdf at each of count values of p, into out.
 QEL_API void LogLogisticInvCdf(double* out, const double* p, unsigned long count, double location,
                                double scale, double threshold);
-///@}
+//@}
 
 /// \name LogNormal
 /// Log-normal: log(X - threshold) is Normal(location, scale).
-///@{
+//@{
 /// Density at x.
 QEL_API double LogNormalPdf(double x, double location, double scale, double threshold);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -365,12 +365,12 @@ QEL_API void LogNormalCdf(double* out, const double* x, unsigned long count, dou
 /// LogNormalInvCdf at each of count values of p, into out.
 QEL_API void LogNormalInvCdf(double* out, const double* p, unsigned long count, double location,
                              double scale, double threshold);
-///@}
+//@}
 
 /// \name NegBinomial
 /// Negative binomial: the number of trials up to the r-th success
 /// (support starts at r).
-///@{
+//@{
 /// Mass at x.
 QEL_API double NegBinomialPdf(double x, double p, double r);
 /// P(X <= x), or P(X >= x) when upperTail is true.
@@ -385,11 +385,11 @@ QEL_API void NegBinomialCdf(double* out, const double* x, unsigned long count, d
 /// NegBinomialInvCdf at each of count values of probability, into out.
 QEL_API void NegBinomialInvCdf(double* out, const double* probability, unsigned long count,
                                double p, double r);
-///@}
+//@}
 
 /// \name Normal
 /// Normal(mean, sigma).
-///@{
+//@{
 /// Density at x.
 QEL_API double NormalPdf(double x, double mean, double sigma);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -405,11 +405,11 @@ QEL_API void NormalCdf(double* out, const double* x, unsigned long count, double
 /// NormalInvCdf at each of count values of p, into out.
 QEL_API void NormalInvCdf(double* out, const double* p, unsigned long count, double mean,
                           double sigma);
-///@}
+//@}
 
 /// \name Poisson
 /// Poisson(mean). The upper tail includes the point.
-///@{
+//@{
 /// Mass at x.
 QEL_API double PoissonPdf(double x, double mean);
 /// P(X <= x), or P(X >= x) when upperTail is true.
@@ -423,11 +423,11 @@ QEL_API void PoissonCdf(double* out, const double* x, unsigned long count, doubl
                         bool upperTail);
 /// PoissonInvCdf at each of count values of p, into out.
 QEL_API void PoissonInvCdf(double* out, const double* p, unsigned long count, double mean);
-///@}
+//@}
 
 /// \name SmallestExtremeValue
 /// Smallest extreme value distribution.
-///@{
+//@{
 /// Density at x.
 QEL_API double SmallestExtremeValuePdf(double x, double location, double scale);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -443,11 +443,11 @@ QEL_API void SmallestExtremeValueCdf(double* out, const double* x, unsigned long
 /// SmallestExtremeValueInvCdf at each of count values of p, into out.
 QEL_API void SmallestExtremeValueInvCdf(double* out, const double* p, unsigned long count,
                                         double location, double scale);
-///@}
+//@}
 
 /// \name T
 /// Student's t with df degrees of freedom and a noncentrality (0: central).
-///@{
+//@{
 /// Density at x.
 QEL_API double TPdf(double x, double df, double noncentrality);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -463,11 +463,11 @@ QEL_API void TCdf(double* out, const double* x, unsigned long count, double df,
 /// TInvCdf at each of count values of p, into out.
 QEL_API void TInvCdf(double* out, const double* p, unsigned long count, double df,
                      double noncentrality);
-///@}
+//@}
 
 /// \name Triangular
 /// Triangular on [lower, upper] with its peak at mode.
-///@{
+//@{
 /// Density at x.
 QEL_API double TriangularPdf(double x, double lower, double mode, double upper);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -483,12 +483,12 @@ QEL_API void TriangularCdf(double* out, const double* x, unsigned long count, do
 /// TriangularInvCdf at each of count values of p, into out.
 QEL_API void TriangularInvCdf(double* out, const double* p, unsigned long count, double lower,
                               double mode, double upper);
-///@}
+//@}
 
 /// \name Uniform
 /// Uniform on [lower, upper]. Bare frame: no floating-point state change and
 /// no parameter check (lower == upper divides by zero and gives infinity).
-///@{
+//@{
 /// Density at x.
 QEL_API double UniformPdf(double x, double lower, double upper);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -504,11 +504,11 @@ QEL_API void UniformCdf(double* out, const double* x, unsigned long count, doubl
 /// UniformInvCdf at each of count values of p, into out.
 QEL_API void UniformInvCdf(double* out, const double* p, unsigned long count, double lower,
                            double upper);
-///@}
+//@}
 
 /// \name Weibull
 /// Weibull(shape, scale) shifted by threshold.
-///@{
+//@{
 /// Density at x.
 QEL_API double WeibullPdf(double x, double shape, double scale, double threshold);
 /// P(X <= x), or P(X > x) when upperTail is true.
@@ -524,12 +524,12 @@ QEL_API void WeibullCdf(double* out, const double* x, unsigned long count, doubl
 /// WeibullInvCdf at each of count values of p, into out.
 QEL_API void WeibullInvCdf(double* out, const double* p, unsigned long count, double shape,
                            double scale, double threshold);
-///@}
+//@}
 
 /// \name Discrete
 /// Discrete distribution on values with probabilities (size pairs). Bare
 /// frame. The first occurrence of a repeated value wins.
-///@{
+//@{
 /// Mass at x.
 QEL_API double DiscretePdf(double x, const double* values, const double* probabilities, int size);
 /// P(X <= x), or P(X >= x) when upperTail is true.
@@ -547,13 +547,13 @@ QEL_API void DiscreteCdf(double* out, const double* x, unsigned long count, cons
 /// DiscreteInvCdf at each of count values of p, into out.
 QEL_API void DiscreteInvCdf(double* out, const double* p, unsigned long count, const double* values,
                             const double* probabilities, int size);
-///@}
+//@}
 
 /// \name P-values and critical values
 /// P-values of test statistics (the tail or tails that the alternative
 /// names) and critical values at level alpha. TCritValue divides alpha by k
 /// (Bonferroni), TSidakCritValue uses 1 - (1 - alpha)^(1/k).
-///@{
+//@{
 /// P-value of the count x under Binomial(n, p).
 QEL_API double BinomialPValue(double x, int n, double p, EAlternative alternative);
 /// P-value of a chi-square statistic x on df degrees of freedom.
@@ -577,7 +577,7 @@ QEL_API double TCritValue(double alpha, double df, EAlternative alternative, int
 /// Critical value of t on df degrees of freedom at level 1 - (1 - alpha)^(1/k)
 /// (Sidak).
 QEL_API double TSidakCritValue(double alpha, double df, EAlternative alternative, int k);
-///@}
+//@}
 
 /// \name Studentized range
 /// Studentized range (Tukey). The Is...Possible rules mark where critical
@@ -585,7 +585,7 @@ QEL_API double TSidakCritValue(double alpha, double df, EAlternative alternative
 /// in the armed frame and return the missing value itself (not NaN) for bad
 /// arguments (k < 2, df <= 0, alpha outside (0, 1), NaN). Critical values are
 /// rounded to two decimals except for k = 2.
-///@{
+//@{
 /// True where the critical value of the studentized range of k means on df
 /// degrees of freedom at level alpha is trusted.
 QEL_API bool IsStudentizedRangePossible(int k, double df, double alpha);
@@ -599,7 +599,7 @@ QEL_API double GetStudentizedRangeCritValue(double alpha, int k, double df);
 /// The upper tail P(Q > q) of the studentized range of k means on df degrees
 /// of freedom.
 QEL_API double GetStudentizedRangePValue(double q, int k, double df);
-///@}
+//@}
 
 namespace v0 {
 
@@ -607,12 +607,12 @@ namespace v0 {
 /// The range of k independent standard normal variables: P(R <= r) or, with
 /// upperTail, P(R > r), each tail to full relative precision; and the r with
 /// P(R <= r) = p. Armed frame; NaN for k < 2, NaN arguments or p outside [0, 1).
-///@{
+//@{
 /// P(R <= r), or P(R > r) when upperTail is true.
 QEL_API double NormalRangeCdf(double r, int k, bool upperTail);
 /// The r with P(R <= r) = p.
 QEL_API double NormalRangeInvCdf(double p, int k);
-///@}
+//@}
 
 }  // namespace v0
 }  // namespace qel

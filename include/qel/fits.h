@@ -22,13 +22,13 @@ namespace qel {
 /// interpolated): the statistic lies beyond the largest tabled point and the
 /// true P-value is below the one returned; or (Weibull) below the smallest
 /// tabled point and the true P-value is above the one returned.
-///@{
+//@{
 /// Beyond the largest tabled point: the true P-value is below the one returned.
 constexpr int qelWarnADPValueUpperBound = 10003;
 /// Below the smallest tabled point (Weibull): the true P-value is above the
 /// one returned.
 constexpr int qelWarnADPValueLowerBound = 10004;
-///@}
+//@}
 
 namespace v1 {
 

@@ -101,7 +101,7 @@ struct TwoSampleT {
 /// two-sided interval, 1 [lower, +inf). The alternative is passed unchanged to
 /// the P-value: -1 less, 0 not equal, 1 greater than mu0 (delta0).
 /// Each returns 0, 30002 or (paired t) 30001, as the file description says.
-///@{
+//@{
 
 /// One-sample t interval of the mean from the n values of x.
 QEL_API int RunOneSampleT(OneSampleT* record, double const* x, double confidence,
@@ -155,7 +155,7 @@ QEL_API int RunTwoSampleT(TwoSampleT* record, bool pooled, double confidence, In
 /// Two-sample t interval and test of delta0 from the summary fields.
 QEL_API int RunTwoSampleT(TwoSampleT* record, bool pooled, double confidence, IntervalType type,
                           AlternativeHypothesis alternative, double delta0);
-///@}
+//@}
 
 }  // namespace v0
 }  // namespace qel

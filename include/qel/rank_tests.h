@@ -101,7 +101,7 @@ constexpr unsigned int kMoodFewAbove = 2;      ///< fewer values above than grou
 constexpr unsigned int kMoodFewBelow = 4;      ///< ties went up, fewer below than groups
 constexpr unsigned int kMoodNoDegrees = 8;     ///< fewer than two groups of n > 1
 constexpr unsigned int kMoodTiesMovedUp = 16;  ///< values at the median counted above
-///@}
+//@}
 
 /// Mood's median test of k groups: the 2 x k table of counts at or below and
 /// above the overall median, chi-square on (groups of n > 1) - 1 degrees of

@@ -211,12 +211,12 @@ def group(out, title, doc, declarations):
     out.append(f"/// \\name {title}")
     for line in doc.split("\n"):
         out.append("/// " + line)
-    out.append("///@{")
+    out.append("//@{")
     for text, declaration in declarations:
         for line in text.split("\n"):
             out.append("/// " + line)
         out.append(declaration)
-    out.append("///@}")
+    out.append("//@}")
 
 
 def declarations():
@@ -293,7 +293,7 @@ namespace qel {
 /// in the armed frame and return the missing value itself (not NaN) for bad
 /// arguments (k < 2, df <= 0, alpha outside (0, 1), NaN). Critical values are
 /// rounded to two decimals except for k = 2.
-///@{
+//@{
 /// True where the critical value of the studentized range of k means on df
 /// degrees of freedom at level alpha is trusted.
 QEL_API bool IsStudentizedRangePossible(int k, double df, double alpha);
@@ -307,7 +307,7 @@ QEL_API double GetStudentizedRangeCritValue(double alpha, int k, double df);
 /// The upper tail P(Q > q) of the studentized range of k means on df degrees
 /// of freedom.
 QEL_API double GetStudentizedRangePValue(double q, int k, double df);
-///@}
+//@}
 
 namespace v0 {
 
@@ -315,12 +315,12 @@ namespace v0 {
 /// The range of k independent standard normal variables: P(R <= r) or, with
 /// upperTail, P(R > r), each tail to full relative precision; and the r with
 /// P(R <= r) = p. Armed frame; NaN for k < 2, NaN arguments or p outside [0, 1).
-///@{
+//@{
 /// P(R <= r), or P(R > r) when upperTail is true.
 QEL_API double NormalRangeCdf(double r, int k, bool upperTail);
 /// The r with P(R <= r) = p.
 QEL_API double NormalRangeInvCdf(double p, int k);
-///@}
+//@}
 
 }  // namespace v0
 }  // namespace qel
