@@ -53,12 +53,12 @@ namespace deprecated {
 struct TickCalculationResult {
   /// The five doubles NaN, the count 0.
   QEL_API TickCalculationResult();
-  double firstTick;  ///< value of the first tick
-  double lastTick;  ///< value of the last tick
+  double firstTick;     ///< value of the first tick
+  double lastTick;      ///< value of the last tick
   double scaleMinimum;  ///< lower end of the axis
   double scaleMaximum;  ///< upper end of the axis
-  double increment;  ///< distance between ticks
-  int tickCount;  ///< number of ticks
+  double increment;     ///< distance between ticks
+  int tickCount;        ///< number of ticks
 };
 
 /// Finds the ticks and the extent of the axis for the data range

@@ -57,20 +57,20 @@ enum BasicRng : int {
 /// (qelWarnADPValueUpperBound in <qel/fits.h>, the sign and Mood tests); the
 /// \ref mainpage "main page" lists every code.
 //@{
-constexpr int qelOk = 0;                         ///< success
-constexpr int qelFailRandomVariate = 20003;      ///< a random variate could not be drawn
-constexpr int qelFailNoFit = 20004;              ///< an iterative fit did not converge
-constexpr int qelFailNoConvergence = 30000;      ///< an iteration or search did not converge
-constexpr int qelFailOutOfMemory = 30001;        ///< memory ran out
-constexpr int qelFailBadEnumValue = 30002;       ///< an enumeration or level out of range
+constexpr int qelOk = 0;                           ///< success
+constexpr int qelFailRandomVariate = 20003;        ///< a random variate could not be drawn
+constexpr int qelFailNoFit = 20004;                ///< an iterative fit did not converge
+constexpr int qelFailNoConvergence = 30000;        ///< an iteration or search did not converge
+constexpr int qelFailOutOfMemory = 30001;          ///< memory ran out
+constexpr int qelFailBadEnumValue = 30002;         ///< an enumeration or level out of range
 constexpr int qelFailNotPositiveDefinite = 30006;  ///< a matrix is not positive definite
-constexpr int qelFailNotImplemented = 30011;     ///< named by the interface, not provided
-constexpr int qelFailUnknownSelector = 30017;    ///< an unknown selector (type, generator)
-constexpr int qelFailSingular = 30019;           ///< a singular system: nothing could be fitted
-constexpr int qelFailRootNoValue = 30020;        ///< root search: no function value at an end
-constexpr int qelFailRootNoBracket = 30021;      ///< root search: no sign change
-constexpr int qelFailDegenerateData = 30023;     ///< degenerate data (all values identical)
-constexpr int qelFailSignalHandler = 99998;      ///< the SIGFPE handler could not be installed
+constexpr int qelFailNotImplemented = 30011;       ///< named by the interface, not provided
+constexpr int qelFailUnknownSelector = 30017;      ///< an unknown selector (type, generator)
+constexpr int qelFailSingular = 30019;             ///< a singular system: nothing could be fitted
+constexpr int qelFailRootNoValue = 30020;          ///< root search: no function value at an end
+constexpr int qelFailRootNoBracket = 30021;        ///< root search: no sign change
+constexpr int qelFailDegenerateData = 30023;       ///< degenerate data (all values identical)
+constexpr int qelFailSignalHandler = 99998;        ///< the SIGFPE handler could not be installed
 //@}
 
 /// \name Markers at the exported boundary

@@ -22,9 +22,9 @@ struct SecondSampleMoments {
   QEL_API SecondSampleMoments();
   double variance;      ///< denominator n - 1
   double sumOfSquares;  ///< raw sum of squares: n*mean*mean + (n-1)*variance
-  double mean;  ///< sample mean
-  double sum;  ///< n*mean
-  unsigned int n;  ///< number of observations; set by the caller
+  double mean;          ///< sample mean
+  double sum;           ///< n*mean
+  unsigned int n;       ///< number of observations; set by the caller
 };
 
 /// Mean: NaN for n = 0.

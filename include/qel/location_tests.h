@@ -32,11 +32,11 @@ struct OneSampleT {
   double mean;               ///< input of the summary forms
   double standardDeviation;  ///< input of the summary forms
   double standardError;      ///< of the mean
-  double lowerLimit;  ///< lower limit of the interval (-inf for an upper bound)
-  double upperLimit;  ///< upper limit of the interval (+inf for a lower bound)
-  double statistic;  ///< t
-  double pValue;  ///< P-value of the test
-  unsigned int n;  ///< number of observations; set by the caller
+  double lowerLimit;         ///< lower limit of the interval (-inf for an upper bound)
+  double upperLimit;         ///< upper limit of the interval (+inf for a lower bound)
+  double statistic;          ///< t
+  double pValue;             ///< P-value of the test
+  unsigned int n;            ///< number of observations; set by the caller
 };
 
 /// One-sample z with a known sigma. The data forms write the sample standard
@@ -47,31 +47,31 @@ struct OneSampleZ {
   double mean;               ///< input of the summary forms
   double standardDeviation;  ///< sample deviation; never read
   double standardError;      ///< sigma / sqrt(n)
-  double lowerLimit;  ///< lower limit of the interval (-inf for an upper bound)
-  double upperLimit;  ///< upper limit of the interval (+inf for a lower bound)
-  double statistic;  ///< z
-  double pValue;  ///< P-value of the test
-  unsigned int n;  ///< number of observations; set by the caller
+  double lowerLimit;         ///< lower limit of the interval (-inf for an upper bound)
+  double upperLimit;         ///< upper limit of the interval (+inf for a lower bound)
+  double statistic;          ///< z
+  double pValue;             ///< P-value of the test
+  unsigned int n;            ///< number of observations; set by the caller
 };
 
 /// Paired t on n pairs, through the differences x[i] - y[i].
 struct PairedT {
   /// Doubles NaN, counts 0.
   QEL_API PairedT();
-  double firstMean;  ///< mean of x
-  double secondMean;  ///< mean of y
-  double firstStandardDeviation;  ///< standard deviation of x
-  double secondStandardDeviation;  ///< standard deviation of y
-  double firstStandardError;  ///< standard error of the mean of x
-  double secondStandardError;  ///< standard error of the mean of y
+  double firstMean;                       ///< mean of x
+  double secondMean;                      ///< mean of y
+  double firstStandardDeviation;          ///< standard deviation of x
+  double secondStandardDeviation;         ///< standard deviation of y
+  double firstStandardError;              ///< standard error of the mean of x
+  double secondStandardError;             ///< standard error of the mean of y
   double meanDifference;                  ///< input of the summary forms
   double standardDeviationOfDifferences;  ///< input of the summary forms
-  double standardErrorOfDifferences;  ///< standard error of the mean difference
-  double lowerLimit;  ///< lower limit of the interval (-inf for an upper bound)
-  double upperLimit;  ///< upper limit of the interval (+inf for a lower bound)
-  double statistic;  ///< t
-  double pValue;  ///< P-value of the test
-  unsigned int n;  ///< number of pairs
+  double standardErrorOfDifferences;      ///< standard error of the mean difference
+  double lowerLimit;                      ///< lower limit of the interval (-inf for an upper bound)
+  double upperLimit;                      ///< upper limit of the interval (+inf for a lower bound)
+  double statistic;                       ///< t
+  double pValue;                          ///< P-value of the test
+  unsigned int n;                         ///< number of pairs
 };
 
 /// Two-sample t. Pooled: n1 + n2 - 2 degrees of freedom. Welch: the
@@ -83,17 +83,17 @@ struct TwoSampleT {
   double secondMean;               ///< input of the summary forms
   double firstStandardDeviation;   ///< input of the summary forms
   double secondStandardDeviation;  ///< input of the summary forms
-  double firstStandardError;  ///< standard error of the first mean
-  double secondStandardError;  ///< standard error of the second mean
+  double firstStandardError;       ///< standard error of the first mean
+  double secondStandardError;      ///< standard error of the second mean
   double difference;               ///< first mean - second mean
   double pooledStandardDeviation;  ///< written only when pooled
-  double degreesOfFreedom;  ///< pooled or Welch degrees of freedom
-  double lowerLimit;  ///< lower limit of the interval (-inf for an upper bound)
-  double upperLimit;  ///< upper limit of the interval (+inf for a lower bound)
-  double statistic;  ///< t
-  double pValue;  ///< P-value of the test
-  unsigned int firstN;  ///< size of the first sample; set by the caller
-  unsigned int secondN;  ///< size of the second sample; set by the caller
+  double degreesOfFreedom;         ///< pooled or Welch degrees of freedom
+  double lowerLimit;               ///< lower limit of the interval (-inf for an upper bound)
+  double upperLimit;               ///< upper limit of the interval (+inf for a lower bound)
+  double statistic;                ///< t
+  double pValue;                   ///< P-value of the test
+  unsigned int firstN;             ///< size of the first sample; set by the caller
+  unsigned int secondN;            ///< size of the second sample; set by the caller
 };
 
 /// \name Run functions

@@ -38,11 +38,11 @@ namespace v0 {
 struct OneProportion {
   /// Doubles NaN, counts 0.
   QEL_API OneProportion();
-  double proportion;  ///< events / trials
-  double lowerLimit;  ///< lower limit of the interval
-  double upperLimit;  ///< upper limit of the interval
-  double statistic;  ///< z, where the test has one
-  double pValue;  ///< P-value of the test
+  double proportion;    ///< events / trials
+  double lowerLimit;    ///< lower limit of the interval
+  double upperLimit;    ///< upper limit of the interval
+  double statistic;     ///< z, where the test has one
+  double pValue;        ///< P-value of the test
   unsigned int events;  ///< input of the summary forms, output of the data forms
   unsigned int trials;  ///< always set by the caller
 };
@@ -51,17 +51,17 @@ struct OneProportion {
 struct TwoProportion {
   /// Doubles NaN, counts 0.
   QEL_API TwoProportion();
-  double firstProportion;  ///< firstEvents / firstTrials
+  double firstProportion;   ///< firstEvents / firstTrials
   double secondProportion;  ///< secondEvents / secondTrials
-  double difference;  ///< first minus second
-  double lowerLimit;  ///< lower limit of the interval of the difference
-  double upperLimit;  ///< upper limit of the interval of the difference
-  double statistic;  ///< z
-  double pValue;     ///< of the z test
+  double difference;        ///< first minus second
+  double lowerLimit;        ///< lower limit of the interval of the difference
+  double upperLimit;        ///< upper limit of the interval of the difference
+  double statistic;         ///< z
+  double pValue;            ///< of the z test
   /// Fisher's exact test, written only when the hypothesised difference is
   /// exactly 0.
   double exactPValue;
-  unsigned int firstEvents;  ///< input of the summary forms, output of the data forms
+  unsigned int firstEvents;   ///< input of the summary forms, output of the data forms
   unsigned int secondEvents;  ///< input of the summary forms, output of the data forms
   unsigned int firstTrials;   ///< set by the caller
   unsigned int secondTrials;  ///< set by the caller

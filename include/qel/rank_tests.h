@@ -30,17 +30,17 @@ namespace v0 {
 struct MannWhitney {
   /// Outputs reset as a run resets them, sample sizes 0.
   QEL_API MannWhitney();
-  double firstMedian;  ///< median of the first sample
-  double secondMedian;  ///< median of the second sample
-  double estimate;  ///< Hodges-Lehmann shift, first minus second
-  double lowerLimit;  ///< lower limit of the interval of the shift
-  double upperLimit;  ///< upper limit of the interval of the shift
+  double firstMedian;         ///< median of the first sample
+  double secondMedian;        ///< median of the second sample
+  double estimate;            ///< Hodges-Lehmann shift, first minus second
+  double lowerLimit;          ///< lower limit of the interval of the shift
+  double upperLimit;          ///< upper limit of the interval of the shift
   double achievedConfidence;  ///< confidence the order-statistic interval reaches
-  double statistic;       ///< W: the rank sum of the first sample
-  double pValue;          ///< normal approximation with continuity correction
-  double adjustedPValue;  ///< variance adjusted for ties; -1 without ties
-  int firstN;  ///< size of the first sample; set by the caller
-  int secondN;  ///< size of the second sample; set by the caller
+  double statistic;           ///< W: the rank sum of the first sample
+  double pValue;              ///< normal approximation with continuity correction
+  double adjustedPValue;      ///< variance adjusted for ties; -1 without ties
+  int firstN;                 ///< size of the first sample; set by the caller
+  int secondN;                ///< size of the second sample; set by the caller
 };
 
 /// x holds firstN values, y secondN. confidence is a fraction in (0, 1); type
@@ -54,11 +54,11 @@ QEL_API int RunLynMannWhitney(MannWhitney* record, double const* x, double const
 /// outputs. meanRank is the group's average rank among all observations and z
 /// its standardised distance from the overall average (N + 1) / 2.
 struct KruskalWallisGroup {
-  double median;  ///< median of the group
-  double meanRank;  ///< average rank of the group among all observations
-  double z;  ///< standardised distance of meanRank from (N + 1) / 2
+  double median;       ///< median of the group
+  double meanRank;     ///< average rank of the group among all observations
+  double z;            ///< standardised distance of meanRank from (N + 1) / 2
   double const* data;  ///< the group's values (input)
-  unsigned int n;  ///< number of values (input)
+  unsigned int n;      ///< number of values (input)
 };
 
 /// Kruskal-Wallis test of k independent groups: H on k - 1 degrees of freedom
@@ -67,13 +67,13 @@ struct KruskalWallisGroup {
 struct KruskalWallis {
   /// Outputs NaN, counts 0, group pointer null.
   QEL_API KruskalWallis();
-  double statistic;  ///< H
-  double degreesOfFreedom;  ///< k - 1
-  double pValue;  ///< chi-square P-value of H
+  double statistic;            ///< H
+  double degreesOfFreedom;     ///< k - 1
+  double pValue;               ///< chi-square P-value of H
   double adjustedStatistic;    ///< NaN without ties
   double adjustedPValue;       ///< -1 without ties
   KruskalWallisGroup* groups;  ///< caller-owned, groupCount entries
-  unsigned int groupCount;  ///< number of groups; set by the caller
+  unsigned int groupCount;     ///< number of groups; set by the caller
 };
 
 /// Runs the Kruskal-Wallis test on the record's groups. Returns 0 or 30001.
@@ -83,14 +83,14 @@ QEL_API int RunLynKruskalWallis(KruskalWallis* record);
 /// (NaN until computed). The limits are the group median's sign interval at
 /// 95% with the nonlinear interpolation of Hettmansperger and Sheather.
 struct MoodGroup {
-  double countAtOrBelow;  ///< of the overall median (class of the ties)
-  double countAbove;  ///< values above the overall median
-  double median;  ///< median of the group
+  double countAtOrBelow;      ///< of the overall median (class of the ties)
+  double countAbove;          ///< values above the overall median
+  double median;              ///< median of the group
   double interquartileRange;  ///< Q3 - Q1 at positions (n + 1) / 4, 3 (n + 1) / 4
-  double lowerLimit;  ///< lower limit of the median's 95% sign interval
-  double upperLimit;  ///< upper limit of the median's 95% sign interval
-  double const* data;  ///< the group's values (input)
-  unsigned int n;  ///< number of values (input)
+  double lowerLimit;          ///< lower limit of the median's 95% sign interval
+  double upperLimit;          ///< upper limit of the median's 95% sign interval
+  double const* data;         ///< the group's values (input)
+  unsigned int n;             ///< number of values (input)
 };
 
 /// Flags of Mood's median test; any of them makes the run return 10000
@@ -110,16 +110,16 @@ constexpr unsigned int kMoodTiesMovedUp = 16;  ///< values at the median counted
 struct Mood {
   /// Outputs NaN, counts 0, group pointer null.
   QEL_API Mood();
-  double overallMedian;  ///< median of all observations
-  double statistic;  ///< chi-square
-  double degreesOfFreedom;  ///< (groups of n > 1) - 1
-  double pValue;  ///< chi-square P-value
-  double lowerLimit;  ///< median difference first - second, two groups only
-  double upperLimit;  ///< upper limit of the median difference, two groups only
+  double overallMedian;       ///< median of all observations
+  double statistic;           ///< chi-square
+  double degreesOfFreedom;    ///< (groups of n > 1) - 1
+  double pValue;              ///< chi-square P-value
+  double lowerLimit;          ///< median difference first - second, two groups only
+  double upperLimit;          ///< upper limit of the median difference, two groups only
   double achievedConfidence;  ///< confidence of the interval of the median difference
-  MoodGroup* groups;  ///< caller-owned, groupCount entries
-  unsigned int groupCount;  ///< number of groups; set by the caller
-  unsigned int flags;  ///< kMood... bits raised by the run
+  MoodGroup* groups;          ///< caller-owned, groupCount entries
+  unsigned int groupCount;    ///< number of groups; set by the caller
+  unsigned int flags;         ///< kMood... bits raised by the run
 };
 
 /// Runs Mood's median test on the record's groups. Returns 0, 10000 when a
@@ -131,7 +131,7 @@ QEL_API int RunLynMood(Mood* record);
 /// block effect plus treatment effect.
 struct FriedmanTreatment {
   double estimatedMedian;  ///< grand median plus the treatment effect
-  double rankSum;  ///< sum of the treatment's ranks within blocks
+  double rankSum;          ///< sum of the treatment's ranks within blocks
   double* column;  ///< the treatment's value in each block; overwritten with the fitted values
 };
 
@@ -142,15 +142,15 @@ struct FriedmanTreatment {
 struct Friedman {
   /// Outputs NaN, counts 0, group pointer null.
   QEL_API Friedman();
-  double grandMedian;  ///< median of the block medians of the residuals
-  double statistic;  ///< S
-  double degreesOfFreedom;  ///< k - 1
-  double pValue;  ///< chi-square P-value of S
+  double grandMedian;             ///< median of the block medians of the residuals
+  double statistic;               ///< S
+  double degreesOfFreedom;        ///< k - 1
+  double pValue;                  ///< chi-square P-value of S
   double adjustedStatistic;       ///< NaN without ties
   double adjustedPValue;          ///< -1 without ties
   FriedmanTreatment* treatments;  ///< caller-owned, treatmentCount entries
-  unsigned int blocks;  ///< number of blocks; set by the caller
-  unsigned int treatmentCount;  ///< number of treatments; set by the caller
+  unsigned int blocks;            ///< number of blocks; set by the caller
+  unsigned int treatmentCount;    ///< number of treatments; set by the caller
 };
 
 /// Runs Friedman's test on the record's treatments. Returns 0 or 30001.

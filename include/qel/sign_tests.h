@@ -22,22 +22,22 @@ namespace v0 {
 /// (x[d], x[n-d-1]), the interpolated one, and the wider (x[d-1], x[n-d]),
 /// positions counted from 1 in the sorted sample.
 struct OneSampleSign {
-  double median;  ///< sample median
-  double narrowerConfidence;  ///< achieved by the narrower row
-  double widerConfidence;     ///< achieved by the wider row
-  double narrowerLowerLimit;  ///< lower limit of the narrower row, x[d]
+  double median;                  ///< sample median
+  double narrowerConfidence;      ///< achieved by the narrower row
+  double widerConfidence;         ///< achieved by the wider row
+  double narrowerLowerLimit;      ///< lower limit of the narrower row, x[d]
   double interpolatedLowerLimit;  ///< lower limit of the interpolated row
-  double widerLowerLimit;  ///< lower limit of the wider row, x[d-1]
-  double narrowerUpperLimit;  ///< upper limit of the narrower row, x[n-d-1]
+  double widerLowerLimit;         ///< lower limit of the wider row, x[d-1]
+  double narrowerUpperLimit;      ///< upper limit of the narrower row, x[n-d-1]
   double interpolatedUpperLimit;  ///< upper limit of the interpolated row
-  double widerUpperLimit;  ///< upper limit of the wider row, x[n-d]
-  double narrowerPosition;  ///< d + 1
-  double widerPosition;     ///< d
-  double pValue;  ///< P-value of the sign test of mu0
-  double countBelow;  ///< observations below mu0
-  double countEqual;  ///< observations equal to mu0
-  double countAbove;  ///< observations above mu0
-  unsigned int n;  ///< number of observations; set by the caller
+  double widerUpperLimit;         ///< upper limit of the wider row, x[n-d]
+  double narrowerPosition;        ///< d + 1
+  double widerPosition;           ///< d
+  double pValue;                  ///< P-value of the sign test of mu0
+  double countBelow;              ///< observations below mu0
+  double countEqual;              ///< observations equal to mu0
+  double countAbove;              ///< observations above mu0
+  unsigned int n;                 ///< number of observations; set by the caller
 };
 
 /// Sets every double of the record to NaN; n is kept.
@@ -67,13 +67,13 @@ QEL_API int RunLynOneSampleSign(OneSampleSign* record, double const* x, double c
 struct OneSampleWilcoxon {
   /// Doubles NaN, n 0.
   QEL_API OneSampleWilcoxon();
-  double estimatedMedian;  ///< Hodges-Lehmann median of the Walsh averages
+  double estimatedMedian;     ///< Hodges-Lehmann median of the Walsh averages
   double achievedConfidence;  ///< confidence the interval reaches
-  double lowerLimit;  ///< lower limit of the interval
-  double upperLimit;  ///< upper limit of the interval
-  double W;  ///< signed rank sum of the observations above mu0
-  double pValue;  ///< continuity-corrected normal P-value of W
-  int n;  ///< number of observations; set by the caller
+  double lowerLimit;          ///< lower limit of the interval
+  double upperLimit;          ///< upper limit of the interval
+  double W;                   ///< signed rank sum of the observations above mu0
+  double pValue;              ///< continuity-corrected normal P-value of W
+  int n;                      ///< number of observations; set by the caller
 };
 
 /// The Hodges-Lehmann estimate and its interval from the n values of x.
@@ -94,11 +94,11 @@ namespace v1 {
 struct RunsTest {
   /// Counts 0, doubles NaN.
   QEL_API RunsTest();
-  unsigned int countBelow;  ///< observations below k
-  unsigned int countAbove;  ///< observations above k
+  unsigned int countBelow;    ///< observations below k
+  unsigned int countAbove;    ///< observations above k
   unsigned int observedRuns;  ///< number of runs
-  double expectedRuns;  ///< 2 * above * below / m + 1, m = above + below
-  double pValue;  ///< two-sided P-value
+  double expectedRuns;        ///< 2 * above * below / m + 1, m = above + below
+  double pValue;              ///< two-sided P-value
 };
 
 /// Each returns 0. With nothing but values equal to k the counts are 0 and

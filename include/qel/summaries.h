@@ -19,11 +19,11 @@ namespace v1 {
 struct FiveNumberSummary {
   /// All fields NaN.
   QEL_API FiveNumberSummary();
-  double minimum;  ///< smallest value
+  double minimum;        ///< smallest value
   double firstQuartile;  ///< type-6 quantile at 0.25
-  double median;  ///< type-6 quantile at 0.5
+  double median;         ///< type-6 quantile at 0.5
   double thirdQuartile;  ///< type-6 quantile at 0.75
-  double maximum;  ///< largest value
+  double maximum;        ///< largest value
 };
 
 /// What a boxplot needs; all NaN from the constructor. The quartiles and the
@@ -33,16 +33,16 @@ struct FiveNumberSummary {
 struct LynBoxplotHelper {
   /// All fields NaN.
   QEL_API LynBoxplotHelper();
-  double minimum;  ///< smallest value
-  double maximum;  ///< largest value
-  double firstQuartile;  ///< type-6 quantile at 0.25
-  double median;  ///< type-6 quantile at 0.5
-  double thirdQuartile;  ///< type-6 quantile at 0.75
-  double medianLowerLimit;  ///< lower limit of the median's sign-test interval (the notch)
-  double medianUpperLimit;  ///< upper limit of the median's sign-test interval (the notch)
-  double lowerHinge;  ///< order statistic at depth (n+3)/4 from the bottom
-  double upperHinge;  ///< order statistic at depth (n+3)/4 from the top
-  double mean;  ///< sample mean
+  double minimum;            ///< smallest value
+  double maximum;            ///< largest value
+  double firstQuartile;      ///< type-6 quantile at 0.25
+  double median;             ///< type-6 quantile at 0.5
+  double thirdQuartile;      ///< type-6 quantile at 0.75
+  double medianLowerLimit;   ///< lower limit of the median's sign-test interval (the notch)
+  double medianUpperLimit;   ///< upper limit of the median's sign-test interval (the notch)
+  double lowerHinge;         ///< order statistic at depth (n+3)/4 from the bottom
+  double upperHinge;         ///< order statistic at depth (n+3)/4 from the top
+  double mean;               ///< sample mean
   double standardDeviation;  ///< sample standard deviation (denominator n - 1)
 };
 

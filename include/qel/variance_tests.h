@@ -28,45 +28,45 @@ namespace v0 {
 struct OneVariance {
   /// Doubles NaN, n 0.
   QEL_API OneVariance();
-  double variance;  ///< input of the summary forms
+  double variance;             ///< input of the summary forms
   double chiSquareLowerLimit;  ///< lower limit of the variance, chi-square method
   double chiSquareUpperLimit;  ///< upper limit of the variance, chi-square method
-  double bonettLowerLimit;  ///< lower limit of the variance, Bonett's method
-  double bonettUpperLimit;  ///< upper limit of the variance, Bonett's method
-  double chiSquareStatistic;  ///< (n - 1) s^2 / variance0
-  double chiSquarePValue;  ///< P-value of the chi-square test
-  double degreesOfFreedom;  ///< n - 1
-  double bonettPValue;  ///< P-value of Bonett's test
-  unsigned int n;  ///< set by the caller
+  double bonettLowerLimit;     ///< lower limit of the variance, Bonett's method
+  double bonettUpperLimit;     ///< upper limit of the variance, Bonett's method
+  double chiSquareStatistic;   ///< (n - 1) s^2 / variance0
+  double chiSquarePValue;      ///< P-value of the chi-square test
+  double degreesOfFreedom;     ///< n - 1
+  double bonettPValue;         ///< P-value of Bonett's test
+  unsigned int n;              ///< set by the caller
 };
 
 /// Two samples: intervals and tests of the ratio sigma1 / sigma2.
 struct TwoVariance {
   /// Doubles NaN, counts 0.
   QEL_API TwoVariance();
-  double firstVariance;  ///< variance of the first sample
-  double secondVariance;  ///< variance of the second sample
-  double firstStdDevLowerLimit;  ///< chi-square limits of each deviation
-  double firstStdDevUpperLimit;  ///< upper chi-square limit of the first deviation
-  double secondStdDevLowerLimit;  ///< lower chi-square limit of the second deviation
-  double secondStdDevUpperLimit;  ///< upper chi-square limit of the second deviation
-  double bonettLowerLimit;  ///< limits of sigma1 / sigma2
-  double bonettUpperLimit;  ///< upper limit of sigma1 / sigma2, Bonett
-  double leveneLowerLimit;  ///< lower limit of the ratio, Levene-type method
-  double leveneUpperLimit;  ///< upper limit of the ratio, Levene-type method
-  double fLowerLimit;  ///< lower limit of the ratio from the F law
-  double fUpperLimit;  ///< upper limit of the ratio from the F law
-  double bonettStatistic;  ///< z^2 for equal sizes, otherwise NaN
-  double bonettPValue;  ///< P-value of Bonett's test
-  double leveneStatistic;  ///< t^2
-  double levenePValue;  ///< P-value of the Levene-type test
-  double leveneDegreesOfFreedom;  ///< degrees of freedom of the Levene-type t
-  double fStatistic;  ///< s1^2 / (ratio0^2 s2^2)
-  double fPValue;  ///< P-value of the F test
-  double fNumeratorDegreesOfFreedom;  ///< n1 - 1
+  double firstVariance;                 ///< variance of the first sample
+  double secondVariance;                ///< variance of the second sample
+  double firstStdDevLowerLimit;         ///< chi-square limits of each deviation
+  double firstStdDevUpperLimit;         ///< upper chi-square limit of the first deviation
+  double secondStdDevLowerLimit;        ///< lower chi-square limit of the second deviation
+  double secondStdDevUpperLimit;        ///< upper chi-square limit of the second deviation
+  double bonettLowerLimit;              ///< limits of sigma1 / sigma2
+  double bonettUpperLimit;              ///< upper limit of sigma1 / sigma2, Bonett
+  double leveneLowerLimit;              ///< lower limit of the ratio, Levene-type method
+  double leveneUpperLimit;              ///< upper limit of the ratio, Levene-type method
+  double fLowerLimit;                   ///< lower limit of the ratio from the F law
+  double fUpperLimit;                   ///< upper limit of the ratio from the F law
+  double bonettStatistic;               ///< z^2 for equal sizes, otherwise NaN
+  double bonettPValue;                  ///< P-value of Bonett's test
+  double leveneStatistic;               ///< t^2
+  double levenePValue;                  ///< P-value of the Levene-type test
+  double leveneDegreesOfFreedom;        ///< degrees of freedom of the Levene-type t
+  double fStatistic;                    ///< s1^2 / (ratio0^2 s2^2)
+  double fPValue;                       ///< P-value of the F test
+  double fNumeratorDegreesOfFreedom;    ///< n1 - 1
   double fDenominatorDegreesOfFreedom;  ///< n2 - 1
-  unsigned int firstN;   ///< set by the caller
-  unsigned int secondN;  ///< set by the caller
+  unsigned int firstN;                  ///< set by the caller
+  unsigned int secondN;                 ///< set by the caller
 };
 
 /// Data forms: the variance, the chi-square and Bonett intervals (and tests

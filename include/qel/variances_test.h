@@ -24,9 +24,9 @@ namespace v0 {
 /// (NaN under normality, or when n <= z).
 struct VariancesTestSample {
   QEL_API VariancesTestSample();
-  double variance;  ///< output
-  double lowerLimit;  ///< simultaneous lower limit of the variance
-  double upperLimit;  ///< simultaneous upper limit of the variance
+  double variance;         ///< output
+  double lowerLimit;       ///< simultaneous lower limit of the variance
+  double upperLimit;       ///< simultaneous upper limit of the variance
   double thirdWorkValue;   ///< kurtosis, then lower comparison limit
   double fourthWorkValue;  ///< V_i, then upper comparison limit
   double const* data;      ///< input
@@ -38,12 +38,13 @@ struct VariancesTestSample {
 struct VariancesTest {
   QEL_API VariancesTest();
   double leveneStatistic;  ///< NaN under normality
-  double levenePValue;  ///< P-value of Levene's test
-  double mainStatistic;  ///< Bartlett or F; NaN for the comparison test with k > 2
-  double mainPValue;  ///< P-value of the main statistic (of the multiple comparison test in the general form)
-  double individualConfidence;  ///< 1 - (1 - confidence) / k, the level of each sample's limits
+  double levenePValue;     ///< P-value of Levene's test
+  double mainStatistic;    ///< Bartlett or F; NaN for the comparison test with k > 2
+  double mainPValue;  ///< P-value of the main statistic (of the multiple comparison test in the
+                      ///< general form)
+  double individualConfidence;   ///< 1 - (1 - confidence) / k, the level of each sample's limits
   VariancesTestSample* samples;  ///< caller-owned, k of them
-  unsigned int k;  ///< number of samples; set by the caller
+  unsigned int k;                ///< number of samples; set by the caller
 };
 
 /// assumeNormal: chi-square limits, F (k = 2) or Bartlett's test; otherwise
