@@ -154,7 +154,8 @@ QEL_API void poisson_upper_quant(long* k, double* f, double p, double m);
 /** \name Normal
  * Normal quantiles (positive z with upper tail p; its negative).
  * @{ */
-/** The positive z with upper tail p. */
+/** Quick z with P(Z <= z) = p by AS 111 (Beasley and Springer), to about
+ * nine digits; errno 33 and -DBL_MAX for p outside (0, 1). */
 QEL_API double inv_normal_df0(double p);
 /** *z with P(Z > z) = p. */
 QEL_API void normal_upper_quant(double p, double* z);
