@@ -4,6 +4,8 @@
 set -euo pipefail
 packages=(build-essential cmake git googletest libgtest-dev libbenchmark-dev
           libboost-dev pkg-config binutils ccache)
+# Doxygen builds the API reference (the docs target), which the tests build.
+packages+=(doxygen)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")

@@ -1,5 +1,6 @@
-// Symbol visibility for libqel. The library is built with hidden visibility;
-// only declarations marked QEL_API are part of the exported surface.
+/// \file
+/// Symbol visibility for libqel. The library is built with hidden visibility;
+/// only declarations marked QEL_API are part of the exported surface.
 #ifndef QEL_EXPORT_H
 #define QEL_EXPORT_H
 

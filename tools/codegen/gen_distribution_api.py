@@ -128,6 +128,26 @@ PVALUES = [
 
 PREDICATES = ("finite", "positive", "nonNegative", "probability", "count")
 
+# Families on the integers: a mass instead of a density, an upper tail that
+# includes the point.
+DISCRETE = {"Binomial", "Geometric", "Hypergeometric", "IntegerUniform", "NegBinomial", "Poisson"}
+
+# One Doxygen line for each P-value and critical-value function.
+PVALUE_DOCS = {
+    "BinomialPValue": "P-value of the count x under Binomial(n, p).",
+    "ChiSqPValue": "P-value of a chi-square statistic x on df degrees of freedom.",
+    "ChiSqCritValue": "Critical value of the chi-square law on df degrees of freedom at level alpha.",
+    "FPValue": "P-value of an F statistic x on df1 and df2 degrees of freedom.",
+    "FCritValue": "Critical value of the F law on df1 and df2 degrees of freedom at level alpha.",
+    "HypergeometricPValue": "P-value of the count x under Hypergeometric(N, M, n).",
+    "NormalPValue": "P-value of a standard normal statistic z.",
+    "NormalCritValue": "Critical value of the standard normal law at level alpha.",
+    "TPValue": "P-value of a t statistic on df degrees of freedom.",
+    "TCritValue": "Critical value of t on df degrees of freedom at level alpha / k (Bonferroni).",
+    "TSidakCritValue": "Critical value of t on df degrees of freedom at level 1 - (1 - alpha)^(1/k)\n"
+                       "(Sidak).",
+}
+
 
 def qualified(expr):
     """The domain expression with its predicates in namespace domain."""
@@ -171,62 +191,94 @@ def function_sets(f):
     ]
 
 
+def function_docs(name, discrete, pname="p"):
+    """One Doxygen line for each of the six functions of a family, in the
+    order scalar Pdf, Cdf, InvCdf, then the array forms."""
+    upper = "P(X >= x)" if discrete else "P(X > x)"
+    return [
+        ("Mass" if discrete else "Density") + " at x.",
+        f"P(X <= x), or {upper} when upperTail is true.",
+        f"Quantile: the inverse of the lower tail at {pname}.",
+        f"{name}Pdf at each of count values of x, into out.",
+        f"{name}Cdf at each of count values of x, into out.",
+        f"{name}InvCdf at each of count values of {pname}, into out.",
+    ]
+
+
+def group(out, title, doc, declarations):
+    """A Doxygen member group: a heading, its description, the members."""
+    out.append("")
+    out.append(f"/// \\name {title}")
+    for line in doc.split("\n"):
+        out.append("/// " + line)
+    out.append("//@{")
+    for text, declaration in declarations:
+        for line in text.split("\n"):
+            out.append("/// " + line)
+        out.append(declaration)
+    out.append("//@}")
+
+
 def declarations():
     out = []
     for f in FAMILIES:
-        out.append("")
-        for line in f["doc"].split("\n"):
-            out.append("// " + line)
+        decls = []
         for suffix, params, var, tail in function_sets(f):
             ps = params + ([("bool", "upperTail")] if tail else [])
-            out.append(f"QEL_API double {f['name']}{suffix}(double {var}, {plist(ps)});")
+            decls.append(f"QEL_API double {f['name']}{suffix}(double {var}, {plist(ps)});")
         for suffix, params, var, tail in function_sets(f):
             ps = params + ([("bool", "upperTail")] if tail else [])
-            out.append(f"QEL_API void {f['name']}{suffix}(double* out, const double* {var}, "
-                       f"unsigned long count, {plist(ps)});")
-    out.append("")
-    out.append("// Discrete distribution on values with probabilities (size pairs). Bare")
-    out.append("// frame. The first occurrence of a repeated value wins.")
+            decls.append(f"QEL_API void {f['name']}{suffix}(double* out, const double* {var}, "
+                         f"unsigned long count, {plist(ps)});")
+        docs = function_docs(f["name"], f["name"] in DISCRETE, function_sets(f)[2][2])
+        group(out, f["name"], f["doc"], list(zip(docs, decls)))
     dparams = "const double* values, const double* probabilities, int size"
-    out.append(f"QEL_API double DiscretePdf(double x, {dparams});")
-    out.append(f"QEL_API double DiscreteCdf(double x, {dparams}, bool upperTail);")
-    out.append(f"QEL_API double DiscreteInvCdf(double p, {dparams});")
-    out.append(f"QEL_API void DiscretePdf(double* out, const double* x, unsigned long count, {dparams});")
-    out.append(f"QEL_API void DiscreteCdf(double* out, const double* x, unsigned long count, {dparams},\n"
-               f"                         bool upperTail);")
-    out.append(f"QEL_API void DiscreteInvCdf(double* out, const double* p, unsigned long count,\n"
-               f"                            {dparams});")
-    out.append("")
-    out.append("// P-values of test statistics (the tail or tails that the alternative")
-    out.append("// names) and critical values at level alpha. TCritValue divides alpha by k")
-    out.append("// (Bonferroni), TSidakCritValue uses 1 - (1 - alpha)^(1/k).")
-    for name, first, rest, _ in PVALUES:
-        out.append(f"QEL_API double {name}({first[0]} {first[1]}, {plist(rest)});")
+    decls = [
+        f"QEL_API double DiscretePdf(double x, {dparams});",
+        f"QEL_API double DiscreteCdf(double x, {dparams}, bool upperTail);",
+        f"QEL_API double DiscreteInvCdf(double p, {dparams});",
+        f"QEL_API void DiscretePdf(double* out, const double* x, unsigned long count, {dparams});",
+        f"QEL_API void DiscreteCdf(double* out, const double* x, unsigned long count, {dparams},\n"
+        f"                         bool upperTail);",
+        f"QEL_API void DiscreteInvCdf(double* out, const double* p, unsigned long count,\n"
+        f"                            {dparams});",
+    ]
+    group(out, "Discrete",
+          "Discrete distribution on values with probabilities (size pairs). Bare\n"
+          "frame. The first occurrence of a repeated value wins.",
+          list(zip(function_docs("Discrete", True), decls)))
+    decls = [(PVALUE_DOCS[name], f"QEL_API double {name}({first[0]} {first[1]}, {plist(rest)});")
+             for name, first, rest, _ in PVALUES]
+    group(out, "P-values and critical values",
+          "P-values of test statistics (the tail or tails that the alternative\n"
+          "names) and critical values at level alpha. TCritValue divides alpha by k\n"
+          "(Bonferroni), TSidakCritValue uses 1 - (1 - alpha)^(1/k).", decls)
     return "\n".join(out)
 
 
-HEADER = """// Exported distribution functions. GENERATED by tools/codegen/gen_distribution_api.py
-// from its family table; edit the table, not this file.
-//
-// Each family has a density (or mass), a cumulative probability and an
-// inverse, on one number and on an array. Scalar forms answer NaN when no
-// value exists. Every ...Cdf takes a final upperTail flag: false gives
-// P(X <= x), true gives the upper tail computed as a tail of its own (P(X > x)
-// for continuous laws, P(X >= x) for discrete ones), so that a tiny upper
-// tail keeps its relative accuracy.
-//
-// Array forms: output first, input second, count third, then the parameters
-// of the scalar form; one floating-point state switch serves the whole
-// column. out may equal the input array.
-//
-// Parameters outside a family's domain (a scale, sigma or df that is not
-// positive, a probability outside [0, 1], a count that is not a whole
-// number, NaN, an infinity or the missing value) give NaN, and so does a NaN
-// argument; at x = -inf or +inf a Cdf gives the limit and a Pdf 0. A Cdf is
-// in [0, 1], a Pdf >= 0, a quantile in the support; the missing value is
-// never returned. Exceptions: see the contract at RegisterLynSigfpeHandler
-// in <qel/basic_types.h> (no catch here; a host recovers with catch and
-// ResetFpuStates()).
+HEADER = """/// \\file
+/// Exported distribution functions. GENERATED by tools/codegen/gen_distribution_api.py
+/// from its family table; edit the table, not this file.
+///
+/// Each family has a density (or mass), a cumulative probability and an
+/// inverse, on one number and on an array. Scalar forms answer NaN when no
+/// value exists. Every ...Cdf takes a final upperTail flag: false gives
+/// P(X <= x), true gives the upper tail computed as a tail of its own (P(X > x)
+/// for continuous laws, P(X >= x) for discrete ones), so that a tiny upper
+/// tail keeps its relative accuracy.
+///
+/// Array forms: output first, input second, count third, then the parameters
+/// of the scalar form; one floating-point state switch serves the whole
+/// column. out may equal the input array.
+///
+/// Parameters outside a family's domain (a scale, sigma or df that is not
+/// positive, a probability outside [0, 1], a count that is not a whole
+/// number, NaN, an infinity or the missing value) give NaN, and so does a NaN
+/// argument; at x = -inf or +inf a Cdf gives the limit and a Pdf 0. A Cdf is
+/// in [0, 1], a Pdf >= 0, a quantile in the support; the missing value is
+/// never returned. Exceptions: see the contract at RegisterLynSigfpeHandler
+/// in <qel/basic_types.h> (no catch here; a host recovers with catch and
+/// ResetFpuStates()).
 #ifndef QEL_DISTRIBUTIONS_H
 #define QEL_DISTRIBUTIONS_H
 
@@ -235,6 +287,42 @@ HEADER = """// Exported distribution functions. GENERATED by tools/codegen/gen_d
 namespace qel {
 %s
 
+/// \\name Studentized range
+/// Studentized range (Tukey). The Is...Possible rules mark where critical
+/// values are trusted and are asked first. The P-value and critical value run
+/// in the armed frame and return the missing value itself (not NaN) for bad
+/// arguments (k < 2, df <= 0, alpha outside (0, 1), NaN). Critical values are
+/// rounded to two decimals except for k = 2.
+//@{
+/// True where the critical value of the studentized range of k means on df
+/// degrees of freedom at level alpha is trusted.
+QEL_API bool IsStudentizedRangePossible(int k, double df, double alpha);
+/// The same rule for the studentized maximum (that of the maximum modulus).
+QEL_API bool IsStudentizedMaximumPossible(int k, double df, double alpha);
+/// The same rule for the studentized maximum modulus.
+QEL_API bool IsStudentizedMaximumModulusPossible(int k, double df, double alpha);
+/// The q whose upper tail P(Q > q) is alpha, for k means and df degrees of
+/// freedom.
+QEL_API double GetStudentizedRangeCritValue(double alpha, int k, double df);
+/// The upper tail P(Q > q) of the studentized range of k means on df degrees
+/// of freedom.
+QEL_API double GetStudentizedRangePValue(double q, int k, double df);
+//@}
+
+namespace v0 {
+
+/// \\name Normal range
+/// The range of k independent standard normal variables: P(R <= r) or, with
+/// upperTail, P(R > r), each tail to full relative precision; and the r with
+/// P(R <= r) = p. Armed frame; NaN for k < 2, NaN arguments or p outside [0, 1).
+//@{
+/// P(R <= r), or P(R > r) when upperTail is true.
+QEL_API double NormalRangeCdf(double r, int k, bool upperTail);
+/// The r with P(R <= r) = p.
+QEL_API double NormalRangeInvCdf(double p, int k);
+//@}
+
+}  // namespace v0
 }  // namespace qel
 
 #endif
