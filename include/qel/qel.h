@@ -13,11 +13,13 @@
 #include <qel/curve_fit.h>
 #include <qel/fits.h>
 #include <qel/order_statistics.h>
+#include <qel/proportion_tests.h>
 #include <qel/rank_tests.h>
 #include <qel/random.h>
 #include <qel/sampler.h>
 #include <qel/summaries.h>
 #include <qel/tabular_gof.h>
+#include <qel/variance_tests.h>
 #include <qel/variances_test.h>
 #include <qel/axis_ticks.h>
 
