@@ -1,16 +1,17 @@
 // The floating-point call frame: the armed and default states of the x87 unit
-// and of SSE (MXCSR; the switches are in LYNFloatingPoint.h), and the SIGFPE handler that turns a trap into a C++
-// exception at the faulting instruction.
+// and of SSE (MXCSR; the switches are in LYNFloatingPoint.h), and the SIGFPE handler that turns a
+// trap into a C++ exception at the faulting instruction.
 //
 // Throwing from the handler works because the library is compiled with
 // -fnon-call-exceptions (every trapping instruction has unwind information)
 // and the kernel's signal trampoline carries CFI that lets the unwinder step
 // from the handler back into the interrupted frame.
+#include "utilities/LYNFloatingPoint.h"
+
 #include <csignal>
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/LYNFloatingPoint.h"
 
 namespace qel {
 
