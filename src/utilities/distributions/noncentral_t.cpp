@@ -59,7 +59,7 @@ constexpr double kKeptDifference = 0.25;
 constexpr double kMixtureDeltaLimit = 1.25;
 // Where the left tail of the integral starts to be squeezed, in units of
 // the squeeze's own scale.
-constexpr double kSqueeze = 4.0;
+constexpr double kSqueeze = 2.0;
 constexpr double kInvSqrt2 = 0.70710678118654752440;
 constexpr double kLnSqrtTwoOverPi = -0.22579135264472743236;  // ln sqrt(2/pi)
 
@@ -100,8 +100,9 @@ Sums mixture(const Shape& s, const Start& st, bool wantLower, bool wantUpper, do
   const double i0 = st.I * top, c0 = st.C * top, g0 = st.g * top;
   Sums sum;
 
-  // Forward: j = start, start + 1, ...
+  // Forward: j = start, start + 1, ... q is the ratio W(j + 1 + h)/W(j + h).
   double I = i0, C = c0, g = g0, w = w0, a = a0;
+  double q = L / (start + h + 1.0);
   for (long j = start, step = 0; step < kMaxSteps; ++step) {
     sum.lower += w * I;
     sum.upper += w * C;
@@ -111,21 +112,21 @@ Sums mixture(const Shape& s, const Start& st, bool wantLower, bool wantUpper, do
     g *= ratio;
     a += 1.0;
     ++j;
-    w *= L / (j + h);
+    w *= q;
     if (w == 0.0) break;
-    const double next = j + h + 1.0;
-    if (next <= L) continue;
-    // From j on the weight ratios are at most q = L/next and the ratios of
-    // the g at most R (the current one while b >= 1, where they fall; x for
-    // b < 1, where they rise towards it). I only falls, so the rest of its
-    // sum is at most w I/(1 - q); C(j + i) <= C + g (1 + R + ... + R^(i-1)),
-    // which sums to at most w (C + g q/(1 - q R))/(1 - q) while q R < 1.
-    // Compared without division by 1 - q = (next - L)/next.
-    const double q = L / next, R = b >= 1.0 ? ratio : x;
-    const double restWeight = w * next, room = kRest * (next - L);
-    const bool lowerDone = !wantLower || I * restWeight <= room * sum.lower;
+    q = L / (j + h + 1.0);
+    if (q >= 1.0) continue;
+    // From j on the weight ratios are at most q and the ratios of the g at
+    // most R (the last one while b >= 1, where they fall; x for b < 1, where
+    // they rise towards it). I only falls, so the rest of its sum is at most
+    // w I/(1 - q); C(j + i) <= C + g (1 + R + ... + R^(i-1)), which sums to
+    // at most w (C + g q/(1 - q R))/(1 - q) while q R < 1. Compared without
+    // division.
+    const double R = b >= 1.0 ? ratio : x;
+    const double room = kRest * (1.0 - q), qR = 1.0 - q * R;
+    const bool lowerDone = !wantLower || I * w <= room * sum.lower;
     const bool upperDone =
-        !wantUpper || (q * R < 1.0 && (C + g * q / (1.0 - q * R)) * restWeight <= room * sum.upper);
+        !wantUpper || (qR > 0.0 && (C * qR + g * q) * w <= room * qR * sum.upper);
     if (lowerDone && upperDone) break;
   }
 
@@ -216,8 +217,8 @@ double oppositeSignsIntegral(double t, double n, double delta) {
     return n * psi(s, em1) - 0.5 * vs * vs;
   };
   // The nodes are s = u - lambda e^((u0 - u)/lambda) for u = peak + k step,
-  // lambda = 2 sigma and u0 = peak - 4 lambda: the identity near the peak
-  // and to its right (a shift of 0.04 sigma at the peak), and a
+  // lambda = 2 sigma and u0 = peak - 2 lambda: close to the identity near
+  // the peak and to its right (a shift of 0.27 sigma at the peak), and a
   // double-exponential squeeze of the slowly (e^(n s)) decaying left tail.
   // The map is entire and keeps its direction for |Im u| < pi lambda/2, ten
   // steps, so the rule keeps its geometric convergence (Takahasi & Mori's
@@ -245,7 +246,7 @@ double oppositeSignsIntegral(double t, double n, double delta) {
       }
       const double term = e < -745.0 ? 0.0 : std::exp(e) * scale * jacobian;
       sum += term;
-      if (term <= 1e-19 * sum && (side > 0 || n * (step * k + shift) > 2.0)) break;
+      if (term <= 2e-18 * sum && (side > 0 || n * (step * k + shift) > 2.0)) break;
     }
   }
   // C/2 with C = sqrt(2m/pi) e^-stirlerr(m), m = n/2, the density constant
