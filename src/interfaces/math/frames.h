@@ -19,6 +19,9 @@
 #ifndef QEL_SRC_INTERFACES_MATH_FRAMES_H
 #define QEL_SRC_INTERFACES_MATH_FRAMES_H
 
+#include <cstdint>
+#include <cstring>
+
 #include "interfaces/math/domains.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/LYNFloatingPoint.h"
@@ -27,8 +30,13 @@
 namespace qel {
 namespace frame {
 
+// The missing value's bit pattern (mGetMissingValueCode), compared inline:
+// this runs once per element of every array form.
 inline double missingToNaN(double result) {
-  return mIsNumericMissing(result) ? mQuietNaN() : result;
+  constexpr std::uint64_t kMissingBits = 0x462F2A2831AE5ED5ULL;
+  std::uint64_t bits;
+  std::memcpy(&bits, &result, sizeof bits);
+  return bits == kMissingBits ? mQuietNaN() : result;
 }
 
 template <class Kernel, class X, class... Params>
