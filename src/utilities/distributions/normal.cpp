@@ -110,6 +110,9 @@ double mNormalCdf(double x, double mean, double sigma, bool upperTail) {
 }
 
 double mNormalInvCdf(double p, double mean, double sigma) {
+  if (elv::elvPrecision() == elv::ElvPrecision::Full && p > 0.0 && p < 1.0) {
+    return mean + sigma * elv::normalQuantile(p);
+  }
   const double z = standardNormalQuantile(p);
   if (mIsNumericMissing(z)) return z;
   return mean + sigma * z;

@@ -27,10 +27,11 @@ constexpr double kInvSqrt2 = 0.70710678118654752440;
 // Beyond this P(Z > x) is below the smallest subnormal double.
 constexpr double kTailZero = 38.6;
 
-double horner(const double* c, int n, double t) {
-  double s = c[n - 1];
-  for (int i = n - 2; i >= 0; --i) s = s * t + c[i];
-  return s;
+// c[0] + c[1] t + ... + c[7] t^7, written out: the numerator and the
+// denominator then run as two independent chains.
+double horner(const double* c, double t) {
+  return ((((((c[7] * t + c[6]) * t + c[5]) * t + c[4]) * t + c[3]) * t + c[2]) * t + c[1]) * t +
+         c[0];
 }
 
 // AS 241 coefficients, lowest power first; the denominators' leading 1 is
@@ -89,17 +90,17 @@ double normalQuantile(double p) {
   const double q = p - 0.5;
   if (std::fabs(q) <= 0.425) {
     const double r = 0.180625 - q * q;
-    return q * horner(kA, 8, r) / horner(kB, 8, r);
+    return q * horner(kA, r) / horner(kB, r);
   }
   const double small = q < 0.0 ? p : 1.0 - p;
   double r = std::sqrt(-std::log(small));
   double z;
   if (r <= 5.0) {
     r -= 1.6;
-    z = horner(kC, 8, r) / horner(kD, 8, r);
+    z = horner(kC, r) / horner(kD, r);
   } else {
     r -= 5.0;
-    z = horner(kE, 8, r) / horner(kF, 8, r);
+    z = horner(kE, r) / horner(kF, r);
   }
   return q < 0.0 ? -z : z;
 }
