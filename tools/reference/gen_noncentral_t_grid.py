@@ -103,6 +103,9 @@ BODY_T = (-8.0, -2.0, -0.7, -0.1, 0.3, 1.5, 4.0, 20.0)
 FAR = ((1e8, 5.0, 1e-20), (-1e8, 5.0, -1e-20), (-50.0, 10.0, 3.0), (-1e3, 3.0, 1.0),
        (-4.0, 30.0, 6.0), (-20.0, 2.0, 8.0), (60.0, 10.0, -2.0), (1e5, 1.0, 2.0),
        (0.2, 10.0, 15.0), (300.0, 20.0, 1.0))
+# Far tails whose integrand peaks below 1e-5 in the chi variable, where only
+# the mixture serves.
+MIXTURE_ONLY = ((-1e20, 0.5, 3.0), (-1e10, 2.5, 1.0), (3e7, 1.0, -4.0))
 # Quantiles near 1 and 0, with starting points for the root search.
 QUANTILE_STARTS = {(1 - 1e-15, 1.0, 10.0): 7.98e15, (1 - 1e-15, 10.0, 2.0): 141.4,
                    (1e-15, 10.0, 2.0): -30.0, (1e-10, 5.0, 1.0): -70.0}
@@ -123,6 +126,11 @@ def main():
         for name, a, b in (("lower", low, ref_low), ("upper", up, ref_up)):
             if b > mpf(10) ** -280:
                 assert abs(a - b) <= mpf(10) ** -18 * b, (t, n, delta, name, a, b)
+                rows.append((name, t, n, delta, b))
+    for t, n, delta in MIXTURE_ONLY:
+        low, up = tails_mixture(t, n, delta, 60)
+        for name, b in (("lower", low), ("upper", up)):
+            if b > mpf(10) ** -280:
                 rows.append((name, t, n, delta, b))
     for (p, n, delta) in QUANTILE_STARTS:
         rows.append(("inv", p, n, delta, quantile(p, n, delta)))

@@ -60,6 +60,11 @@ constexpr double kMixtureDeltaLimit = 1.25;
 // Where the left tail of the integral starts to be squeezed, in units of
 // the squeeze's own scale.
 constexpr double kSqueeze = 2.0;
+// Smallest df taken here: the peak of the integral widens like 1/df.
+constexpr double kMinDf = 0.01;
+// Below this x the tails are those at t = 0, and the backward walk's
+// division by x could overflow.
+constexpr double kTinyX = 1e-290;
 constexpr double kExpMinusSqueeze = 0.13533528323661269189;  // e^-kSqueeze
 constexpr double kLn2 = 0.69314718055994530942;
 constexpr double kInvSqrt2 = 0.70710678118654752440;
@@ -190,12 +195,13 @@ double halfMixture(const Shape& s, const Start& whole, const Start& half, bool l
   return 0.5 * (shiftSum(s, whole, lower) + shiftSum(s, half, lower));
 }
 
-// psi(s) = s - (e^(2s) - 1)/2 with e^s - 1 given. Near s = 0, where n psi
+// psi(s) = s - (e^(2s) - 1)/2 with w = e^s given. Near s = 0, where n psi
 // is a small difference of terms of size n |s| (1e9 degrees of freedom put
 // nodes at |s| ~ 1e-4, terms of 1e5), by its series
 //   psi(s) = -s^2 (1 + (2s/3)(1 + (2s/4)(1 + (2s/5)(1 + ...)))),
-// whose terms fall at least eightfold for |s| <= 1/8; elsewhere from expm1.
-double psi(double s, double em1) {
+// whose terms fall at least eightfold for |s| <= 1/8; elsewhere w - 1 is
+// exact to 9 ulp.
+double psi(double s, double w) {
   if (std::fabs(s) <= 0.125) {
     // 2/k for k = 3, ..., 18.
     static constexpr double kTwoOver[16] = {
@@ -205,7 +211,7 @@ double psi(double s, double em1) {
     for (int i = 15; i >= 0; --i) inner = 1.0 + s * kTwoOver[i] * inner;
     return -s * s * inner;
   }
-  return s - em1 * (1.0 + 0.5 * em1);
+  return s - 0.5 * (w - 1.0) * (w + 1.0);
 }
 
 // P(T <= t) for t < 0 < delta by the trapezoidal rule in s = ln S.
@@ -214,21 +220,23 @@ double oppositeSignsIntegral(double t, double n, double delta) {
   // Peak of exp(n psi(s) - v^2/2): (n + a^2) w^2 + a delta w - n = 0.
   double w;
   if (a >= 1.0) {
-    w = (2.0 * n / a) / (delta + std::sqrt(delta * delta + 4.0 * n * (n / (a * a) + 1.0)));
+    w = (2.0 * n / a) / (delta + std::sqrt(delta * delta + 4.0 * n * (n / a / a + 1.0)));
   } else {
     w = 2.0 * n / (a * delta + std::sqrt(a * a * delta * delta + 4.0 * n * (n + a * a)));
   }
   const double peak = std::log(w);
   const double v = delta + a * w;
-  const double sigma = 1.0 / std::sqrt(2.0 * n * w * w + a * a * w * w + v * a * w);
+  const double aw = a * w;
+  const double sigma = 1.0 / std::sqrt(2.0 * n * w * w + aw * aw + v * aw);
   // Finer steps for small n, where the peak is wide in s and the strip in
   // which e^(2s) keeps the integrand small is narrower against it.
   const double step = sigma * (n >= 8.0 ? 0.4 : 0.4 * std::sqrt(n / 8.0));
   auto exponent = [&](double s, double* scale) {
-    const double em1 = std::expm1(s);
-    const double vs = delta + a * (1.0 + em1);
+    // e^s itself, not 1 + expm1(s): far left of 0 the sum loses e^s.
+    const double w = std::exp(s);
+    const double vs = delta + a * w;
     *scale = erfc1(1, vs * kInvSqrt2);
-    return n * psi(s, em1) - 0.5 * vs * vs;
+    return n * psi(s, w) - 0.5 * vs * vs;
   };
   // The nodes are s = u - lambda e^((u0 - u)/lambda) for u = peak + k step,
   // lambda = 2 sigma and u0 = peak - 2 lambda: close to the identity near
@@ -274,8 +282,11 @@ double oppositeSignsIntegral(double t, double n, double delta) {
 }  // namespace
 
 bool tails(double t, double df, double delta, double* lower, double* upper) {
-  // Beyond these the walks grow long; the ELV routine answers there.
-  if (!(std::fabs(delta) <= 1000.0) || !(df > 0.0 && df <= 1e10) || !(std::fabs(t) < 1e300)) {
+  // Beyond these the walks and the integral grow long (or, for a delta
+  // whose square underflows, have no weights to walk); the ELV routine
+  // answers there.
+  if (!(std::fabs(delta) <= 1000.0 && std::fabs(delta) >= 1e-150) ||
+      !(df >= kMinDf && df <= 1e10) || !(std::fabs(t) < 1e300)) {
     return false;
   }
   const bool reflected = delta < 0.0;
@@ -300,8 +311,9 @@ bool tails(double t, double df, double delta, double* lower, double* upper) {
   if (delta == 0.0 || s.y == 0.0) return false;
   const double phiUpper =
       t >= 0.0 || s.x == 0.0 ? elv::normalUpperTail(delta) : 0.0;  // Phi(-delta)
-  if (s.x == 0.0) {
-    // t = 0, or t so small that t^2 underflows: the tails at 0.
+  if (s.x < kTinyX) {
+    // t = 0, or t so small (|t| < 1e-145 sqrt(df)) that the tails are
+    // those at 0 to double precision.
     lo = phiUpper;
     up = 1.0 - phiUpper;
   } else if (t > 0.0) {
