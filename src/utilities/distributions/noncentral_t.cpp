@@ -8,9 +8,10 @@
 // with I(a) = I_x(a, b), C(a) = 1 - I(a) and W(u) = e^-L L^u / Gamma(u + 1).
 // Both sums have positive terms, so each tail is a sum of its own and keeps
 // its relative accuracy. Following Benton & Krishnamoorthy (Computational
-// Statistics & Data Analysis 43, 2003), each sum starts near its largest
-// term with one incomplete beta ratio (TOMS 708) and walks outward in both
-// directions on the recurrences
+// Statistics & Data Analysis 43, 2003), each sum starts at the mode of the
+// weights with one incomplete beta ratio (TOMS 708; again from nearer its own
+// largest term when it comes out below 1e-250, where the start values may
+// have underflowed) and walks outward in both directions on the recurrences
 //   I(a + 1) = I(a) - g(a),  C(a + 1) = C(a) + g(a),
 //   g(a) = x^a y^b / (a B(a, b)),  g(a + 1) = g(a) x (a + b)/(a + 1),
 // each direction stopping on a bound of the rest it leaves out: the Poisson
