@@ -318,17 +318,20 @@ int main(int argc, char** argv) {
   std::map<std::string, Eval> rTable;
   for (const auto& f : table) rTable[f.first] = rmath(f.first);
   for (const char* name : {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
-                           "distribution_precision_nct.csv"}) {
+                           "distribution_precision_nct.csv", "noncentral_t_grid.csv"}) {
+    // The noncentral t grid has rows function,x,df,delta,expected.
+    const bool tGrid = std::string(name) == "noncentral_t_grid.csv";
     std::ifstream in(dir + "/" + name);
     std::string line;
     while (std::getline(in, line)) {
       if (line.empty() || line[0] == '#') continue;
       std::stringstream s(line);
-      std::string family, function, field;
-      std::getline(s, family, ',');
+      std::string family = "t", function, field;
+      if (!tGrid) std::getline(s, family, ',');
       std::getline(s, function, ',');
       std::vector<double> v;
       while (std::getline(s, field, ',')) v.push_back(std::strtod(field.c_str(), nullptr));
+      if (tGrid && v.size() == 4) v = {v[0], v[1], v[2], 0.0, 0.0, v[3]};
       const auto it = table.find(family);
       if (it == table.end() || v.size() < 6) continue;
       const double x = v[0], expected = v[5];

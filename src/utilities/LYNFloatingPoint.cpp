@@ -1,57 +1,43 @@
 // The floating-point call frame: the armed and default states of the x87 unit
-// and of SSE (MXCSR), and the SIGFPE handler that turns a trap into a C++
-// exception at the faulting instruction.
+// and of SSE (MXCSR; the switches are in LYNFloatingPoint.h), and the SIGFPE handler that turns a
+// trap into a C++ exception at the faulting instruction.
 //
 // Throwing from the handler works because the library is compiled with
 // -fnon-call-exceptions (every trapping instruction has unwind information)
 // and the kernel's signal trampoline carries CFI that lets the unwinder step
 // from the handler back into the interrupted frame.
+#include "utilities/LYNFloatingPoint.h"
+
 #include <csignal>
-#include <cstdint>
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
 
 namespace qel {
 
-namespace {
+namespace fpu {
 
-// x87 control word: IM, ZM, OM unmasked; DM, UM, PM masked; 53-bit precision;
-// round to nearest.
-constexpr std::uint16_t kArmedX87 = 0x272;
-// All exceptions masked, 64-bit precision, round to nearest.
-constexpr std::uint16_t kDefaultX87 = 0x37F;
-// MXCSR: IM, ZM, OM unmasked; DM, UM, PM masked; denormals-are-zero on.
-constexpr std::uint32_t kArmedMxcsr = 0x1940;
-// MXCSR: everything masked, DAZ and FTZ off, flags clear.
-constexpr std::uint32_t kDefaultMxcsr = 0x1F80;
+void dropX87Flags() {
+  __asm__ __volatile__("fnclex" : : : "memory");
+}
 
-}  // namespace
-
-void SetLynFpuStates() {
-  std::uint16_t cw = kArmedX87;
-  std::uint32_t csr = kArmedMxcsr;
-  // FNINIT drops any pending x87 exception before the traps are opened.
+void deliverAndDropX87Flags() {
   __asm__ __volatile__(
-      "fninit\n\t"
-      "fldcw %0\n\t"
-      "ldmxcsr %1"
+      "fwait\n\t"
+      "fnclex"
       :
-      : "m"(cw), "m"(csr)
+      :
       : "memory");
 }
 
+}  // namespace fpu
+
+void SetLynFpuStates() {
+  fpu::arm();
+}
+
 void ResetFpuStates() {
-  std::uint16_t cw = kDefaultX87;
-  std::uint32_t csr = kDefaultMxcsr;
-  __asm__ __volatile__(
-      "fwait\n\t"
-      "fnclex\n\t"
-      "fldcw %0\n\t"
-      "ldmxcsr %1"
-      :
-      : "m"(cw), "m"(csr)
-      : "memory");
+  fpu::reset();
 }
 
 void LynSigfpeHandler(int, siginfo_t* info, void*) {

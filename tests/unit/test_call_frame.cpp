@@ -52,6 +52,32 @@ TEST(FpuStates, SetAndResetLoadTheExactControlWords) {
   EXPECT_TRUE(isDefaultState());
 }
 
+std::uint16_t x87Status() {
+  std::uint16_t status;
+  __asm__ __volatile__("fnstsw %0" : "=a"(status));
+  return status;
+}
+
+// The arming switch clears the x87 flags only when one stands: a flag left by
+// masked long double arithmetic of the host must not trap once the masks open,
+// and no flag outlives the reset.
+TEST(FpuStates, StandingX87FlagsNeitherTrapNorOutliveTheFrame) {
+  volatile long double zero = 0.0L, one = 1.0L;
+  zero = zero / zero;  // invalid, masked in the default state
+  ASSERT_NE(x87Status() & 0x3F, 0);
+  qel::SetLynFpuStates();
+  one = one + one;   // the next x87 instruction: would raise the standing flag
+  one = one / 3.0L;  // inexact, masked in the armed state
+  qel::ResetFpuStates();
+  EXPECT_EQ(x87Status() & 0xFF, 0);
+  EXPECT_TRUE(isDefaultState());
+  zero = 0.0L;
+  zero = zero / zero;
+  EXPECT_EQ(qel::NormalCdf(0.5, 0.0, 1.0, false), qel::NormalCdf(-0.5, 0.0, 1.0, true));
+  EXPECT_EQ(x87Status() & 0xFF, 0);
+  EXPECT_TRUE(isDefaultState());
+}
+
 TEST(FpuStates, RegisteringTheHandlerLeavesTheDefaultState) {
   qel::SetLynFpuStates();
   ASSERT_EQ(qel::RegisterLynSigfpeHandler(), qel::qelOk);

@@ -10,8 +10,9 @@ Writes tests/data/distribution_precision.csv with rows
     family,function,x,param1,param2,param3,param4,expected
 (the layout of kernels.csv; the family builders are those of gen_kernels.py
 and gen_kernels_beta_t.py, run here over wider grids). Noncentral t tails
-are integrals over the chi-square mixing variable around the peak of the
-integrand (gen_elv_t_noncentral.py), so that far tails keep their digits.
+come from the Poisson mixture of incomplete beta ratios at a precision that
+grows with the smaller tail (gen_noncentral_t_grid.py), so that far tails keep
+their digits.
 The noncentral t rows, slow to integrate, go to
 tests/data/distribution_precision_nct.csv in a run of their own.
 Run: /usr/bin/python3 tools/reference/gen_distribution_precision.py
@@ -27,7 +28,7 @@ sys.path.insert(0, os.path.dirname(__file__))
 import gen_kernels as gk  # noqa: E402
 import gen_kernels_beta_t as gb  # noqa: E402
 import gen_elv_t_noncentral as gt  # noqa: E402
-from gen_elv_t_noncentral import tail as nct_tail  # noqa: E402
+import gen_noncentral_t_grid as gn  # noqa: E402
 from refdata import d, write_rows  # noqa: E402
 
 DATA = os.path.join(os.path.dirname(__file__), "..", "..", "tests", "data")
@@ -126,8 +127,12 @@ def student(df, delta, xs, ps):
                                    - mpmath.log(mpmath.pi * k) / 2
                                    - (k + 1) / 2 * mpmath.log1p(x * x / k))
     else:
-        low = lambda x: nct_tail(x, k, dl, False)  # noqa: E731
-        up = lambda x: nct_tail(x, k, dl, True)  # noqa: E731
+        # Both tails from the Poisson mixture at growing precision
+        # (gen_noncentral_t_grid.py): the integral over the chi variable
+        # misses the peak of its integrand once it lies below 1e-5 in that
+        # variable, as for the upper tail at t = 8e15 with df = 1.
+        low = lambda x: gn.tails_mixture(x, k, dl, 60)[0]  # noqa: E731
+        up = lambda x: gn.tails_mixture(x, k, dl, 60)[1]  # noqa: E731
         pdf = None
     inv = smaller_tail_root(low, up)
     rows = gk.rows_for("t", [df, delta], xs, [p for p in ps if not (delta == 0 and p == 0.5)],

@@ -19,23 +19,32 @@
 #ifndef QEL_SRC_INTERFACES_MATH_FRAMES_H
 #define QEL_SRC_INTERFACES_MATH_FRAMES_H
 
+#include <cstdint>
+#include <cstring>
+
 #include "interfaces/math/domains.h"
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/LYNFloatingPoint.h"
 #include "utilities/elv/limits.h"
 
 namespace qel {
 namespace frame {
 
+// The missing value's bit pattern (mGetMissingValueCode), compared inline:
+// this runs once per element of every array form.
 inline double missingToNaN(double result) {
-  return mIsNumericMissing(result) ? mQuietNaN() : result;
+  constexpr std::uint64_t kMissingBits = 0x462F2A2831AE5ED5ULL;
+  std::uint64_t bits;
+  std::memcpy(&bits, &result, sizeof bits);
+  return bits == kMissingBits ? mQuietNaN() : result;
 }
 
 template <class Kernel, class X, class... Params>
 double armed(Kernel kernel, X x, Params... params) {
   const elv::DeepTailScope deep;
-  SetLynFpuStates();
+  fpu::arm();
   const double result = kernel(x, params...);
-  ResetFpuStates();
+  fpu::reset();
   // Tested in the default state, after the reset.
   return missingToNaN(result);
 }
@@ -44,9 +53,9 @@ template <class Kernel, class... Params>
 void armedArray(Kernel kernel, double* out, const double* in, unsigned long count,
                 Params... params) {
   const elv::DeepTailScope deep;
-  SetLynFpuStates();
+  fpu::arm();
   for (unsigned long i = 0; i < count; ++i) out[i] = missingToNaN(kernel(in[i], params...));
-  ResetFpuStates();
+  fpu::reset();
 }
 
 inline void fillNaN(double* out, unsigned long count) {
@@ -59,7 +68,7 @@ template <class Kernel, class... Params>
 void checkedArmedArray(domain::Kind kind, bool upperTail, Kernel kernel, double* out,
                        const double* in, unsigned long count, Params... params) {
   const elv::DeepTailScope deep;
-  SetLynFpuStates();
+  fpu::arm();
   for (unsigned long i = 0; i < count; ++i) {
     double answer;
     const double x = in[i];
@@ -67,7 +76,7 @@ void checkedArmedArray(domain::Kind kind, bool upperTail, Kernel kernel, double*
                  ? answer
                  : missingToNaN(kernel(x, params...));
   }
-  ResetFpuStates();
+  fpu::reset();
 }
 
 template <class Kernel, class... Params>

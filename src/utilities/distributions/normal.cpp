@@ -95,12 +95,24 @@ bool mNormalCdf(double x, double mean, double sigma, double* lower, double* uppe
 }
 
 double mNormalCdf(double x, double mean, double sigma, bool upperTail) {
+  if (elv::elvPrecision() == elv::ElvPrecision::Full && !mIsNumericMissing(x) && x != mean) {
+    // One tail only: the small one straight, the large one as its
+    // complement.
+    const double z = mStandardize(x, mean, sigma);
+    if (!std::isnan(z)) {
+      const double small = elv::normalUpperTail(std::fabs(z));
+      return (z >= 0.0) == upperTail ? small : 1.0 - small;
+    }
+  }
   double lower = 0.0, upper = 0.0;
   mNormalCdf(x, mean, sigma, &lower, &upper);
   return upperTail ? upper : lower;
 }
 
 double mNormalInvCdf(double p, double mean, double sigma) {
+  if (elv::elvPrecision() == elv::ElvPrecision::Full && p > 0.0 && p < 1.0) {
+    return mean + sigma * elv::normalQuantile(p);
+  }
   const double z = standardNormalQuantile(p);
   if (mIsNumericMissing(z)) return z;
   return mean + sigma * z;

@@ -12,6 +12,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/log_gamma.h"
+#include "utilities/distributions/noncentral_t.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
@@ -131,6 +132,10 @@ bool mTCdf(double x, double df, double noncentrality, double* lower, double* upp
       const double tail = centralTFarTail(std::fabs(x), df);
       *(x < 0.0 ? lower : upper) = tail;
       *(x < 0.0 ? upper : lower) = 1.0 - tail;
+      return true;
+    }
+    if (noncentrality != 0.0 && elv::elvPrecision() == elv::ElvPrecision::Full &&
+        nct::tails(x, df, noncentrality, lower, upper)) {
       return true;
     }
     status = elv_t_ncdf(x, df, noncentrality, lower, upper);

@@ -3,10 +3,11 @@
 // Tail: P(Z > x) = erfc(x/sqrt 2)/2 = exp(-x^2/2) erfcx(x/sqrt 2)/2, with the
 // scaled complement erfcx of ACM TOMS 708 (DiDonato & Morris 1992). The
 // exponent is where a far tail loses its digits: x^2/2 near 700 carries a
-// rounding error of 700 ulp into exp. As in Cody's ANORM (ACM TOMS 715),
-// x is split into a head with four fractional bits, whose square is exact,
-// and a small rest: x^2 = h^2 + (x - h)(x + h), the second term being small
-// enough that its rounding error is negligible.
+// rounding error of 700 ulp into exp. The square is therefore carried as
+// an unevaluated sum x^2 = s + e, s = fl(x^2) and e its exact rounding error
+// from a fused multiply-add (the exact-product step of Dekker 1971 and of
+// Cody's ANORM, ACM TOMS 715, which splits x instead), and only s goes
+// through exp.
 //
 // Quantile: algorithm AS 241 (PPND16) of Wichura, Applied Statistics 37
 // (1988) 477-484, coefficients as published; rational approximations in
@@ -26,10 +27,11 @@ constexpr double kInvSqrt2 = 0.70710678118654752440;
 // Beyond this P(Z > x) is below the smallest subnormal double.
 constexpr double kTailZero = 38.6;
 
-double horner(const double* c, int n, double t) {
-  double s = c[n - 1];
-  for (int i = n - 2; i >= 0; --i) s = s * t + c[i];
-  return s;
+// c[0] + c[1] t + ... + c[7] t^7, written out: the numerator and the
+// denominator then run as two independent chains.
+double horner(const double* c, double t) {
+  return ((((((c[7] * t + c[6]) * t + c[5]) * t + c[4]) * t + c[3]) * t + c[2]) * t + c[1]) * t +
+         c[0];
 }
 
 // AS 241 coefficients, lowest power first; the denominators' leading 1 is
@@ -77,26 +79,28 @@ double normalUpperTail(double x) {
   const double z = x * kInvSqrt2;
   if (z <= 0.5) return 0.5 * erfc1(0, z);
   if (x > kTailZero) return 0.0;
-  const double head = std::trunc(x * 16.0) / 16.0;
-  const double rest = (x - head) * (x + head);
-  return 0.5 * std::exp(-0.5 * head * head) * std::exp(-0.5 * rest) * erfc1(1, z);
+  // x^2 = square + error exactly (one fused multiply-add); exp(-error/2) is
+  // 1 - error/2 to double precision, since |error| <= 2^-53 x^2 < 2e-13.
+  const double square = x * x;
+  const double error = std::fma(x, x, -square);
+  return 0.5 * std::exp(-0.5 * square) * (1.0 - 0.5 * error) * erfc1(1, z);
 }
 
 double normalQuantile(double p) {
   const double q = p - 0.5;
   if (std::fabs(q) <= 0.425) {
     const double r = 0.180625 - q * q;
-    return q * horner(kA, 8, r) / horner(kB, 8, r);
+    return q * horner(kA, r) / horner(kB, r);
   }
   const double small = q < 0.0 ? p : 1.0 - p;
   double r = std::sqrt(-std::log(small));
   double z;
   if (r <= 5.0) {
     r -= 1.6;
-    z = horner(kC, 8, r) / horner(kD, 8, r);
+    z = horner(kC, r) / horner(kD, r);
   } else {
     r -= 5.0;
-    z = horner(kE, 8, r) / horner(kF, 8, r);
+    z = horner(kE, r) / horner(kF, r);
   }
   return q < 0.0 ? -z : z;
 }

@@ -1,0 +1,19 @@
+// Both tails of the noncentral t distribution at double precision, for the
+// exported distribution functions (the ELV routine t_ncdf keeps its own
+// method and step counts).
+#ifndef QEL_SRC_UTILITIES_DISTRIBUTIONS_NONCENTRAL_T_H
+#define QEL_SRC_UTILITIES_DISTRIBUTIONS_NONCENTRAL_T_H
+
+namespace qel {
+namespace nct {
+
+// P(T <= t) and P(T > t) for T noncentral t with df > 0 degrees of freedom
+// and noncentrality delta (finite, not NaN; t finite). False, with nothing
+// stored, for parameters outside the range this method covers (the caller
+// falls back on the ELV routine there).
+bool tails(double t, double df, double delta, double* lower, double* upper);
+
+}  // namespace nct
+}  // namespace qel
+
+#endif
