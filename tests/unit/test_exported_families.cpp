@@ -174,6 +174,20 @@ TEST(ExportedFamilies, DoublePrecisionFromBodyToFarTails) {
   EXPECT_GT(rows.size(), 1400u);
 }
 
+// Beyond x = 8 the normal tail is the nearest double to the truth, in both
+// the scalar and the array forms and from either side of the distribution.
+TEST(ExportedFamilies, NormalFarTailIsCorrectlyRounded) {
+  const auto rows = qeltest::loadReferenceData("elv_normal_far_tail.csv", 0);
+  for (const auto& row : rows) {
+    const double x = row.numbers[0], expected = row.numbers[1];
+    double array = 0.0;
+    qel::NormalCdf(&array, &x, 1, 0.0, 1.0, true);
+    EXPECT_EQ(qel::NormalCdf(-x, 0.0, 1.0, false), expected) << x;
+    EXPECT_EQ(array, expected) << x;
+  }
+  EXPECT_GT(rows.size(), 50u);
+}
+
 TEST(ExportedFamilies, ArrayFormsRepeatTheScalarForms) {
   const std::vector<double> x = {-2.0, 0.0, 0.3, 1.0, 2.5, 7.0, 1.23456e30};
   const std::vector<double> p = {0.0, 1e-6, 0.25, 0.5, 0.9, 1.0};

@@ -1,6 +1,6 @@
 """Reference data for the ELV normal, central t and hypergeometric routines.
 
-Writes tests/data/elv_normal.csv, elv_normal_quantiles.csv, elv_t_central.csv,
+Writes tests/data/elv_normal.csv, elv_normal_quantiles.csv, elv_normal_far_tail.csv, elv_t_central.csv,
 elv_t_quantiles.csv, elv_hypergeo.csv and elv_hypergeo_quantiles.csv.
 Run with /usr/bin/python3 (mpmath) from the repository root.
 """
@@ -54,6 +54,23 @@ def gen_normal():
     for p in ps:
         rows.append([repr(p), normal_upper_quantile(p)])
     write_rows(os.path.join(OUT, "elv_normal_quantiles.csv"), "p,z (P(Z > z) = p)", rows)
+
+
+def gen_normal_far_tail():
+    """P(Z > x) rounded to the nearest double, for x in [8, 38.4]; points whose
+    truth lies within 0.02 ulp of a tie between two doubles are left out."""
+    rows = []
+    for i in range(59):
+        x = 8.0 + i * 0.5049
+        t = normal_tails(x)[1]
+        v = float(t)
+        below, above = math.nextafter(v, 0.0), math.nextafter(v, 1.0)
+        side = above if t > mpf(v) else below
+        if abs(t - mpf(v)) > mpf("0.48") * abs(mpf(side) - mpf(v)):
+            continue
+        rows.append([repr(x), repr(v)])
+    write_rows(os.path.join(OUT, "elv_normal_far_tail.csv"), "x,P(Z > x) to the nearest double",
+               rows)
 
 
 def t_two_sided_by_quadrature(t, df):
@@ -252,6 +269,7 @@ if __name__ == "__main__":
     which = sys.argv[1:] or ["normal", "t", "hyper"]
     if "normal" in which:
         gen_normal()
+        gen_normal_far_tail()
     if "t" in which:
         gen_t_central()
     if "hyper" in which:
