@@ -40,6 +40,10 @@ PVALUE_TARGETS = {
 }
 
 
+# Submodule names that are Python keywords.
+MODULE_NAMES = {"lambda": "lambda_"}
+
+
 def py_name(name):
     return PY_NAMES.get(name, name)
 
@@ -75,7 +79,7 @@ def cxx_args(params):
 
 def family_bindings(f):
     nm = f["name"]
-    out = [f'{{  // {nm}', f'  py::module_ m = parent.def_submodule("{nm.lower()}", {doc_literal(f["doc"])});']
+    out = [f'{{  // {nm}', f'  py::module_ m = parent.def_submodule("{MODULE_NAMES.get(nm.lower(), nm.lower())}", {doc_literal(f["doc"])});']
     for suffix, params, var, tail in api.function_sets(f):
         pyfn = {"Pdf": "pdf", "Cdf": "cdf", "InvCdf": "inv"}[suffix]
         tail_param = ", bool upper" if tail else ""
