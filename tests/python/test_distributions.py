@@ -83,7 +83,7 @@ def test_contiguous_float64_input_is_not_copied():
 
 
 def test_gil_is_released_during_a_call():
-    x = np.linspace(-10, 10, 400_000)
+    x = np.linspace(-10, 10, 10_000)
     ticks = []
 
     def worker():
