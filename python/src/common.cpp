@@ -6,7 +6,9 @@ namespace qelpy {
 
 namespace {
 
-std::string dtypeName(const py::array& a) { return py::str(a.dtype()).cast<std::string>(); }
+std::string dtypeName(const py::array& a) {
+  return py::str(a.dtype()).cast<std::string>();
+}
 
 // The numbers of a numeric array as float64, or a TypeError. Strings,
 // objects, complex and booleans are refused: silently reading True as 1.0
@@ -99,7 +101,9 @@ std::vector<Doubles> columns(py::handle obj, const char* name, std::size_t minim
   return out;
 }
 
-unsigned count(const Doubles& a) { return static_cast<unsigned>(a.size()); }
+unsigned count(const Doubles& a) {
+  return static_cast<unsigned>(a.size());
+}
 
 py::object evaluate(py::handle x, py::handle out, const ScalarFn& one, const ArrayFn& many) {
   if (out.is_none() && isScalar(x)) {
@@ -145,8 +149,7 @@ qel::AlternativeHypothesis alternativeOf(const std::string& name) {
   if (name == "two-sided") return qel::kAlternativeNotEqual;
   if (name == "less") return qel::kAlternativeLess;
   if (name == "greater") return qel::kAlternativeGreater;
-  throw py::value_error("alternative must be 'less', 'greater' or 'two-sided', not '" + name +
-                        "'");
+  throw py::value_error("alternative must be 'less', 'greater' or 'two-sided', not '" + name + "'");
 }
 
 qel::IntervalType intervalOf(py::handle interval, qel::AlternativeHypothesis alternative) {

@@ -30,9 +30,10 @@ struct DiscreteLaw {
 };
 
 void registerDiscrete(py::module_& parent) {
-  py::module_ m = parent.def_submodule(
-      "discrete", "Discrete law on given values with given probabilities; the first "
-                  "occurrence of a repeated value wins.");
+  py::module_ m =
+      parent.def_submodule("discrete",
+                           "Discrete law on given values with given probabilities; the first "
+                           "occurrence of a repeated value wins.");
   m.def(
       "pdf",
       [](py::handle x, py::handle values, py::handle probabilities, py::handle out) {
@@ -42,7 +43,9 @@ void registerDiscrete(py::module_& parent) {
         const int n = law.size();
         return evaluate(
             x, out, [=](double a) { return qel::DiscretePdf(a, v, p, n); },
-            [=](double* o, const double* i, unsigned long c) { qel::DiscretePdf(o, i, c, v, p, n); });
+            [=](double* o, const double* i, unsigned long c) {
+              qel::DiscretePdf(o, i, c, v, p, n);
+            });
       },
       py::arg("x"), py::arg("values"), py::arg("probabilities"), py::kw_only(),
       py::arg("out") = py::none());
@@ -80,7 +83,9 @@ void registerDiscrete(py::module_& parent) {
 
 // The library answers its missing value for arguments it refuses; Python
 // sees NaN.
-double missingAsNaN(double v) { return qel::IsResultNA(v) ? kNaN : v; }
+double missingAsNaN(double v) {
+  return qel::IsResultNA(v) ? kNaN : v;
+}
 
 void registerRanges(py::module_& parent) {
   py::module_ s = parent.def_submodule(
@@ -108,8 +113,8 @@ void registerRanges(py::module_& parent) {
   s.def("is_maximum_modulus_possible", &qel::IsStudentizedMaximumModulusPossible, py::arg("k"),
         py::arg("df"), py::arg("alpha"));
 
-  py::module_ r = parent.def_submodule(
-      "normal_range", "Range of k independent standard normal variables.");
+  py::module_ r =
+      parent.def_submodule("normal_range", "Range of k independent standard normal variables.");
   r.def(
       "cdf",
       [](py::handle x, int k, bool upper, py::handle out) {

@@ -12,7 +12,9 @@ namespace qelpy {
 
 namespace {
 
-py::object f(double v) { return py::float_(v); }
+py::object f(double v) {
+  return py::float_(v);
+}
 
 enum class Law { Normal, LogNormal, Exponential, Weibull };
 
@@ -26,7 +28,9 @@ Law lawOf(const std::string& name) {
 }
 
 // Parameters of a law: one for the exponential, two otherwise.
-std::size_t parameterCount(Law law) { return law == Law::Exponential ? 1 : 2; }
+std::size_t parameterCount(Law law) {
+  return law == Law::Exponential ? 1 : 2;
+}
 
 qel::PlottingMethod methodOf(const std::string& name) {
   if (name == "median") return qel::kPlotMedianRank;
@@ -67,12 +71,14 @@ py::object probabilityPlot(py::handle x, const std::string& dist, const std::str
   });
   check(code);
   const std::size_t k = parameterCount(law);
-  return result("ProbabilityPlot",
-                {{"x", toArray(s.data(), n)}, {"probabilities", toArray(probabilities.data(), n)},
-                 {"scores", toArray(scores.data(), n)},
-                 {"parameters", toArray(parameters.data(), k)},
-                 {"covariances", toArray(covariances.data(), k == 1 ? 1 : 3)},
-                 {"ad_statistic", f(ad)}, {"ad_p_value", f(p)}, {"status", py::int_(code)}});
+  return result("ProbabilityPlot", {{"x", toArray(s.data(), n)},
+                                    {"probabilities", toArray(probabilities.data(), n)},
+                                    {"scores", toArray(scores.data(), n)},
+                                    {"parameters", toArray(parameters.data(), k)},
+                                    {"covariances", toArray(covariances.data(), k == 1 ? 1 : 3)},
+                                    {"ad_statistic", f(ad)},
+                                    {"ad_p_value", f(p)},
+                                    {"status", py::int_(code)}});
 }
 
 py::object andersonDarling(py::handle x, const std::string& dist, py::handle parameters) {
@@ -124,20 +130,20 @@ py::object fit(py::handle x, const std::string& dist) {
   return toArray(parameters, parameterCount(law));
 }
 
-py::object curveFit(py::handle x, py::handle y, unsigned degree, bool intercept,
-                    double tolerance) {
+py::object curveFit(py::handle x, py::handle y, unsigned degree, bool intercept, double tolerance) {
   Doubles a = column(x, "x"), b = column(y, "y");
   if (a.size() != b.size()) throw py::value_error("x and y must have the same length");
   std::vector<double> coefficients(degree + 2, kNaN);
   double r2 = kNaN;
   const int code = released([&] {
-    return qel::v1::RunLynGrCurveFit(coefficients.data(), &r2, a.data(), b.data(), count(a),
-                                     degree, tolerance, intercept);
+    return qel::v1::RunLynGrCurveFit(coefficients.data(), &r2, a.data(), b.data(), count(a), degree,
+                                     tolerance, intercept);
   });
   check(code);
   return result("CurveFit", {{"coefficients", toArray(coefficients.data(), degree + 1)},
                              {"residual_sd", f(coefficients[degree + 1])},
-                             {"r_squared", f(r2)}, {"status", py::int_(code)}});
+                             {"r_squared", f(r2)},
+                             {"status", py::int_(code)}});
 }
 
 using Pair = std::pair<double, double>;
@@ -152,9 +158,11 @@ py::object ticks(double low, double high, std::pair<int, int> count, Pair below,
   });
   std::vector<double> marks;
   for (int i = 0; i < r.tickCount; ++i) marks.push_back(r.firstTick + i * r.increment);
-  return result("Ticks", {{"first", f(r.firstTick)}, {"last", f(r.lastTick)},
+  return result("Ticks", {{"first", f(r.firstTick)},
+                          {"last", f(r.lastTick)},
                           {"scale_minimum", f(r.scaleMinimum)},
-                          {"scale_maximum", f(r.scaleMaximum)}, {"increment", f(r.increment)},
+                          {"scale_maximum", f(r.scaleMaximum)},
+                          {"increment", f(r.increment)},
                           {"count", py::int_(r.tickCount)},
                           {"ticks", toArray(marks.data(), marks.size())}});
 }
@@ -167,25 +175,27 @@ void registerFits(py::module_& m) {
         "Probability-plot data of a sample (sorted here): plotting positions, scores, fitted "
         "parameters with their covariances, and the Anderson-Darling statistic and P-value "
         "(status 10003/10004 when the P-value is a bound).");
-  m.def("anderson_darling", &andersonDarling, py::arg("x"), py::arg("dist"),
-        py::arg("parameters"),
+  m.def("anderson_darling", &andersonDarling, py::arg("x"), py::arg("dist"), py::arg("parameters"),
         "Anderson-Darling test against the law with given parameters (normal, lognormal: "
         "location and scale; exponential: the mean; weibull: shape and scale).");
   m.def("fit", &fit, py::arg("x"), py::arg("dist") = "normal",
         "Maximum-likelihood parameters of normal, lognormal, exponential or weibull.");
-  m.def("plotting_positions", [](unsigned n, const std::string& method) {
-    std::vector<double> p(n);
-    check(qel::v1::CreatePointProbabilities(p.data(), n, methodOf(method)));
-    return toArray(p.data(), n);
-  }, py::arg("n"), py::arg("method") = "median");
+  m.def(
+      "plotting_positions",
+      [](unsigned n, const std::string& method) {
+        std::vector<double> p(n);
+        check(qel::v1::CreatePointProbabilities(p.data(), n, methodOf(method)));
+        return toArray(p.data(), n);
+      },
+      py::arg("n"), py::arg("method") = "median");
   m.def("curve_fit", &curveFit, py::arg("x"), py::arg("y"), py::arg("degree") = 1u,
         py::arg("intercept") = true, py::arg("tolerance") = 1e-12,
         "Least-squares polynomial: coefficients from the intercept (0 without it) up; "
         "collinear terms NaN.");
   m.def("ticks", &ticks, py::arg("low"), py::arg("high"), py::arg("count") = std::make_pair(4, 11),
         py::arg("below") = Pair(0.0, 0.05), py::arg("above") = Pair(0.0, 0.05),
-        py::arg("limits") = Pair(-std::numeric_limits<double>::infinity(),
-                                 std::numeric_limits<double>::infinity()),
+        py::arg("limits") =
+            Pair(-std::numeric_limits<double>::infinity(), std::numeric_limits<double>::infinity()),
         py::arg("tick_margins") = Pair(0.5, 0.5),
         "Ticks and extent of a graph axis for data from low to high.");
 }

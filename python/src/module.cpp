@@ -2,8 +2,9 @@
 #include "common.h"
 
 PYBIND11_MODULE(_qel, m) {
-  m.doc() = "libqel: distributions with accurate far tails, sampling, descriptive "
-            "statistics, tests and intervals, contingency tables.";
+  m.doc() =
+      "libqel: distributions with accurate far tails, sampling, descriptive "
+      "statistics, tests and intervals, contingency tables.";
   // A floating-point trap inside the library becomes a C++ exception that
   // the kernels catch; without the handler it would end the interpreter.
   if (qel::RegisterLynSigfpeHandler() != qel::qelOk) {

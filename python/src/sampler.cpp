@@ -56,9 +56,8 @@ class Sampler {
     const double* vd = v.data();
     const double* pd = p.data();
     const unsigned k = count(v);
-    return draws(n, [=](qel::ISampler& s, double* o, unsigned m) {
-      return s.Discrete(o, m, vd, pd, k);
-    });
+    return draws(
+        n, [=](qel::ISampler& s, double* o, unsigned m) { return s.Discrete(o, m, vd, pd, k); });
   }
 
   // Rows of a (n, dimension) array: observations of the multivariate normal.
@@ -76,15 +75,15 @@ class Sampler {
     for (std::size_t i = 0; i < d; ++i) {
       for (std::size_t j = 0; j <= i; ++j) packed.push_back(cov.data()[i * d + j]);
     }
-    py::array_t<double> out({static_cast<py::ssize_t>(checkedCount(n)),
-                             static_cast<py::ssize_t>(d)});
+    py::array_t<double> out(
+        {static_cast<py::ssize_t>(checkedCount(n)), static_cast<py::ssize_t>(d)});
     std::vector<double*> rows(static_cast<std::size_t>(n));
     for (std::size_t i = 0; i < rows.size(); ++i) rows[i] = out.mutable_data() + i * d;
     const double* m = mu.data();
     const int code = released([&] {
       std::lock_guard<std::mutex> lock(mutex_);
-      return sampler_->MvNormal(rows.data(), static_cast<unsigned>(n),
-                                static_cast<unsigned>(d), m, packed.data());
+      return sampler_->MvNormal(rows.data(), static_cast<unsigned>(n), static_cast<unsigned>(d), m,
+                                packed.data());
     });
     check(code);
     return out;
@@ -120,7 +119,7 @@ class Sampler {
 using S = qel::ISampler;
 
 // Binds method `name` drawing n values of a family with parameters Args.
-#define QEL_DRAW(name, call, ...)                                          \
+#define QEL_DRAW(name, call, ...)                                            \
   cls.def(                                                                 \
       name,                                                                \
       [](Sampler& self, long long n, __VA_ARGS__) {                        \
@@ -197,8 +196,8 @@ void registerSampler(py::module_& m) {
       py::arg("a") = 1.0, py::arg("b") = 1.0);
   QEL_DRAW("rayleigh", s.Rayleigh(o, m, a, b), double a, double b), py::arg("n"),
       py::arg("a") = 1.0, py::arg("b") = 1.0);
-  cls.def("discrete", &Sampler::discrete, py::arg("n"), py::arg("values"),
-          py::arg("probabilities"), "n draws from values with the given relative weights.");
+  cls.def("discrete", &Sampler::discrete, py::arg("n"), py::arg("values"), py::arg("probabilities"),
+          "n draws from values with the given relative weights.");
   cls.def("mvnormal", &Sampler::mvnormal, py::arg("n"), py::arg("mean"), py::arg("covariance"),
           "n observations (rows) of the multivariate normal law.");
   cls.def("random_sample", &Sampler::randomSample, py::arg("population"), py::arg("n"),

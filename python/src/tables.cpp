@@ -14,7 +14,9 @@ namespace qelpy {
 
 namespace {
 
-py::object f(double v) { return py::float_(v); }
+py::object f(double v) {
+  return py::float_(v);
+}
 
 struct Request {
   const char* name;
@@ -143,8 +145,10 @@ py::object contingencyTable(py::handle counts, py::handle want, py::handle kappa
   std::vector<CellResult> cells = {
       {"expected", qel::kTableExpectedCounts, &T::SetupExpectedCounts, {}},
       {"residuals", qel::kTableRawResiduals, &T::SetupRawResiduals, {}},
-      {"standardized_residuals", qel::kTableStandardizedResiduals,
-       &T::SetupStandardizedResiduals, {}},
+      {"standardized_residuals",
+       qel::kTableStandardizedResiduals,
+       &T::SetupStandardizedResiduals,
+       {}},
       {"adjusted_residuals", qel::kTableAdjustedResiduals, &T::SetupAdjustedResiduals, {}},
       {"contributions", qel::kTableChisquareContributions, &T::SetupChisquareContributions, {}},
       {"column_percentages", qel::kTableColumnPercentages, &T::SetupColumnPercentages, {}},
@@ -194,8 +198,7 @@ py::object contingencyTable(py::handle counts, py::handle want, py::handle kappa
   };
   add(qel::kTableColumnTotals, {{"column_totals", toArray(colTotals.data(), C)}});
   add(qel::kTableRowTotals, {{"row_totals", toArray(rowTotals.data(), R)}});
-  add(qel::kTableColumnTotalPercentages,
-      {{"column_total_percentages", toArray(colPct.data(), C)}});
+  add(qel::kTableColumnTotalPercentages, {{"column_total_percentages", toArray(colPct.data(), C)}});
   add(qel::kTableRowTotalPercentages, {{"row_total_percentages", toArray(rowPct.data(), R)}});
   add(qel::kTableGrandTotal, {{"total", f(total)}});
   add(qel::kTablePearsonChisquare,
@@ -205,22 +208,27 @@ py::object contingencyTable(py::handle counts, py::handle want, py::handle kappa
   // -2 marks a 2 x 2 test on a table of another shape: NaN in Python.
   auto twoByTwo = [](double p) { return p == -2.0 ? kNaN : p; };
   add(qel::kTableFisherExact, {{"fisher_p_value", f(twoByTwo(fisher))}});
-  add(qel::kTableMcNemar,
-      {{"mcnemar_estimate", f(mcnemar[0])}, {"mcnemar_lower_limit", f(mcnemar[1])},
-       {"mcnemar_upper_limit", f(mcnemar[2])}, {"mcnemar_p_value", f(twoByTwo(mcnemar[3]))}});
+  add(qel::kTableMcNemar, {{"mcnemar_estimate", f(mcnemar[0])},
+                           {"mcnemar_lower_limit", f(mcnemar[1])},
+                           {"mcnemar_upper_limit", f(mcnemar[2])},
+                           {"mcnemar_p_value", f(twoByTwo(mcnemar[3]))}});
   add(qel::kTableCramerVSquare, {{"cramer_v_square", f(cramer)}});
   add(qel::kTableKappa, {{"kappa", f(kappa)}});
   add(qel::kTablePearsonR, {{"pearson_r", f(pearson)}});
   add(qel::kTableSpearmanRho, {{"spearman_rho", f(spearman)}});
-  add(qel::kTableGoodmanKruskal,
-      {{"lambda_rows", f(gk[0])}, {"lambda_columns", f(gk[1])}, {"tau_rows", f(gk[2])},
-       {"tau_columns", f(gk[3])}});
-  add(qel::kTableMeasuresOfConcordance,
-      {{"concordant", f(concordance[0])}, {"discordant", f(concordance[1])},
-       {"tied", f(concordance[2])}, {"pairs", f(concordance[3])},
-       {"somers_d_rows", f(concordance[4])}, {"somers_d_columns", f(concordance[5])},
-       {"gamma", f(concordance[6])}, {"tau_b", f(concordance[7])},
-       {"tau_b_p_value", f(concordance[8])}});
+  add(qel::kTableGoodmanKruskal, {{"lambda_rows", f(gk[0])},
+                                  {"lambda_columns", f(gk[1])},
+                                  {"tau_rows", f(gk[2])},
+                                  {"tau_columns", f(gk[3])}});
+  add(qel::kTableMeasuresOfConcordance, {{"concordant", f(concordance[0])},
+                                         {"discordant", f(concordance[1])},
+                                         {"tied", f(concordance[2])},
+                                         {"pairs", f(concordance[3])},
+                                         {"somers_d_rows", f(concordance[4])},
+                                         {"somers_d_columns", f(concordance[5])},
+                                         {"gamma", f(concordance[6])},
+                                         {"tau_b", f(concordance[7])},
+                                         {"tau_b_p_value", f(concordance[8])}});
   return result("ContingencyTable", fields);
 }
 
@@ -248,8 +256,10 @@ py::object mantelHaenszel(py::handle strata) {
     return c;
   });
   check(code);
-  return result("MantelHaenszel", {{"odds_ratio", f(out[0])}, {"statistic", f(out[1])},
-                                   {"p_value", f(out[2])}, {"degrees_of_freedom", f(out[3])}});
+  return result("MantelHaenszel", {{"odds_ratio", f(out[0])},
+                                   {"statistic", f(out[1])},
+                                   {"p_value", f(out[2])},
+                                   {"degrees_of_freedom", f(out[3])}});
 }
 
 py::object chisqGof(py::handle observed, py::handle proportions, py::handle total) {
@@ -275,11 +285,11 @@ py::object chisqGof(py::handle observed, py::handle proportions, py::handle tota
     return qel::RunLynTabularChiSqGOFTest(o.data(), pp, expected.data(), contributions.data(),
                                           &statistic, &pValue, &df, n, k);
   });
-  return result("ChiSquareGoodnessOfFit",
-                {{"expected", toArray(expected.data(), k)},
-                 {"contributions", toArray(contributions.data(), k)},
-                 {"statistic", f(statistic)}, {"degrees_of_freedom", f(df)},
-                 {"p_value", f(pValue)}});
+  return result("ChiSquareGoodnessOfFit", {{"expected", toArray(expected.data(), k)},
+                                           {"contributions", toArray(contributions.data(), k)},
+                                           {"statistic", f(statistic)},
+                                           {"degrees_of_freedom", f(df)},
+                                           {"p_value", f(pValue)}});
 }
 
 }  // namespace

@@ -133,6 +133,7 @@ def main():
     path = os.path.join(ROOT, "python", "src", "distributions_table.inc")
     with open(path, "w") as inc:
         inc.write("\n".join(lines) + "\n")
+    api.format_in_place(path)
     print("wrote python/src/distributions_table.inc")
 
 
