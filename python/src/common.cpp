@@ -2,6 +2,8 @@
 // module.
 #include "common.h"
 
+#include <algorithm>
+
 namespace qelpy {
 
 namespace {
@@ -32,6 +34,30 @@ void guardedOneByOne(const ScalarFn& one, double* out, const double* in, std::si
     } catch (const std::exception&) {
       qel::ResetFpuStates();
       out[i] = kNaN;
+    }
+  }
+}
+
+// The array form over n values; where an exception escapes it, the values
+// are computed one by one instead. In place (dst == src) the library has
+// overwritten part of the input by then, so the input goes through in
+// chunks, each saved before its call.
+void evaluateInto(const ScalarFn& one, const ArrayFn& many, double* dst, const double* src,
+                  std::size_t n) {
+  const std::size_t chunk = dst == src ? 4096 : std::max<std::size_t>(n, 1);
+  std::vector<double> saved;
+  for (std::size_t start = 0; start < n; start += chunk) {
+    const std::size_t m = std::min(chunk, n - start);
+    const double* in = src + start;
+    if (dst == src) {
+      saved.assign(in, in + m);
+      in = saved.data();
+    }
+    try {
+      many(dst + start, in, m);
+    } catch (const std::exception&) {
+      qel::ResetFpuStates();
+      guardedOneByOne(one, dst + start, in, m);
     }
   }
 }
@@ -122,15 +148,7 @@ py::object evaluate(py::handle x, py::handle out, const ScalarFn& one, const Arr
   const std::size_t n = static_cast<std::size_t>(in.size());
   {
     py::gil_scoped_release release;
-    try {
-      many(dst, src, n);
-    } catch (const std::exception&) {
-      qel::ResetFpuStates();
-      // With out == x the first elements are already overwritten; the
-      // library writes element i after reading it, so only the rest is
-      // recomputed from the input.
-      if (dst != src) guardedOneByOne(one, dst, src, n);
-    }
+    evaluateInto(one, many, dst, src, n);
   }
   return std::move(result);
 }

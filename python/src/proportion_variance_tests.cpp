@@ -3,6 +3,8 @@
 #include <qel/variance_tests.h>
 #include <qel/variances_test.h>
 
+#include <algorithm>
+
 #include "common.h"
 
 namespace qelpy {

@@ -54,7 +54,7 @@ def default_of(family, name):
 
 
 def arg_specs(family, params):
-    """pybind11 argument specifications; a required parameter after a
+    """pybind11 argument declarations; a required parameter after a
     defaulted one would be a syntax error in Python, so the table must not
     have one."""
     specs, seen_default = [], False
