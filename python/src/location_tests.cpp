@@ -1,6 +1,7 @@
 // Location tests: one-sample t and z, paired t, two-sample t, the sign and
 // Wilcoxon signed rank tests and the runs test.
 #include <qel/descriptive.h>
+#include <qel/interval.h>
 #include <qel/location_tests.h>
 #include <qel/sign_tests.h>
 
@@ -104,6 +105,50 @@ void registerTTests(py::module_& m) {
       py::arg("mean"), py::arg("sd"), py::arg("n"), py::arg("mu") = 0.0,
       py::arg("confidence") = 0.95, py::arg("alternative") = "two-sided",
       py::arg("interval") = py::none(), "One-sample t test from mean, deviation and n.");
+  m.def(
+      "one_sample_z_summary",
+      [](double mean, unsigned n, double sigma, double mu, double confidence,
+         const std::string& alternative, py::handle interval) {
+        Sides s(alternative, interval, confidence);
+        qel::v0::OneSampleZ r;
+        r.n = n;
+        r.mean = mean;
+        const int code = released([&] {
+          return qel::v0::RunOneSampleZ(&r, sigma, s.confidence, s.type, s.alternative, mu);
+        });
+        check(code);
+        return oneSampleZ(r, code);
+      },
+      py::arg("mean"), py::arg("n"), py::arg("sigma") = 1.0, py::arg("mu") = 0.0,
+      py::arg("confidence") = 0.95, py::arg("alternative") = "two-sided",
+      py::arg("interval") = py::none(), "One-sample z test from the mean and n.");
+  m.def(
+      "symmetric_interval",
+      [](double estimate, double standardError, double confidence, py::object df,
+         py::handle interval) {
+        const qel::IntervalType type = intervalOf(interval, qel::kAlternativeNotEqual);
+        double lower = kNaN, upper = kNaN;
+        int code = 0;
+        if (df.is_none()) {
+          code = released([&] {
+            return qel::v1::MakeTraditionalSymmetricCI(qel::v0::NormalInvCdfFunc(), confidence,
+                                                       type, estimate, standardError, &lower,
+                                                       &upper);
+          });
+        } else {
+          const qel::v0::TInvCdfFunc quantile(df.cast<double>());
+          code = released([&] {
+            return qel::v1::MakeTraditionalSymmetricCI(quantile, confidence, type, estimate,
+                                                       standardError, &lower, &upper);
+          });
+        }
+        check(code);
+        return py::make_tuple(lower, upper);
+      },
+      py::arg("estimate"), py::arg("standard_error"), py::arg("confidence") = 0.95,
+      py::arg("df") = py::none(), py::arg("interval") = "two-sided",
+      "(lower, upper) = estimate -/+ standard_error times the normal quantile (the t quantile "
+      "on df degrees of freedom when given); one-sided intervals leave one limit infinite.");
   m.def(
       "one_sample_z",
       [](py::handle x, double sigma, double mu, double confidence, const std::string& alternative,

@@ -217,6 +217,28 @@ void registerVariances(py::module_& m) {
       "Ratio of two standard deviations sigma1/sigma2 = ratio: F, and Bonett's method or "
       "(levene) a Levene-type test; chi-square limits of each deviation.");
   m.def(
+      "two_variances_summary",
+      [](double variance1, unsigned n1, double variance2, unsigned n2, double ratio,
+         double confidence, const std::string& alternative, py::handle interval) {
+        if (!(ratio > 0.0 && std::isfinite(ratio))) throw py::value_error("ratio must be positive");
+        Sides s(alternative, interval, confidence);
+        qel::v0::TwoVariance r;
+        r.firstVariance = variance1;
+        r.secondVariance = variance2;
+        r.firstN = n1;
+        r.secondN = n2;
+        const int code = released([&] {
+          return qel::v0::RunTwoVariance(&r, s.confidence, s.type, s.alternative, ratio);
+        });
+        check(code);
+        return twoVariance(r, code);
+      },
+      py::arg("variance1"), py::arg("n1"), py::arg("variance2"), py::arg("n2"),
+      py::arg("ratio") = 1.0, py::arg("confidence") = 0.95, py::arg("alternative") = "two-sided",
+      py::arg("interval") = py::none(),
+      "F interval and test of sigma1/sigma2 = ratio and chi-square limits of each deviation, "
+      "from the variances and sizes.");
+  m.def(
       "variances_test",
       [](py::handle groups, double confidence, bool assumeNormal) {
         std::vector<Doubles> data = columns(groups, "groups", 1);
