@@ -203,7 +203,7 @@ py::array_t<double> toArray(const double* values, std::size_t n) {
   return a;
 }
 
-void registerErrors(py::module_& m) {
+void registerErrorTranslator() {
   py::register_exception_translator([](std::exception_ptr p) {
     try {
       if (p) std::rethrow_exception(p);
@@ -215,7 +215,6 @@ void registerErrors(py::module_& m) {
       PyErr_SetObject(reinterpret_cast<PyObject*>(Py_TYPE(err.ptr())), err.ptr());
     }
   });
-  (void)m;
 }
 
 }  // namespace qelpy

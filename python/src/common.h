@@ -107,7 +107,7 @@ py::object result(const char* type, const Fields& fields);
 py::array_t<double> toArray(const double* values, std::size_t n);
 
 // Registration of each area.
-void registerErrors(py::module_& m);
+void registerErrorTranslator();
 void registerDistributions(py::module_& m);
 void registerSampler(py::module_& m);
 void registerDescriptive(py::module_& m);

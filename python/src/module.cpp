@@ -10,7 +10,7 @@ PYBIND11_MODULE(_qel, m) {
   if (qel::RegisterLynSigfpeHandler() != qel::qelOk) {
     throw std::runtime_error("qel: the SIGFPE handler could not be installed");
   }
-  qelpy::registerErrors(m);
+  qelpy::registerErrorTranslator();
   qelpy::registerDistributions(m);
   qelpy::registerSampler(m);
   qelpy::registerDescriptive(m);
