@@ -179,6 +179,14 @@ def statistical_tests():
     ci = stats.binomtest(7, 30).proportion_ci(0.95, method="exact")
     rows += [["one_proportion", [7, 30], {}, "lower_limit", ci.low, 1e-10],
              ["one_proportion", [7, 30], {}, "upper_limit", ci.high, 1e-10]]
+    q = t_quantile(0.975, 5.0)
+    rows += [["symmetric_interval", [10.0, 2.0], {"df": 5.0}, None,
+              [10.0 - 2.0 * q, 10.0 + 2.0 * q], 1e-12],
+             ["one_sample_z_summary", [5.2, 25], {"mu": 5.0}, "p_value",
+              2 * stats.norm.sf(1.0), 1e-12]]
+    f_p = stats.f.cdf((2.0 / 3.0), 9, 11)
+    rows += [["two_variances_summary", [2.0, 10, 3.0, 12], {}, "f_p_value",
+              2 * min(f_p, 1 - f_p), 1e-10]]
     rows += [["pearson", [X, Y], {}, None, stats.pearsonr(X, Y)[0], 1e-12],
              ["spearman", [X, Y], {}, None, stats.spearmanr(X, Y)[0], 1e-12]]
     return [[f, a, k, field, v, tol] for f, a, k, field, v, tol in
