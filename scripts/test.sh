@@ -11,7 +11,7 @@ jobs=$(nproc)
 launcher=()
 command -v ccache >/dev/null && launcher=(-DCMAKE_CXX_COMPILER_LAUNCHER=ccache)
 
-cmake -S . -B build -DQEL_BUILD_TESTS=ON "${launcher[@]}" >/dev/null
+cmake -S . -B build -DQEL_BUILD_TESTS=ON -DQEL_BUILD_PYTHON=ON "${launcher[@]}" >/dev/null
 cmake --build build -j"$jobs"
 (cd build && ctest --output-on-failure -j"$jobs")
 # The API reference: an undocumented public name or a malformed comment fails.
@@ -33,4 +33,10 @@ PKG_CONFIG_PATH="$PWD/build/_install/lib/pkgconfig" \
   c++ -std=c++17 tests/consumer/main.cpp -o build/_consumer/consumer_pc \
   $(PKG_CONFIG_PATH="$PWD/build/_install/lib/pkgconfig" pkg-config --cflags --libs qel)
 LD_LIBRARY_PATH="$PWD/build/_install/lib" build/_consumer/consumer_pc
+# The Python module as installed: imported from the prefix's site-packages,
+# finding libqel.so through its RPATH.
+python=$(sed -n 's/^Python3_EXECUTABLE:[A-Z]*=//p' build/CMakeCache.txt)
+site=$(dirname "$(dirname "$(find "$PWD/build/_install" -name '_qel*.so' | head -1)")")
+PYTHONPATH="$site" "$python" -c \
+  'import qel; assert repr(qel.normal.cdf(-30.0)) == "4.906713927148187e-198", qel.__file__'
 echo "all test stages passed"

