@@ -18,6 +18,8 @@ change of the density that one rounding of its inputs causes. Near the mode
 of a law with shapes of 1e10 it is about 1e5, so no method working from the
 double inputs can promise 1e-12 there; beyond 1e16 the double inputs do not
 determine the density at all.
+Also writes tests/data/noncentral_f_small_df.csv: both tails of the
+noncentral F at numerator df from 1e-300 to 0.5 (noncentral_rows).
 Run: /usr/bin/python3 tools/reference/gen_extreme_shapes.py
 """
 import os
@@ -156,10 +158,50 @@ def rows():
     return out
 
 
+def noncentral_f(x, m, n, ncp):
+    """Both tails of the noncentral F as the Poisson mixture of central beta
+    laws, sum_j e^-mu mu^j / j! I_y(m/2 + j, n/2), mu = ncp/2,
+    y = m x / (n + m x), summed until the weights left are below 1e-40."""
+    with mp.workdps(50):
+        mu = ncp / 2
+        y = m * x / (n + m * x)
+        w = n / (n + m * x)  # 1 - y without cancellation
+        lower = upper = mpf(0)
+        weight = mpmath.exp(-mu)
+        left = 1 - weight
+        j = 0
+        while True:
+            lower += weight * mpmath.betainc(m / 2 + j, n / 2, 0, y, regularized=True)
+            if w < 0.5:
+                upper += weight * mpmath.betainc(n / 2, m / 2 + j, 0, w, regularized=True)
+            else:  # w near 1 would round: the complement of the lower part
+                upper += weight * (1 - mpmath.betainc(m / 2 + j, n / 2, 0, y, regularized=True))
+            j += 1
+            weight *= mu / j
+            left -= weight
+            if j > mu and left < mpf(10) ** -40:
+                return lower, upper
+
+
+def noncentral_rows():
+    """Noncentral F at numerator df down to 1e-300, where the moving shape of
+    the noncentral beta mixture, m/2, vanishes beside the index j."""
+    out = []
+    for m in (1e-300, 1e-100, 1e-16, 1e-12, 1e-10, 1e-6, 0.5):
+        for n, ncp in ((7.0, 1.0), (7.0, 10.0), (0.5, 3.0), (1e4, 1.0)):
+            for x in (1e-10, 0.5, 2.5, 3.0, 50.0, 1e10):
+                lo, up = noncentral_f(d(x), d(m), d(n), d(ncp))
+                out.append((repr(x), repr(m), repr(n), repr(ncp), lo, up))
+    return out
+
+
 def main():
     mp.dps = 400
     path = os.path.join(DATA, "extreme_shapes.csv")
     write_rows(path, "family,function,x,param1,param2,expected,condition", rows())
+    print("wrote", path)
+    path = os.path.join(DATA, "noncentral_f_small_df.csv")
+    write_rows(path, "x,df1,df2,noncentrality,lower,upper", noncentral_rows())
     print("wrote", path)
 
 

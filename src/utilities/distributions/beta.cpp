@@ -2,6 +2,8 @@
 //
 // The F quantile of a noncentral F has no routine of its own: it is a root
 // search of the distribution function from 0 upward.
+#include <qel/elv.h>
+
 #include <cfloat>
 #include <cmath>
 #include <stdexcept>
@@ -27,6 +29,55 @@ constexpr double kSmallestNoncentrality = 2.2250738585072014e-307;
 // its upper end.
 constexpr double kSearchLimit = 1e30;
 constexpr double kLargestFArgument = 189812530.0;
+
+// Where y = df1 x / (df2 + df1 x) lies below 2.2e-288 the ELV beta routines
+// answer a lower tail of 0, which is wrong for a small df1: I_y(a, b) is
+// y^a (1-y)^b / (a B(a, b)) (1 + O(b y)), near 1 for a = 5e-301. Every
+// further component of the Poisson mixture (mean L = noncentrality / 2)
+// carries another factor y, so the lower tail is e^-L I_y(a, b) to double
+// precision and the upper tail -expm1 of its logarithm. False where y is
+// not that small (or b y is not negligible), for the routines to answer.
+bool tinyBetaArgument(double x, double df1, double df2, double noncentrality, double* lower,
+                      double* upper) {
+  constexpr double kTiny = 2.2250738585072014e-288;
+  const double a = 0.5 * df1, b = 0.5 * df2;
+  if (!(a >= DBL_MIN && b >= DBL_MIN)) return false;  // no libm call on a denormal
+  // ln y = ln(df1 x / df2) - ln(1 + df1 x / df2), formed in logarithms.
+  const double lr = std::log(df1) + std::log(x) - std::log(df2);
+  // Taken up to y = 1e-280, clear of the routines' own border at kTiny.
+  if (!(lr < std::log(1e-280)) || b * std::exp(lr) > 1e-17) return false;
+  // ln B(a, b) from the density at the normal point kTiny (y itself may be
+  // denormal, which the armed state reads as 0).
+  double lp = 0.0;
+  lnpbeta(&lp, a, b, kTiny);
+  const double lnBeta = (a - 1.0) * std::log(kTiny) + (b - 1.0) * std::log1p(-kTiny) - lp;
+  const double ly = lr - std::log1p(std::exp(lr));
+  const double lnLower =
+      a * ly + b * std::log1p(-std::exp(ly)) - std::log(a) - lnBeta - 0.5 * noncentrality;
+  *lower = lnLower < -708.39 ? 0.0 : std::exp(lnLower);
+  *upper = -std::expm1(lnLower);
+  return true;
+}
+
+// Both tails of F beyond the F routine's largest argument, straight from the
+// beta laws, with c = df1/2, d = df2/2 and the beta argument below 1/2:
+// P(F <= x) is the lower tail at y = c x/(d + c x) of the beta law (c, d)
+// where c x <= d, and P(F > x) the lower tail at w = d/(d + c x) of the
+// law (d, c) otherwise; a noncentral F mixes over the shape c + j
+// (beta_ncdf, beta_ncdf2 with L/2).
+ElvStatus betaMixtureTails(double x, double df1, double df2, double noncentrality, double* lower,
+                           double* upper) {
+  const double c = 0.5 * df1, d = 0.5 * df2, L = 0.5 * noncentrality;
+  double density = 0.0;
+  if (c * x <= d) {
+    const double y = c * x / (d + c * x);
+    if (L == 0.0) return elv_beta_df(y, c, d, lower, upper, &density);
+    return elv_beta_ncdf(y, c, d, L, lower, upper);
+  }
+  const double w = d / (d + c * x);
+  if (L == 0.0) return elv_beta_df(w, d, c, upper, lower, &density);
+  return elv_beta_ncdf2(w, d, c, L, upper, lower);
+}
 
 }  // namespace
 
@@ -111,7 +162,11 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
     return true;
   }
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
-  if (ElvFailed(elv_F_ncdf(x, df1, df2, noncentrality, lower, upper))) {
+  if (tinyBetaArgument(x, df1, df2, noncentrality, lower, upper)) return true;
+  const ElvStatus status = x > kLargestFArgument
+                               ? betaMixtureTails(x, df1, df2, noncentrality, lower, upper)
+                               : elv_F_ncdf(x, df1, df2, noncentrality, lower, upper);
+  if (ElvFailed(status)) {
     *lower = *upper = mGetMissingValueCode();
     return false;
   }
@@ -131,6 +186,13 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
+  // A small df1 puts mass below the smallest normal double (all but
+  // 4e-14 of it at df1 = 1e-16; e^(-L/2) of it for a noncentral F, whose
+  // component j = 0 rises like x^(df1/2)): quantiles of p up to that mass
+  // are 0 to double precision.
+  double lowest = 0.0, above = 0.0;
+  if (!mFCdf(DBL_MIN, df1, df2, noncentrality, &lowest, &above)) return mGetMissingValueCode();
+  if (p <= lowest) return 0.0;
   if (noncentrality == 0.0) {
     // P(F <= x) = I_w(df1/2, df2/2), w = df1 x/(df2 + df1 x), and
     // P(F > x) = I_y(df2/2, df1/2), y = 1 - w: the tails of the central law
