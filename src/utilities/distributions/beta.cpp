@@ -4,6 +4,7 @@
 // search of the distribution function from 0 upward.
 #include <qel/elv.h>
 
+#include <algorithm>
 #include <cfloat>
 #include <cmath>
 #include <stdexcept>
@@ -30,32 +31,76 @@ constexpr double kSmallestNoncentrality = 2.2250738585072014e-307;
 constexpr double kSearchLimit = 1e30;
 constexpr double kLargestFArgument = 189812530.0;
 
-// Where y = df1 x / (df2 + df1 x) lies below 2.2e-288 the ELV beta routines
-// answer a lower tail of 0, which is wrong for a small df1: I_y(a, b) is
-// y^a (1-y)^b / (a B(a, b)) (1 + O(b y)), near 1 for a = 5e-301. Every
-// further component of the Poisson mixture (mean L = noncentrality / 2)
-// carries another factor y, so the lower tail is e^-L I_y(a, b) to double
-// precision and the upper tail -expm1 of its logarithm. False where y is
-// not that small (or b y is not negligible), for the routines to answer.
+// The ELV beta routines answer a lower tail of 0 at an argument below
+// 2.2e-288, which is wrong for a small shape: I_z(s, t) is
+// z^s (1-z)^t / (s B(s, t)) (1 + O(t z)), near 1 for s = 5e-301.
+// tinyBetaLogLower gives ln I_z(s, t) by that leading term for ln z = lz,
+// or false where t z is not negligible or the shapes leave the range of the
+// log-density routine.
+bool tinyBetaLogLower(double lz, double s, double t, double* out) {
+  constexpr double kTiny = 2.2250738585072014e-288;
+  if (!(s >= DBL_MIN && t >= DBL_MIN) || t * std::exp(lz) > 1e-17) return false;
+  try {
+    // ln B(s, t) from the density at the normal point kTiny (z itself may
+    // be denormal, which the armed state reads as 0).
+    double lp = 0.0;
+    lnpbeta(&lp, s, t, kTiny);
+    const double lnBeta = (s - 1.0) * std::log(kTiny) + (t - 1.0) * std::log1p(-kTiny) - lp;
+    *out = s * lz + t * std::log1p(-std::exp(lz)) - std::log(s) - lnBeta;
+    return std::isfinite(*out);
+  } catch (const std::runtime_error&) {
+    return false;
+  }
+}
+
+// The F tails where a beta argument, y = c x/(d + c x) or w = 1 - y with
+// c = df1/2, d = df2/2, lies below 1e-280 (clear of the routines' border).
+// Small y: every further component of the Poisson mixture (mean
+// L = noncentrality/2) carries another factor y, so the lower tail is
+// e^-L I_y(c, d) and the upper tail -expm1 of its logarithm. Small w: the
+// upper tail is I_w(d, c) for a central F; a noncentral one mixes
+// I_w(d, c + j) over all j, answered here only where even the largest
+// component that counts underflows (otherwise no answer: *lower = NaN).
+// Tails below a bound under e^-760 are 0 without further work.
+// False where neither argument is that small, for the routines to answer.
 bool tinyBetaArgument(double x, double df1, double df2, double noncentrality, double* lower,
                       double* upper) {
-  constexpr double kTiny = 2.2250738585072014e-288;
-  const double a = 0.5 * df1, b = 0.5 * df2;
-  if (!(a >= DBL_MIN && b >= DBL_MIN)) return false;  // no libm call on a denormal
-  // ln y = ln(df1 x / df2) - ln(1 + df1 x / df2), formed in logarithms.
-  const double lr = std::log(df1) + std::log(x) - std::log(df2);
-  // Taken up to y = 1e-280, clear of the routines' own border at kTiny.
-  if (!(lr < std::log(1e-280)) || b * std::exp(lr) > 1e-17) return false;
-  // ln B(a, b) from the density at the normal point kTiny (y itself may be
-  // denormal, which the armed state reads as 0).
-  double lp = 0.0;
-  lnpbeta(&lp, a, b, kTiny);
-  const double lnBeta = (a - 1.0) * std::log(kTiny) + (b - 1.0) * std::log1p(-kTiny) - lp;
-  const double ly = lr - std::log1p(std::exp(lr));
-  const double lnLower =
-      a * ly + b * std::log1p(-std::exp(ly)) - std::log(a) - lnBeta - 0.5 * noncentrality;
-  *lower = lnLower < -708.39 ? 0.0 : std::exp(lnLower);
-  *upper = -std::expm1(lnLower);
+  const double c = 0.5 * df1, d = 0.5 * df2, L = 0.5 * noncentrality;
+  if (!(c >= DBL_MIN && d >= DBL_MIN)) return false;  // no libm call on a denormal
+  const double lr = std::log(c) + std::log(x) - std::log(d), border = std::log(1e-280);
+  // ln of a bound on I_z(s, t): (z (s + t))^s / Gamma(s + 1), and on every
+  // I_z(s, t + j) that counts with t + j for t.
+  const double lnSum = std::log(std::max(c, d)) + 0.6931471805599453;
+  const auto lnBound = [lnSum](double lz, double s, double t) {
+    return s * (lz + std::max(lnSum, std::log(t))) - std::lgamma(s + 1.0);
+  };
+  double lnTail = 0.0;
+  if (lr < border) {
+    const double ly = lr - std::log1p(std::exp(lr));
+    if (lnBound(ly, c, d) < -760.0) {
+      lnTail = -HUGE_VAL;
+    } else if (!tinyBetaLogLower(ly, c, d, &lnTail)) {
+      return false;
+    }
+    lnTail -= L;
+    *lower = lnTail < -708.39 ? 0.0 : std::exp(lnTail);
+    *upper = -std::expm1(lnTail);
+    return true;
+  }
+  if (lr <= -border) return false;
+  const double lw = -lr - std::log1p(std::exp(-lr));
+  // j up to L + 40 sqrt(L) + 40 carries all the mixture's weight.
+  const double top = L + 40.0 * std::sqrt(L) + 40.0 + c;
+  if (lnBound(lw, d, L > 0.0 ? top : c) < -760.0) {
+    lnTail = -HUGE_VAL;
+  } else if (L > 0.0) {
+    *lower = *upper = mQuietNaN();
+    return true;
+  } else if (!tinyBetaLogLower(lw, d, c, &lnTail)) {
+    return false;
+  }
+  *upper = lnTail < -708.39 ? 0.0 : std::exp(lnTail);
+  *lower = -std::expm1(lnTail);
   return true;
 }
 
@@ -64,17 +109,21 @@ bool tinyBetaArgument(double x, double df1, double df2, double noncentrality, do
 // P(F <= x) is the lower tail at y = c x/(d + c x) of the beta law (c, d)
 // where c x <= d, and P(F > x) the lower tail at w = d/(d + c x) of the
 // law (d, c) otherwise; a noncentral F mixes over the shape c + j
-// (beta_ncdf, beta_ncdf2 with L/2).
+// (beta_ncdf, beta_ncdf2 with L/2). Here w >= 1e-280 (tinyBetaArgument
+// takes the rest); beyond c x = 1e13 d it is formed from logarithms, as
+// c x may overflow.
 ElvStatus betaMixtureTails(double x, double df1, double df2, double noncentrality, double* lower,
                            double* upper) {
   const double c = 0.5 * df1, d = 0.5 * df2, L = 0.5 * noncentrality;
   double density = 0.0;
-  if (c * x <= d) {
+  const double lr = std::log(c) + std::log(x) - std::log(d);
+  if (lr <= 0.0) {
     const double y = c * x / (d + c * x);
     if (L == 0.0) return elv_beta_df(y, c, d, lower, upper, &density);
     return elv_beta_ncdf(y, c, d, L, lower, upper);
   }
-  const double w = d / (d + c * x);
+  const double w =
+      lr < 30.0 && d < 1e290 ? d / (d + c * x) : std::exp(-lr - std::log1p(std::exp(-lr)));
   if (L == 0.0) return elv_beta_df(w, d, c, upper, lower, &density);
   return elv_beta_ncdf2(w, d, c, L, upper, lower);
 }
@@ -162,7 +211,11 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
     return true;
   }
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
-  if (tinyBetaArgument(x, df1, df2, noncentrality, lower, upper)) return true;
+  if (tinyBetaArgument(x, df1, df2, noncentrality, lower, upper)) {
+    if (!std::isnan(*lower)) return true;
+    *lower = *upper = mGetMissingValueCode();
+    return false;
+  }
   const ElvStatus status = x > kLargestFArgument
                                ? betaMixtureTails(x, df1, df2, noncentrality, lower, upper)
                                : elv_F_ncdf(x, df1, df2, noncentrality, lower, upper);
