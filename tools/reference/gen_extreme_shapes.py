@@ -7,7 +7,8 @@ of the law plus and minus two standard deviations.
 Densities are evaluated in logarithms at 400 digits, enough to carry the
 cancellation between terms near 1e303 when a shape is 1e300. Tails come
 from mpmath's incomplete gamma and beta functions where their series
-converge (they refuse shapes near 1e10 and above); those rows are left out.
+converge (they refuse shapes near 1e10 and above; working precision 400
+digits for the tiny shapes); those rows are left out.
 
 Writes tests/data/extreme_shapes.csv with rows
     family,function,x,param1,param2,expected,condition
@@ -100,9 +101,22 @@ def around(centre, spread, low=0.0, high=float("inf")):
 
 def tails(kind, x, p1, p2):
     """(lower, upper) from mpmath, or None where its series give up."""
-    with mp.workdps(60):
+    with mp.workdps(400):
         try:
-            if kind == "gamma":
+            if kind == "f":  # P(F <= x) = I_y(m/2, n/2), 1 - y = n / (n + m x)
+                # The tail whose beta argument is below 1/2 directly, the
+                # other as its complement (an argument near 1 would round).
+                y, w = p1 * x / (p2 + p1 * x), p2 / (p2 + p1 * x)
+                if y <= 0.5:
+                    lo = mpmath.betainc(p1 / 2, p2 / 2, 0, y, regularized=True)
+                    up = 1 - lo
+                else:
+                    up = mpmath.betainc(p2 / 2, p1 / 2, 0, w, regularized=True)
+                    lo = 1 - up
+            elif kind == "t":  # the tail beyond |x| is I_z(n/2, 1/2) / 2, z = n / (n + x^2)
+                far = mpmath.betainc(p1 / 2, mpf(1) / 2, 0, p1 / (p1 + x * x), regularized=True) / 2
+                lo, up = (far, 1 - far) if x < 0 else (1 - far, far)
+            elif kind == "gamma":
                 lo = mpmath.gammainc(p1, 0, x, regularized=True)
                 up = mpmath.gammainc(p1, x, mpmath.inf, regularized=True)
             elif kind == "beta":
@@ -128,7 +142,7 @@ def rows():
     for a in SHAPES:
         sd = float(mpmath.sqrt(d(a)))
         for x in around(a, sd):
-            t = tails("gamma", d(x), d(a), None) if 1e-5 <= a <= 1e6 else None
+            t = tails("gamma", d(x), d(a), None) if a <= 1e6 else None
             add("gamma", x, a, 1.0, gamma_log_pdf(d(x), d(a), 1), t,
                 condition(lambda x_, a_: gamma_log_pdf(x_, a_, 1), d(x), d(a)))
         for scale in (1e-300, 1e300):
@@ -136,11 +150,12 @@ def rows():
                 add("gammascale", x, a, scale, gamma_log_pdf(d(x), d(a), d(scale)), None,
                     condition(gamma_log_pdf, d(x), d(a), d(scale)))
         for x in around(2 * a, 2 * sd):
-            t = tails("gamma", d(x) / 2, d(a) / 2, None) if 1e-5 <= a <= 1e6 else None
+            t = tails("gamma", d(x) / 2, d(a) / 2, None) if a <= 1e6 else None
             add("chisq", x, a, 0.0, gamma_log_pdf(d(x), d(a) / 2, 2), t,
                 condition(lambda x_, a_: gamma_log_pdf(x_, a_ / 2, 2), d(x), d(a)))
         for x in around(0.0, 1.0, -float("inf")) + [-1e300, -3.0]:
-            add("t", x, a, 0.0, t_log_pdf(d(x), d(a)), None, condition(t_log_pdf, d(x), d(a)))
+            t = tails("t", d(x), d(a), None) if a <= 1e6 else None
+            add("t", x, a, 0.0, t_log_pdf(d(x), d(a)), t, condition(t_log_pdf, d(x), d(a)))
     for a in SHAPES:
         for b in SHAPES:
             mean = d(a) / (d(a) + d(b))
@@ -148,12 +163,13 @@ def rows():
             for x in around(mean, sd, 0.0, 1.0) + [1 - 2.0 ** -40]:
                 if not 0 < x < 1:
                     continue
-                t = tails("beta", d(x), d(a), d(b)) if all(1e-5 <= s <= 1e6 for s in (a, b)) else None
+                t = tails("beta", d(x), d(a), d(b)) if max(a, b) <= 1e6 else None
                 add("beta", x, a, b, beta_log_pdf(d(x), d(a), d(b)), t,
                     condition(beta_log_pdf, d(x), d(a), d(b)))
             sd = mpmath.sqrt(2 / d(a) + 2 / d(b))
             for x in around(mpf(1), sd):
-                add("f", x, a, b, f_log_pdf(d(x), d(a), d(b)), None,
+                t = tails("f", d(x), d(a), d(b)) if max(a, b) <= 1e6 else None
+                add("f", x, a, b, f_log_pdf(d(x), d(a), d(b)), t,
                     condition(f_log_pdf, d(x), d(a), d(b)))
     return out
 

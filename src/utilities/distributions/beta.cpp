@@ -41,6 +41,26 @@ bool tinyBetaLogLower(double lz, double s, double t, double* out) {
   constexpr double kTiny = 2.2250738585072014e-288;
   if (!(s >= DBL_MIN && t >= DBL_MIN) || t * std::exp(lz) > 1e-17) return false;
   try {
+    if (s <= 1e-5) {
+      // ln(1 / (s B(s, t))) = ln Gamma(s + t) - ln Gamma(t) - ln Gamma(1 + s)
+      // by its Taylor series in s (Abramowitz & Stegun 6.1.33, 6.4.1), so
+      // that ln I stays accurate to its last digit where I is within 1e-298
+      // of 1 and the other tail is -expm1(ln I).
+      constexpr double kEuler = 0.57721566490153286061, kZeta2 = 1.6449340668482264365,
+                       kZeta3 = 1.2020569031595942854;
+      double ans[2] = {0.0, 0.0};
+      int nz = 0, ierr = 0;
+      XDPSIFN(t, 1, 1, 2, ans, &nz, &ierr);
+      if (ierr == 0) {
+        const double series = s * (psi(t) + kEuler) + s * s * (ans[0] - kZeta2) / 2.0 +
+                              s * s * s * (-2.0 * ans[1] + 2.0 * kZeta3) / 6.0;
+        // (1-z)^t times the first term of 2F1(s + t, 1; s + 1; z), the
+        // factor that completes the leading term, is 1 + s (1 - t) z/(1 + s)
+        // to first order in z: next to s ln z, t z alone would not cancel.
+        *out = s * lz + series + s * (1.0 - t) * std::exp(lz) / (1.0 + s);
+        return std::isfinite(*out);
+      }
+    }
     // ln B(s, t) from the density at the normal point kTiny (z itself may
     // be denormal, which the armed state reads as 0).
     double lp = 0.0;
