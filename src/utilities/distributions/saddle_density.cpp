@@ -153,7 +153,6 @@ double binomialMass(double x, double n, double p, double q) {
 
 namespace {
 
-constexpr double kLn2 = 0.693147180559945309417232121458;
 constexpr double kDirectLow = 1e-100, kDirectHigh = 1e100;
 
 // Inputs inside [1e-100, 1e100] let a product of up to three of them be
@@ -215,7 +214,7 @@ double binomialCore(double x, double y, const UnitPoint& u, double* f, double* l
 // The beta density at u: (a + b - 1) times a binomial mass of a - 1 in
 // a + b - 2 trials for shapes of at least 1; otherwise the mass of a in
 // a + b trials times a b / ((a + b) p q).
-double betaAt(const UnitPoint& u, double a, double b, double extraF, double extraLf) {
+double betaAt(const UnitPoint& u, double a, double b) {
   double f = 0.0, lf = 0.0, core = 0.0;
   if (a >= 1.0 && b >= 1.0) {
     core = binomialCore(a - 1.0, b - 1.0, u, &f, &lf);
@@ -227,7 +226,7 @@ double betaAt(const UnitPoint& u, double a, double b, double extraF, double extr
     lf += checkedLog(a) + checkedLog(b) - checkedLog(a + b) - u.lp - u.lq;
     f = direct({a, b, u.p, u.q}) ? f * (a / (a + b)) * (b / (u.p * u.q)) : 0.0;
   }
-  return scaledExp(core, extraF > 0.0 ? f * extraF : 0.0, lf + extraLf);
+  return scaledExp(core, f, lf);
 }
 
 }  // namespace
@@ -255,20 +254,20 @@ double gammaDensity(double d, double shape, double scale) {
 double betaDensity(double x, double a, double b) {
   if (!(x > 0.0 && x < 1.0)) return 0.0;
   const UnitPoint u = {x, 1.0 - x, checkedLog(x), std::log1p(-x)};
-  return betaAt(u, a, b, 1.0, 0.0);
+  return betaAt(u, a, b);
 }
 
 namespace {
 
-// The deviance bd0(c, m) with m = c / u, given the relative gap t = u - 1
-// and u apart (each formed without cancellation by the caller): c g(t) with
-// g(t) = ln(1 + t) - t / (1 + t). Near t = 0 by Loader's series in
-// v = (c - m)/(c + m) = t / (2 + t), whose terms have one sign.
 // e^l, as 0 below the normal range and HUGE_VAL above it.
 double boundedExp(double l) {
   return l < -708.0 ? 0.0 : l > 709.0 ? HUGE_VAL : std::exp(l);
 }
 
+// The deviance bd0(c, m) with m = c / u, given the relative gap t = u - 1
+// and u apart (each formed without cancellation by the caller): c g(t) with
+// g(t) = ln(1 + t) - t / (1 + t). Near t = 0 by Loader's series in
+// v = (c - m)/(c + m) = t / (2 + t), whose terms have one sign.
 double relativeDeviance(double c, double t, double u) {
   const double v = t / (1.0 + u);
   if (std::fabs(v) < 0.5) {
