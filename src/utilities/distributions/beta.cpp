@@ -264,8 +264,7 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
   // component j = 0 rises like x^(df1/2)): quantiles of p up to that mass
   // are 0 to double precision.
   double lowest = 0.0, above = 0.0;
-  if (!mFCdf(DBL_MIN, df1, df2, noncentrality, &lowest, &above)) return mGetMissingValueCode();
-  if (p <= lowest) return 0.0;
+  if (mFCdf(DBL_MIN, df1, df2, noncentrality, &lowest, &above) && p <= lowest) return 0.0;
   if (noncentrality == 0.0) {
     // P(F <= x) = I_w(df1/2, df2/2), w = df1 x/(df2 + df1 x), and
     // P(F > x) = I_y(df2/2, df1/2), y = 1 - w: the tails of the central law
