@@ -1,12 +1,8 @@
-// Gamma, chi-square, beta, F and t at shapes from 1e-300 to 1e300, and the
-// noncentral F at df1 down to 1e-300, against mpmath
-// (tools/reference/gen_extreme_shapes.py). Densities hold 1e-12 relative plus
-// 8 eps times the condition number of the row; beyond a condition of 1e14
-// the double inputs do not determine the density and only the range is
-// checked. Open, range only (left to the owners of the central tails): the
-// gamma and beta lower tails below x = 2.2e-288 are 0 (truth about
-// x^a / (a B(a, b))), and the tails of gamma, chi-square, beta and t at a
-// shape below 1e-5, and of F with both df below 1e-5, miss by up to 100%.
+// Gamma, chi-square, beta, F, t at shapes 1e-300..1e300 and the noncentral F
+// at df1 down to 1e-300 against mpmath (gen_extreme_shapes.py): densities to
+// 1e-12 plus 8 eps times the row's condition number (range only beyond 1e14).
+// Open, range only (README): lower tails below x = 2.2e-288, tails of the
+// central laws at a shape below 1e-5 (of F with both df below 1e-5).
 #include <gtest/gtest.h>
 #include <qel/distributions.h>
 
