@@ -19,11 +19,11 @@
 /// Return codes: 0, or 30002 for an IntervalType outside -1, 0, 1 (both
 /// limits NaN, test not run) or for an alternative outside -1, 0, 1 in an
 /// exact or mid-P test (P-value left as it stands); the z tests answer such
-/// an alternative with a NaN P-value and code 0. Nothing else is checked:
-/// n = 0, events > trials or a confidence outside (0, 1) give NaN in the
-/// concerned fields and code 0, except that an interval of the form
-/// centre -/+ z times a scale (the normal approximations) refuses such a
-/// confidence with 30002 and both limits NaN. The data forms count events as the plain sum
+/// an alternative with a NaN P-value and code 0; and 30002 with both limits
+/// NaN for a confidence outside (0, 1) or NaN, in every interval (normal
+/// approximations, Wilson with and without correction, Clopper-Pearson,
+/// mid-P). Nothing else is checked: n = 0 or events > trials give NaN in the
+/// concerned fields and code 0. The data forms count events as the plain sum
 /// of their int entries.
 #ifndef QEL_PROPORTION_TESTS_H
 #define QEL_PROPORTION_TESTS_H

@@ -85,6 +85,14 @@ TEST(HostileRegressions, DistributionAnswersAsRuled) {
     {"poisson pdf, 1e15, mean 1e-300", [] { return PoissonPdf(1e15, 1e-300); }, "", 0, 0},
     {"t pdf, x 1e300, df 1e-300", [] { return TPdf(1e300, 1e-300, 0); }, "", 0, 0},
     {"hypergeometric upper, 1.5", [] { return HypergeometricCdf(1.5, 10, 4, 5, true); }, "hypergeometric_upper_1.5", 0, 1},
+    // Quantiles beyond the double range have no double; distances beyond
+    // DBL_MAX are taken from their halves (these once trapped to the host).
+    {"loglogistic inv, location 1e6", [] { return LogLogisticInvCdf(0.5, 1e6, 1, 0); }, "", kNaN, kNaN},
+    {"normal inv, sigma DBL_MAX", [] { return NormalInvCdf(1e-300, 0, DBL_MAX); }, "", kNaN, kNaN},
+    {"loglogistic cdf, distance beyond DBL_MAX", [] { return LogLogisticCdf(DBL_MAX, 0, 1, -1e300, false); }, "", 1, 1},
+    {"loglogistic pdf, distance beyond DBL_MAX", [] { return LogLogisticPdf(DBL_MAX, 0, 1, -1e300); }, "", 0, 0},
+    {"F cdf, x DBL_MAX, noncentral", [] { return FCdf(DBL_MAX, 3, 7, 1, false); }, "", 1, 1},
+    {"F cdf, x 1e-300, df2 1e300", [] { return FCdf(1e-300, 3, 1e300, 1, true); }, "", 1, 1},
   };
   // clang-format on
   for (const Case& c : cases) {

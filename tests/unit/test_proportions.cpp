@@ -6,6 +6,7 @@
 #include <qel/proportion_tests.h>
 
 #include <cmath>
+#include <functional>
 #include <limits>
 #include <string>
 #include <vector>
@@ -257,15 +258,25 @@ TEST(ProportionsBadInput, CodesAndNaN) {
   EXPECT_EQ(r.pValue, 0.125);
   EXPECT_EQ(RunOneProportionWilson(&r, false, badAlt, 0.5), 0);
   EXPECT_TRUE(std::isnan(r.pValue));
-  for (double confidence : {0.0, 1.0, kNaN}) {
-    OneProportion c = one(3, 10);
-    EXPECT_EQ(RunOneProportionMidP(&c, confidence, qel::kIntervalTwoSided), 0);
-    EXPECT_FALSE(c.lowerLimit > c.upperLimit);
-    // The symmetric interval refuses a confidence outside (0, 1) rather than
-    // turn inside out.
-    EXPECT_EQ(RunOneProportion(&c, true, confidence, qel::kIntervalTwoSided),
-              qel::qelFailBadEnumValue);
-    EXPECT_TRUE(std::isnan(c.lowerLimit) && std::isnan(c.upperLimit));
+  // Every interval refuses a confidence outside (0, 1) rather than cross.
+  const std::function<int(OneProportion*, double, IntervalType)> intervals[] = {
+      [](OneProportion* c, double v, IntervalType t) { return RunOneProportionMidP(c, v, t); },
+      [](OneProportion* c, double v, IntervalType t) { return RunOneProportion(c, true, v, t); },
+      [](OneProportion* c, double v, IntervalType t) { return RunOneProportion(c, false, v, t); },
+      [](OneProportion* c, double v, IntervalType t) { return RunLynOneProportion(c, false, v, t); },
+      [](OneProportion* c, double v, IntervalType t) {
+        return RunOneProportionWilson(c, true, v, t);
+      }};
+  for (double confidence : {-0.5, 0.0, 1.0, 1.5, kNaN}) {
+    for (const auto& interval : intervals) {
+      for (IntervalType type : {qel::kIntervalTwoSided, qel::kIntervalLowerBound}) {
+        for (unsigned events : {0u, 3u, 10u}) {
+          OneProportion c = one(events, 10);
+          EXPECT_EQ(interval(&c, confidence, type), qel::qelFailBadEnumValue) << confidence;
+          EXPECT_TRUE(std::isnan(c.lowerLimit) && std::isnan(c.upperLimit));
+        }
+      }
+    }
   }
   OneProportion empty = one(0, 0), over = one(12, 10);
   EXPECT_EQ(RunLynOneProportion(&empty, true, 0.95, qel::kIntervalTwoSided,

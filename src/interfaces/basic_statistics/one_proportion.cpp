@@ -31,10 +31,18 @@ int badType(double* lower, double* upper) {
   return qelFailBadEnumValue;
 }
 
+// The intervals that are not of the form centre -/+ z times a scale refuse a
+// confidence outside (0, 1) as the symmetric ones do: at 0 or 1 (or NaN) the
+// tail equations have no interior root and the limits would cross.
+bool badConfidence(double confidence) {
+  return !(confidence > 0.0 && confidence < 1.0);
+}
+
 // Clopper-Pearson limits from beta quantiles; x = 0 passes a shape of 0 to
 // the quantile, whose answer stands.
 int exactLimits(double x, double n, double confidence, IntervalType type, double* lower,
                 double* upper) {
+  if (badConfidence(confidence)) return badType(lower, upper);
   switch (type) {
     case kIntervalUpperBound:
       *lower = 0.0;
@@ -146,6 +154,7 @@ double midPBound(bool lowerBound, unsigned int x, unsigned int n, double alpha) 
 
 int midPLimits(OneProportion* r, double confidence, IntervalType type) {
   const unsigned int x = r->events, n = r->trials;
+  if (badConfidence(confidence)) return badType(&r->lowerLimit, &r->upperLimit);
   switch (type) {
     case kIntervalTwoSided: {
       const double alpha = (1.0 - confidence) * 0.5;
@@ -189,6 +198,7 @@ int wilsonLimits(OneProportion* r, bool correction, double confidence, IntervalT
     const double scale = RootOrNaN((1.0 - x / n) * x + 0.25 * z2) / d;
     return NormalInterval(confidence, type, centre, scale, &r->lowerLimit, &r->upperLimit);
   }
+  if (badConfidence(confidence)) return badType(&r->lowerLimit, &r->upperLimit);
   const double infinity = std::numeric_limits<double>::infinity();
   switch (type) {
     case kIntervalTwoSided:

@@ -2,6 +2,9 @@
 //
 // The F quantile of a noncentral F has no routine of its own: it is a root
 // search of the distribution function from 0 upward.
+#include <qel/elv.h>
+
+#include <algorithm>
 #include <cfloat>
 #include <cmath>
 #include <stdexcept>
@@ -27,6 +30,123 @@ constexpr double kSmallestNoncentrality = 2.2250738585072014e-307;
 // its upper end.
 constexpr double kSearchLimit = 1e30;
 constexpr double kLargestFArgument = 189812530.0;
+
+// The ELV beta routines answer a lower tail of 0 at an argument below
+// 2.2e-288, which is wrong for a small shape: I_z(s, t) is
+// z^s (1-z)^t / (s B(s, t)) (1 + O(t z)), near 1 for s = 5e-301.
+// tinyBetaLogLower gives ln I_z(s, t) by that leading term for ln z = lz,
+// or false where t z is not negligible or the shapes leave the range of the
+// log-density routine.
+bool tinyBetaLogLower(double lz, double s, double t, double* out) {
+  constexpr double kTiny = 2.2250738585072014e-288;
+  if (!(s >= DBL_MIN && t >= DBL_MIN) || t * std::exp(lz) > 1e-17) return false;
+  try {
+    if (s <= 1e-5) {
+      // ln(1 / (s B(s, t))) = ln Gamma(s + t) - ln Gamma(t) - ln Gamma(1 + s)
+      // by its Taylor series in s (Abramowitz & Stegun 6.1.33, 6.4.1), so
+      // that ln I stays accurate to its last digit where I is within 1e-298
+      // of 1 and the other tail is -expm1(ln I).
+      constexpr double kEuler = 0.57721566490153286061, kZeta2 = 1.6449340668482264365,
+                       kZeta3 = 1.2020569031595942854;
+      double ans[2] = {0.0, 0.0};
+      int nz = 0, ierr = 0;
+      XDPSIFN(t, 1, 1, 2, ans, &nz, &ierr);
+      if (ierr == 0) {
+        const double series = s * (psi(t) + kEuler) + s * s * (ans[0] - kZeta2) / 2.0 +
+                              s * s * s * (-2.0 * ans[1] + 2.0 * kZeta3) / 6.0;
+        // (1-z)^t times the first term of 2F1(s + t, 1; s + 1; z), the
+        // factor that completes the leading term, is 1 + s (1 - t) z/(1 + s)
+        // to first order in z: next to s ln z, t z alone would not cancel.
+        *out = s * lz + series + s * (1.0 - t) * std::exp(lz) / (1.0 + s);
+        return std::isfinite(*out);
+      }
+    }
+    // ln B(s, t) from the density at the normal point kTiny (z itself may
+    // be denormal, which the armed state reads as 0).
+    double lp = 0.0;
+    lnpbeta(&lp, s, t, kTiny);
+    const double lnBeta = (s - 1.0) * std::log(kTiny) + (t - 1.0) * std::log1p(-kTiny) - lp;
+    *out = s * lz + t * std::log1p(-std::exp(lz)) - std::log(s) - lnBeta;
+    return std::isfinite(*out);
+  } catch (const std::runtime_error&) {
+    return false;
+  }
+}
+
+// The F tails where a beta argument, y = c x/(d + c x) or w = 1 - y with
+// c = df1/2, d = df2/2, lies below 1e-280 (clear of the routines' border).
+// Small y: every further component of the Poisson mixture (mean
+// L = noncentrality/2) carries another factor y, so the lower tail is
+// e^-L I_y(c, d) and the upper tail -expm1 of its logarithm. Small w: the
+// upper tail is I_w(d, c) for a central F; a noncentral one mixes
+// I_w(d, c + j) over all j, answered here only where even the largest
+// component that counts underflows (otherwise no answer: *lower = NaN).
+// Tails below a bound under e^-760 are 0 without further work.
+// False where neither argument is that small, for the routines to answer.
+bool tinyBetaArgument(double x, double df1, double df2, double noncentrality, double* lower,
+                      double* upper) {
+  const double c = 0.5 * df1, d = 0.5 * df2, L = 0.5 * noncentrality;
+  if (!(c >= DBL_MIN && d >= DBL_MIN)) return false;  // no libm call on a denormal
+  const double lr = std::log(c) + std::log(x) - std::log(d), border = std::log(1e-280);
+  // ln of a bound on I_z(s, t): (z (s + t))^s / Gamma(s + 1), and on every
+  // I_z(s, t + j) that counts with t + j for t.
+  const double lnSum = std::log(std::max(c, d)) + 0.6931471805599453;
+  const auto lnBound = [lnSum](double lz, double s, double t) {
+    return s * (lz + std::max(lnSum, std::log(t))) - std::lgamma(s + 1.0);
+  };
+  double lnTail = 0.0;
+  if (lr < border) {
+    const double ly = lr - std::log1p(std::exp(lr));
+    if (lnBound(ly, c, d) < -760.0) {
+      lnTail = -HUGE_VAL;
+    } else if (!tinyBetaLogLower(ly, c, d, &lnTail)) {
+      return false;
+    }
+    lnTail -= L;
+    *lower = lnTail < -708.39 ? 0.0 : std::exp(lnTail);
+    *upper = -std::expm1(lnTail);
+    return true;
+  }
+  if (lr <= -border) return false;
+  const double lw = -lr - std::log1p(std::exp(-lr));
+  // j up to L + 40 sqrt(L) + 40 carries all the mixture's weight.
+  const double top = L + 40.0 * std::sqrt(L) + 40.0 + c;
+  if (lnBound(lw, d, L > 0.0 ? top : c) < -760.0) {
+    lnTail = -HUGE_VAL;
+  } else if (L > 0.0) {
+    *lower = *upper = mQuietNaN();
+    return true;
+  } else if (!tinyBetaLogLower(lw, d, c, &lnTail)) {
+    return false;
+  }
+  *upper = lnTail < -708.39 ? 0.0 : std::exp(lnTail);
+  *lower = -std::expm1(lnTail);
+  return true;
+}
+
+// Both tails of F beyond the F routine's largest argument, straight from the
+// beta laws, with c = df1/2, d = df2/2 and the beta argument below 1/2:
+// P(F <= x) is the lower tail at y = c x/(d + c x) of the beta law (c, d)
+// where c x <= d, and P(F > x) the lower tail at w = d/(d + c x) of the
+// law (d, c) otherwise; a noncentral F mixes over the shape c + j
+// (beta_ncdf, beta_ncdf2 with L/2). Here w >= 1e-280 (tinyBetaArgument
+// takes the rest); beyond c x = 1e13 d it is formed from logarithms, as
+// c x may overflow.
+ElvStatus betaMixtureTails(double x, double df1, double df2, double noncentrality, double* lower,
+                           double* upper) {
+  const double c = 0.5 * df1, d = 0.5 * df2, L = 0.5 * noncentrality;
+  double density = 0.0;
+  const double lr = std::log(c) + std::log(x) - std::log(d);
+  if (lr <= 0.0) {
+    const double y = c * x / (d + c * x);
+    if (L == 0.0) return elv_beta_df(y, c, d, lower, upper, &density);
+    return elv_beta_ncdf(y, c, d, L, lower, upper);
+  }
+  const double w =
+      lr < 30.0 && d < 1e290 ? d / (d + c * x) : std::exp(-lr - std::log1p(std::exp(-lr)));
+  if (L == 0.0) return elv_beta_df(w, d, c, upper, lower, &density);
+  return elv_beta_ncdf2(w, d, c, L, upper, lower);
+}
 
 }  // namespace
 
@@ -111,7 +231,15 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
     return true;
   }
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
-  if (ElvFailed(elv_F_ncdf(x, df1, df2, noncentrality, lower, upper))) {
+  if (tinyBetaArgument(x, df1, df2, noncentrality, lower, upper)) {
+    if (!std::isnan(*lower)) return true;
+    *lower = *upper = mGetMissingValueCode();
+    return false;
+  }
+  const ElvStatus status = x > kLargestFArgument
+                               ? betaMixtureTails(x, df1, df2, noncentrality, lower, upper)
+                               : elv_F_ncdf(x, df1, df2, noncentrality, lower, upper);
+  if (ElvFailed(status)) {
     *lower = *upper = mGetMissingValueCode();
     return false;
   }
@@ -131,6 +259,12 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
+  // A small df1 puts mass below the smallest normal double (all but
+  // 4e-14 of it at df1 = 1e-16; e^(-L/2) of it for a noncentral F, whose
+  // component j = 0 rises like x^(df1/2)): quantiles of p up to that mass
+  // are 0 to double precision.
+  double lowest = 0.0, above = 0.0;
+  if (mFCdf(DBL_MIN, df1, df2, noncentrality, &lowest, &above) && p <= lowest) return 0.0;
   if (noncentrality == 0.0) {
     // P(F <= x) = I_w(df1/2, df2/2), w = df1 x/(df2 + df1 x), and
     // P(F > x) = I_y(df2/2, df1/2), y = 1 - w: the tails of the central law

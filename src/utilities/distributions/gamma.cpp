@@ -6,6 +6,7 @@
 // bracket [0, q] that doubles until it holds p. Beyond the routines' range of
 // tails, and for the noncentral chi-square, which has no quantile routine,
 // the smaller tail is solved in logarithms (tail_quantile.h).
+#include <cfloat>
 #include <cmath>
 #include <stdexcept>
 
@@ -141,11 +142,12 @@ double CmChiSqCdf::operator()(double x) {
 
 double mGammaPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
-  // Loader's saddle-point form keeps the density's digits for large shapes.
-  const double z = mStandardize(x, threshold, scale);
-  if (std::isinf(z)) return 0.0;
+  // Loader's saddle-point form keeps the density's digits for large shapes;
+  // a distance x - threshold beyond DBL_MAX leaves a density of 0.
+  const double half = 0.5 * x - 0.5 * threshold;
+  if (half > 0.5 * DBL_MAX) return 0.0;
   try {
-    return saddle::gammaDensity(z, shape) / scale;
+    return saddle::gammaDensity(2.0 * half, shape, scale);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   } catch (const std::invalid_argument&) {
@@ -188,7 +190,7 @@ double mGammaInvCdfByRootFinder(double p, double shape, double start) {
 double mChiSqPdf(double x, double df) {
   if (x <= 0.0) return 0.0;
   try {
-    return saddle::gammaDensity(x / 2.0, df / 2.0) / 2.0;
+    return saddle::gammaDensity(x, df / 2.0, 2.0);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   } catch (const std::invalid_argument&) {

@@ -51,23 +51,39 @@ double mLogisticInvCdf(double p, double location, double scale) {
   }
 }
 
+// ln(x - threshold) from the halves, so that a distance beyond DBL_MAX
+// (x = DBL_MAX, threshold = -1e300) reaches no overflow; *half is half the
+// distance.
+double logDistance(double x, double threshold, double* half) {
+  *half = 0.5 * x - 0.5 * threshold;
+  return mLog(*half, true) + 0.69314718055994530942;
+}
+
 double mLogLogisticPdf(double x, double location, double scale, double threshold) {
   if (x <= threshold) return 0.0;
-  const double u = mLog(x - threshold, true);
+  double half = 0.0;
+  const double u = logDistance(x, threshold, &half);
   const double density = mLogisticPdf(u, location, scale);
   if (mIsNumericMissing(density)) return density;
-  return density / (x - threshold);
+  return density / half / 2.0;
 }
 
 double mLogLogisticCdf(double x, double location, double scale, double threshold, bool upperTail) {
   if (x <= threshold) return upperTail ? 1.0 : 0.0;
-  return mLogisticCdf(mLog(x - threshold, true), location, scale, upperTail);
+  double half = 0.0;
+  return mLogisticCdf(logDistance(x, threshold, &half), location, scale, upperTail);
 }
 
+// A quantile beyond the double range (exp of a logit times a scale of 1e6,
+// or a threshold near DBL_MAX) has no double: no answer.
 double mLogLogisticInvCdf(double p, double location, double scale, double threshold) {
   const double u = mLogisticInvCdf(p, location, scale);
   if (mIsNumericMissing(u)) return u;
-  return threshold + mExponential(u, true);
+  try {
+    return threshold + mExponential(u, true);
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
 }
 
 }  // namespace qel

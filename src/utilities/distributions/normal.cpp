@@ -109,13 +109,19 @@ double mNormalCdf(double x, double mean, double sigma, bool upperTail) {
   return upperTail ? upper : lower;
 }
 
+// A quantile beyond the double range (sigma near DBL_MAX) has no double:
+// no answer.
 double mNormalInvCdf(double p, double mean, double sigma) {
   if (elv::elvPrecision() == elv::ElvPrecision::Full && p > 0.0 && p < 1.0) {
     return mean + sigma * elv::normalQuantile(p);
   }
   const double z = standardNormalQuantile(p);
   if (mIsNumericMissing(z)) return z;
-  return mean + sigma * z;
+  try {
+    return mean + sigma * z;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
 }
 
 double mNormalPValue(double z, EAlternative alternative) {
@@ -187,7 +193,11 @@ double mHalfNormalCdf(double x, double scale, double location, bool upperTail) {
 double mHalfNormalInvCdf(double p, double scale, double location) {
   const double z = standardNormalQuantile((1.0 + p) / 2.0);
   if (mIsNumericMissing(z)) return z;
-  return location + scale * z;
+  try {
+    return location + scale * z;
+  } catch (const std::runtime_error&) {
+    return mGetMissingValueCode();
+  }
 }
 
 }  // namespace qel

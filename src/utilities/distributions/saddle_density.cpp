@@ -4,6 +4,7 @@
 
 #include <cfloat>
 #include <cmath>
+#include <initializer_list>
 #include <stdexcept>
 
 namespace qel {
@@ -84,6 +85,9 @@ double stirlerr(double n) {
   }
   // Stirling's series: 1/12, 1/360, 1/1260, 1/1680, 1/1188 over odd powers.
   const double s0 = 1.0 / 12, s1 = 1.0 / 360, s2 = 1.0 / 1260, s3 = 1.0 / 1680, s4 = 1.0 / 1188;
+  // Beyond 1e10 the next term is below 1e-21 of the first (and n * n
+  // would overflow from 1e154 on).
+  if (n > 1e10) return s0 / n;
   const double nn = n * n;
   if (n > 500.0) return (s0 - s1 / nn) / n;
   if (n > 80.0) return (s0 - (s1 - s2 / nn) / nn) / n;
@@ -112,7 +116,7 @@ double bd0(double x, double m) {
   if (x == 0.0) return m;
   const double lr = logRatio(x, m);
   // A deviance beyond the double range: the mass is 0 to double precision.
-  if (lr > 0.0 && x > DBL_MAX / lr) return HUGE_VAL;
+  if (lr > 0.0 && x > DBL_MAX / (lr + 1.0)) return HUGE_VAL;
   return x * lr + m - x;
 }
 
@@ -136,32 +140,195 @@ double binomialMass(double x, double n, double p, double q) {
   return checkedExp(lc) * std::sqrt(n / (k2Pi * x * (n - x)));
 }
 
-// x^(a-1) e^-x / Gamma(a): a Poisson mass of mean x at a - 1.
-double gammaDensity(double x, double shape) {
-  if (!(x > 0.0)) return 0.0;
-  if (shape < 1.0) return poissonMass(shape, x) * shape / x;
-  return poissonMass(shape - 1.0, x);
+// --- Continuous densities at any shape ---------------------------------------
+//
+// The densities below keep Loader's split of a density into exp(core) times
+// a factor, core = -stirlerr - deviance formed without cancellation, but
+// carry every quantity that can leave the double range (a mean n p below
+// DBL_MIN, a ratio m x / n beyond DBL_MAX, a factor 1 / (x (1 - x)) at
+// x = 1e-300) by its logarithm. Shapes, degrees of freedom and scales from
+// 1e-300 to 1e300 thus give the density to about 1e-13 relative, or 0 where
+// it lies below the double range; a density above DBL_MAX has no double and
+// is refused (overflow_error).
+
+namespace {
+
+constexpr double kDirectLow = 1e-100, kDirectHigh = 1e100;
+
+// Inputs inside [1e-100, 1e100] let a product of up to three of them be
+// formed directly, with the few-ulp accuracy of plain arithmetic.
+bool direct(std::initializer_list<double> values) {
+  for (double v : values)
+    if (!(v >= kDirectLow && v <= kDirectHigh)) return false;
+  return true;
 }
 
-// x^(a-1) (1-x)^(b-1) / B(a, b) = (a + b - 1) times a binomial mass of
-// a - 1 in a + b - 2 trials, for shapes of at least 1.
+// exp(core) times a factor f = exp(lf); f is 0 where it was not formed.
+double scaledExp(double core, double f, double lf) {
+  if (f > 0.0 && core > -700.0 && core < 700.0 && std::fabs(core + lf) < 700.0)
+    return std::exp(core) * f;
+  return checkedExp(core + lf);
+}
+
+// The deviance x ln(x/m) + m - x where the mean m may lie below DBL_MIN
+// (then given by lm = ln m; m itself is negligible beside x >= DBL_MIN) or
+// beyond DBL_MAX (a deviance beyond the double range).
+double deviance(double x, double m, double lm) {
+  if (!(m <= DBL_MAX)) return HUGE_VAL;
+  if (m >= DBL_MIN) return bd0(x, m);
+  if (x == 0.0) return 0.0;
+  return x * (checkedLog(x) - lm) - x;
+}
+
+// The mean n p; from its logarithm lm where p lies below DBL_MIN (n p may
+// still be a normal number, 5e-11 at n = 5e299, p = 1e-310).
+double mean(double n, double p, double lm) {
+  if (p >= DBL_MIN) return n * p;
+  return lm < -708.0 ? 0.0 : std::exp(lm);
+}
+
+// A point of (0, 1) with its complement and both logarithms, each formed
+// where it does not underflow.
+struct UnitPoint {
+  double p, q, lp, lq;
+};
+
+// ln of Gamma(x+y+1)/(Gamma(x+1) Gamma(y+1)) p^x q^y as core + lf, with the
+// direct factor in *f (0 when not formed); x, y >= 0 given apart so that
+// neither is lost in the rounding of x + y.
+double binomialCore(double x, double y, const UnitPoint& u, double* f, double* lf) {
+  *f = 1.0;
+  *lf = 0.0;
+  if (x == 0.0) return y * u.lq;
+  if (y == 0.0) return x * u.lp;
+  const double n = x + y, ln = checkedLog(n);
+  const double core = stirlerr(n) - stirlerr(x) - stirlerr(y) -
+                      deviance(x, mean(n, u.p, ln + u.lp), ln + u.lp) -
+                      deviance(y, mean(n, u.q, ln + u.lq), ln + u.lq);
+  const double lx = checkedLog(x), ly = checkedLog(y);
+  *lf = 0.5 * (ln - lx - ly) - kLnSqrt2Pi;
+  *f = direct({x, y, n}) ? std::sqrt(n / (k2Pi * x * y)) : 0.0;
+  return core;
+}
+
+// The beta density at u: (a + b - 1) times a binomial mass of a - 1 in
+// a + b - 2 trials for shapes of at least 1; otherwise the mass of a in
+// a + b trials times a b / ((a + b) p q).
+double betaAt(const UnitPoint& u, double a, double b) {
+  double f = 0.0, lf = 0.0, core = 0.0;
+  if (a >= 1.0 && b >= 1.0) {
+    core = binomialCore(a - 1.0, b - 1.0, u, &f, &lf);
+    const double c = a + b - 1.0;
+    lf += checkedLog(c);
+    f *= c;
+  } else {
+    core = binomialCore(a, b, u, &f, &lf);
+    lf += checkedLog(a) + checkedLog(b) - checkedLog(a + b) - u.lp - u.lq;
+    f = direct({a, b, u.p, u.q}) ? f * (a / (a + b)) * (b / (u.p * u.q)) : 0.0;
+  }
+  return scaledExp(core, f, lf);
+}
+
+}  // namespace
+
+// x^(a-1) e^-x / Gamma(a) at x = d / scale, over scale: a Poisson mass of
+// mean x at a - 1 (or at a, times a / x, for a < 1).
+double gammaDensity(double d, double shape, double scale) {
+  if (!(d > 0.0)) return 0.0;
+  const double ls = checkedLog(scale), lz = checkedLog(d) - ls;
+  const double z = lz > 708.0 ? HUGE_VAL : lz < -708.0 ? 0.0 : d / scale;
+  const double k = shape < 1.0 ? shape : shape - 1.0;
+  double core = -z, lf = -ls, f = 1.0 / scale;
+  if (k > 0.0) {
+    core = -stirlerr(k) - deviance(k, z, lz);
+    lf -= kLnSqrt2Pi + 0.5 * checkedLog(k);
+    f = direct({k, scale}) ? f / std::sqrt(k2Pi * k) : 0.0;
+  }
+  if (shape < 1.0) {
+    lf += checkedLog(shape) - lz;
+    f = direct({shape, z, scale}) ? f * (shape / z) : 0.0;
+  }
+  return scaledExp(core, f, lf);
+}
+
 double betaDensity(double x, double a, double b) {
   if (!(x > 0.0 && x < 1.0)) return 0.0;
-  if (a >= 1.0 && b >= 1.0) return (a + b - 1.0) * binomialMass(a - 1.0, a + b - 2.0, x, 1.0 - x);
-  // A shape below 1: the mass of a in a + b trials is x^a (1-x)^b
-  // Gamma(a+b+1)/(Gamma(a+1) Gamma(b+1)), and 1/B(a,b) is that constant
-  // times a b/(a + b).
-  return a * b / ((a + b) * x * (1.0 - x)) * binomialMass(a, a + b, x, 1.0 - x);
+  const UnitPoint u = {x, 1.0 - x, checkedLog(x), std::log1p(-x)};
+  return betaAt(u, a, b);
 }
 
-// F density with m, n degrees of freedom through the binomial form with
-// p = m x/(n + m x), q = n/(n + m x).
+namespace {
+
+// e^l, as 0 below the normal range and HUGE_VAL above it.
+double boundedExp(double l) {
+  return l < -708.0 ? 0.0 : l > 709.0 ? HUGE_VAL : std::exp(l);
+}
+
+// The deviance bd0(c, m) with m = c / u, given the relative gap t = u - 1
+// and u apart (each formed without cancellation by the caller): c g(t) with
+// g(t) = ln(1 + t) - t / (1 + t). Near t = 0 by Loader's series in
+// v = (c - m)/(c + m) = t / (2 + t), whose terms have one sign.
+double relativeDeviance(double c, double t, double u) {
+  const double v = t / (1.0 + u);
+  if (std::fabs(v) < 0.5) {
+    double s = c * t / u * v;
+    double term = 2.0 * c * v;
+    const double vv = v * v;
+    for (int j = 1; j < 1000; ++j) {
+      term *= vv;
+      const double next = s + term / (2 * j + 1);
+      if (next == s) return next;
+      s = next;
+    }
+    return s;
+  }
+  // u far below 1: g = 1/u - 1 + ln u, and c / u may leave the double range.
+  if (u < 1e-300) {
+    const double lu = checkedLog(u);
+    if (checkedLog(c) - lu > 709.0) return HUGE_VAL;
+    return c / u - c + c * lu;
+  }
+  const double g = checkedLog(u) - t / u;
+  return g > 1.0 && c > DBL_MAX / g ? HUGE_VAL : c * g;
+}
+
+}  // namespace
+
+// The F density with m, n degrees of freedom as Loader's binomial form in
+// a = m/2, b = n/2, N = a + b at p = m x / (n + m x):
+//   f(x) = exp(stirlerr(N) - stirlerr(a) - stirlerr(b) - bd0(a, N p) - bd0(b, N q))
+//          sqrt(a b / (2 pi N)) / x.
+// The means N p and N q are never formed: a / (N p) = 1 + t and
+// b / (N q) = 1 + s with t = (b/N)(1 - x)/x and s = (a/N)(x - 1), exact to
+// a few ulps however large the degrees of freedom (a rounded N p would put
+// an error of N eps into a deviance that must be known to 1e-15).
 double fDensity(double x, double m, double n) {
   if (!(x > 0.0)) return 0.0;
-  const double s = n + m * x;
-  const double p = m * x / s, q = n / s;
-  if (m >= 2.0) return m * q / 2.0 * binomialMass((m - 2.0) / 2.0, (m + n - 2.0) / 2.0, p, q);
-  return m * m * q / (2.0 * p * (m + n)) * binomialMass(m / 2.0, (m + n) / 2.0, p, q);
+  const double a = 0.5 * m, b = 0.5 * n, N = a + b;
+  const double wa = a / N, wb = b / N, lx = checkedLog(x);
+  // 1 + t = wa + wb / x and 1 + s = wb + wa x. A weight below DBL_MIN (a
+  // shape of 1e-300 beside one of 1e10) is not negligible beside the other
+  // term when x is as small or as large: those terms go through logarithms.
+  double wbOverX = wb / x, waTimesX = wa * x, ut = wa + wbOverX, us = wb + waTimesX;
+  double t = wb * ((1.0 - x) / x), s = wa * (x - 1.0);
+  if (wb < DBL_MIN) {
+    const double la = checkedLog(a), lb = checkedLog(b);
+    wbOverX = boundedExp(lb - checkedLog(N) - lx);
+    t = wbOverX * (1.0 - x);
+    ut = wa + wbOverX;
+    us = waTimesX * (1.0 + boundedExp(lb - la - lx));
+  } else if (wa < DBL_MIN) {
+    const double la = checkedLog(a), lb = checkedLog(b);
+    waTimesX = boundedExp(la + lx - checkedLog(N));
+    s = waTimesX;
+    us = wb + waTimesX;
+    ut = wbOverX * (1.0 + boundedExp(la + lx - lb));
+  }
+  const double core = stirlerr(N) - stirlerr(a) - stirlerr(b) - relativeDeviance(a, t, ut) -
+                      relativeDeviance(b, s, us);
+  const double lf = 0.5 * (checkedLog(a) + checkedLog(b) - checkedLog(N)) - kLnSqrt2Pi - lx;
+  const double f = direct({wa, b, x}) ? std::sqrt(wa * b / k2Pi) / x : 0.0;
+  return scaledExp(core, f, lf);
 }
 
 // Gamma(u) / (Gamma(v) sqrt(n pi)) (1 + x^2/n)^-u with u = (n+1)/2,
@@ -170,9 +337,16 @@ double fDensity(double x, double m, double n) {
 // the deviance bd0(v, u) = v ln(v/u) + u - v collecting the powers.
 double tDensity(double x, double n) {
   const double u = (n + 1.0) / 2.0, v = n / 2.0;
-  const double r = std::fabs(x) / std::sqrt(n);
-  // ln(1 + r^2), without forming r^2 where it would overflow.
-  const double lg = r > 1e100 ? 2.0 * checkedLog(r) : std::log1p(r * r);
+  const double ax = std::fabs(x), sn = std::sqrt(n);
+  // ln(1 + r^2) with r = |x| / sqrt(n), without forming r or r^2 where
+  // they would overflow.
+  double lg = 0.0;
+  if (ax / 1e150 > sn) {
+    lg = 2.0 * (checkedLog(ax) - checkedLog(sn));
+  } else {
+    const double r = ax / sn;
+    lg = r > 1e100 ? 2.0 * checkedLog(r) : std::log1p(r * r);
+  }
   const double exponent = stirlerr(u) - stirlerr(v) - bd0(v, u) - u * lg;
   return checkedExp(exponent - kLnSqrt2Pi);
 }

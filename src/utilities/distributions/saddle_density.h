@@ -20,8 +20,9 @@ double poissonMass(double x, double m);
 // for real 0 <= x <= n.
 double binomialMass(double x, double n, double p, double q);
 
-// Densities at x (0 where x is outside the open support).
-double gammaDensity(double x, double shape);  // unit scale
+// Densities at x (0 where x is outside the open support), for any positive
+// normal shapes; the gamma density at d = x - threshold > 0 with its scale.
+double gammaDensity(double d, double shape, double scale);
 double betaDensity(double x, double a, double b);
 double fDensity(double x, double m, double n);
 double tDensity(double x, double n);

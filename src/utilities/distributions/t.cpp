@@ -98,8 +98,14 @@ double CmTCdf::operator()(double x) {
 }
 
 double mTPdf(double x, double df, double noncentrality) {
+  if (noncentrality == 0.0) {
+    try {
+      return saddle::tDensity(x, df);
+    } catch (const std::exception&) {
+      return mGetMissingValueCode();
+    }
+  }
   try {
-    if (noncentrality == 0.0) return saddle::tDensity(x, df);
     if (x == 0.0) {
       const double a = (df + 1.0) / 2.0;
       const double b = df / 2.0;

@@ -35,9 +35,11 @@ class FirstShapeLower : public MixtureComponents {
   FirstShapeLower(double a, double b, double x) : a_(a), b_(b), x_(x) {}
   int series(long j, double* factor) const override { return beta_Iabx(factor, a_ + j, b_, x_); }
   double step(long j, double* factor) const override {
-    const double A = a_ + j;
-    const double ratio = 1.0 + (1.0 - x_) / ((A + b_ - 1.0) * *factor);
-    *factor = A > 1.0 ? (*factor * (A + b_ - 1.0) + 1.0 - x_) * x_ / (A - 1.0) : 1.0;
+    // A - 1 = a + (j - 1), not (a + j) - 1: a shape below the spacing of
+    // the doubles near j (df1 = 1e-16) would vanish from the difference.
+    const double previous = a_ + static_cast<double>(j - 1);
+    const double ratio = 1.0 + (1.0 - x_) / ((previous + b_) * *factor);
+    *factor = previous > 0.0 ? (*factor * (previous + b_) + 1.0 - x_) * x_ / previous : 1.0;
     return ratio;
   }
   double logComponent(long j, double factor) const override {

@@ -4,8 +4,8 @@
 
 #include <climits>
 
-#include "utilities/elv/wrappers.h"
 #include "utilities/elv/thread_status.h"
+#include "utilities/elv/wrappers.h"
 
 namespace qel {
 
@@ -48,6 +48,11 @@ ElvStatus elv_beta_lower_quant(double p, double a, double b, double* quantile) {
 
 ElvStatus elv_beta_ncdf(double x, double a, double b, double L, double* lower, double* upper) {
   beta_ncdf(x, a, b, L, lower, upper);
+  return status();
+}
+
+ElvStatus elv_beta_ncdf2(double x, double a, double b, double L, double* lower, double* upper) {
+  beta_ncdf2(x, a, b, L, lower, upper);
   return status();
 }
 

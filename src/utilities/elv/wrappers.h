@@ -62,6 +62,7 @@ ElvStatus elv_beta_df(double x, double a, double b, double* lower, double* upper
 ElvStatus elv_beta_upper_quant(double p, double a, double b, double* quantile);
 ElvStatus elv_beta_lower_quant(double p, double a, double b, double* quantile);
 ElvStatus elv_beta_ncdf(double x, double a, double b, double L, double* lower, double* upper);
+ElvStatus elv_beta_ncdf2(double x, double a, double b, double L, double* lower, double* upper);
 ElvStatus elv_F_df(double x, double df1, double df2, double* lower, double* upper);
 ElvStatus elv_F_ncdf(double x, double df1, double df2, double L, double* lower, double* upper);
 ElvStatus elv_F_upper_quant(double p, double df1, double df2, double* quantile);
