@@ -7,6 +7,7 @@
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/beta_ratio.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
@@ -55,6 +56,9 @@ double mBetaCdf(double x, double a, double b, bool upperTail) {
   if (x <= 0.0) return upperTail ? 1.0 : 0.0;
   if (x >= 1.0) return upperTail ? 0.0 : 1.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
+  if (betaratio::fastTails(a, b, x, 0.5 + (0.5 - x), &lower, &upper)) {
+    return upperTail ? upper : lower;
+  }
   if (ElvFailed(elv_beta_df(x, a, b, &lower, &upper, &density))) return mGetMissingValueCode();
   return upperTail ? upper : lower;
 }

@@ -10,6 +10,7 @@
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/gamma_ratio.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
@@ -157,6 +158,7 @@ double mGammaCdf(double x, double shape, double scale, double threshold, bool up
   if (x < threshold) return upperTail ? 1.0 : 0.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
   const double z = mStandardize(x, threshold, scale);
+  if (gammaratio::fastTails(shape, z, &lower, &upper)) return upperTail ? upper : lower;
   if (ElvFailed(elv_gamma_df(z, shape, &lower, &upper, &density))) return mGetMissingValueCode();
   return upperTail ? upper : lower;
 }
@@ -206,6 +208,7 @@ bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double*
     *upper = 1.0;
     return true;
   }
+  if (noncentrality == 0.0 && gammaratio::fastTails(df / 2.0, x / 2.0, lower, upper)) return true;
   if (ElvFailed(elv_chi2_ncdf(x, df, noncentrality, lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
     return false;
