@@ -70,7 +70,10 @@ double mBetaInvCdf(double p, double a, double b) {
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_beta_lower_quant(p, a, b, &q) : elv_beta_upper_quant(1.0 - p, a, b, &q);
+  // TOMS 708's tails where it answers: for small shapes the quantile
+  // magnifies a tail's relative error by about 1/a (1/b near 1).
   const TailPair tails = [a, b](double x, double* lower, double* upper) {
+    if (betaratio::fastTails(a, b, x, 0.5 + (0.5 - x), lower, upper)) return true;
     double density = 0.0;
     return !ElvFailed(elv_beta_df(x, a, b, lower, upper, &density));
   };

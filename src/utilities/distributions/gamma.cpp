@@ -67,7 +67,10 @@ double gammaElvQuantile(double p, double shape) {
 // beyond its range by the tail search started from its range limit.
 double gammaQuantileFromElv(double p, double shape) {
   if (!mPositiveShapes(shape)) return mGetMissingValueCode();
+  // The fast kernel's tails where it answers: for a small shape the quantile
+  // magnifies a tail's relative error by 1/shape.
   const TailPair tails = [shape](double x, double* lower, double* upper) {
+    if (gammaratio::fastTails(shape, x, lower, upper)) return true;
     double density = 0.0;
     return !ElvFailed(elv_gamma_df(x, shape, lower, upper, &density));
   };

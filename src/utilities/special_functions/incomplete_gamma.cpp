@@ -351,8 +351,8 @@ bool temmeGammaRatios(double a, double x, double* p, double* q) {
   if (!(a >= kTemmeSmallestShape) || !(x > 0.0) || std::isinf(a) || std::isinf(x)) return false;
   const double s = 0.5 + (0.5 - x / a);
   if (!(std::fabs(s) <= kTemmeReach)) return false;
-  const Ratios r = largeShape(a, x, std::max(kAcc0[kLevel], spmpar(1)), kE00[kLevel],
-                              kX00[kLevel], spmpar(1));
+  const Ratios r =
+      largeShape(a, x, std::max(kAcc0[kLevel], spmpar(1)), kE00[kLevel], kX00[kLevel], spmpar(1));
   if (r.indeterminate) return false;
   *p = r.p;
   *q = r.q;
