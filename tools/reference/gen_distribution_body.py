@@ -169,10 +169,29 @@ def quantile_rows():
     return out
 
 
+def deep_tail_rows():
+    """Tails between 1e-308 and 1e-280, where the fast kernels hand over to the
+    ELV routines."""
+    out = [["gamma", "lower", 1.0, shape, 1.0, 0.0, 0.0, p_gamma(shape, 1)]
+           for shape in (160.0, 165.0)]
+    out.append(["poisson", "upper", 168.0, 1.0, 0.0, 0.0, 0.0, p_gamma(168, 1)])
+    out.append(["beta", "lower", 1e-3, 100.0, 2.0, 0.0, 0.0,
+                mpmath.betainc(100, 2, 0, d(1e-3), regularized=True)])
+    out.append(["binomial", "upper", 150.0, 150.0, 0.01, 0.0, 0.0, d(0.01) ** 150])
+    out.append(["t", "lower", -1e40, 7.0, 0.0, 0.0, 0.0, student_t_lower(-1e40, 7)])
+    return out
+
+
+def student_t_lower(t, n):
+    """P(T <= t), t < 0: I_x(n/2, 1/2)/2 with x = n/(n + t^2)."""
+    n, t = mpmath.mpf(n), d(t)
+    return mpmath.betainc(n / 2, mpmath.mpf(1) / 2, 0, n / (n + t * t), regularized=True) / 2
+
+
 def main():
     mpmath.mp.dps = 60
     rows = gamma_rows() + poisson_rows() + beta_rows() + binomial_rows()
-    rows += hypergeometric_rows() + quantile_rows()
+    rows += hypergeometric_rows() + quantile_rows() + deep_tail_rows()
     header = "family,function,x,param1,param2,param3,param4,expected"
     write_rows(os.path.join(DATA, "distribution_body.csv"), header, rows)
 

@@ -118,6 +118,13 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
     return true;
   }
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
+  // Central: I_z(df1/2, df2/2) at z = df1 x/(df1 x + df2), whose complement
+  // df2/(df1 x + df2) is formed apart (TOMS 708).
+  const double scaled = df1 * x, sum = scaled + df2;
+  if (noncentrality == 0.0 && std::isfinite(sum) &&
+      betaratio::fastTails(df1 / 2.0, df2 / 2.0, scaled / sum, df2 / sum, lower, upper)) {
+    return true;
+  }
   if (ElvFailed(elv_F_ncdf(x, df1, df2, noncentrality, lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
     return false;
@@ -146,6 +153,9 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
     // of a difference from 1.
     const TailPair tails = [df1, df2](double x, double* lower, double* upper) {
       const double w = df1 * x / (df2 + df1 * x);
+      if (betaratio::fastTails(df1 / 2.0, df2 / 2.0, w, df2 / (df2 + df1 * x), lower, upper)) {
+        return true;
+      }
       double density = 0.0;
       if (w <= 0.5) return !ElvFailed(elv_beta_df(w, df1 / 2.0, df2 / 2.0, lower, upper, &density));
       const double y = df2 / (df2 + df1 * x);
