@@ -29,6 +29,13 @@ constexpr double kSmallestNoncentrality = 2.2250738585072014e-307;
 constexpr double kSearchLimit = 1e30;
 constexpr double kLargestFArgument = 189812530.0;
 
+// True when df1 x and df2 + df1 x stay far inside the double range (the
+// comparisons are quiet, the division cannot overflow).
+bool centralFArgumentsFit(double x, double df1, double df2) {
+  return std::islessequal(df1, 1e300) && std::islessequal(df2, 1e300) &&
+         std::islessequal(x, 1e300 / std::fmax(df1, 1.0));
+}
+
 }  // namespace
 
 // --- Beta ------------------------------------------------------------------
@@ -120,10 +127,12 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
   // Central: I_z(df1/2, df2/2) at z = df1 x/(df1 x + df2), whose complement
   // df2/(df1 x + df2) is formed apart (TOMS 708).
-  const double scaled = df1 * x, sum = scaled + df2;
-  if (noncentrality == 0.0 && std::isfinite(sum) &&
-      betaratio::fastTails(df1 / 2.0, df2 / 2.0, scaled / sum, df2 / sum, lower, upper)) {
-    return true;
+  if (noncentrality == 0.0 && centralFArgumentsFit(x, df1, df2)) {
+    const double scaled = df1 * x, sum = scaled + df2;
+    if (std::isfinite(sum) &&
+        betaratio::fastTails(df1 / 2.0, df2 / 2.0, scaled / sum, df2 / sum, lower, upper)) {
+      return true;
+    }
   }
   if (ElvFailed(elv_F_ncdf(x, df1, df2, noncentrality, lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
@@ -153,7 +162,8 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
     // of a difference from 1.
     const TailPair tails = [df1, df2](double x, double* lower, double* upper) {
       const double w = df1 * x / (df2 + df1 * x);
-      if (betaratio::fastTails(df1 / 2.0, df2 / 2.0, w, df2 / (df2 + df1 * x), lower, upper)) {
+      if (centralFArgumentsFit(x, df1, df2) &&
+          betaratio::fastTails(df1 / 2.0, df2 / 2.0, w, df2 / (df2 + df1 * x), lower, upper)) {
         return true;
       }
       double density = 0.0;

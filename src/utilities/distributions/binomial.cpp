@@ -41,7 +41,9 @@ double binomialLowerTailByBeta(double k, double n, double p) {
 // the counts k and j are those of the mirrored route below. False where that
 // route decides: outside 0 < p < 1, beyond 2^53 trials, deep tails.
 bool binomialTailByBratio(double x, double n, double p, bool upperTail, double* out) {
-  if (!(p > 0.0 && p < 1.0) || !(n <= kExactCountLimit)) return false;
+  if (!(std::isgreater(p, 0.0) && std::isless(p, 1.0) && std::islessequal(n, kExactCountLimit))) {
+    return false;
+  }
   const double q = 0.5 + (0.5 - p);
   double lower = 0.0, upper = 0.0;
   if (!upperTail) {

@@ -2,6 +2,7 @@
 #include "utilities/distributions/gamma_ratio.h"
 
 #include <cmath>
+#include <exception>
 
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/elv/precision.h"
@@ -86,8 +87,12 @@ bool finish(double direct, bool directIsLower, double* lower, double* upper) {
 
 }  // namespace
 
-bool tails(double a, double x, double* lower, double* upper) {
-  if (!(a > 0.0) || !(x > 0.0) || std::isinf(a) || std::isinf(x)) return false;
+static bool tailsUnguarded(double a, double x, double* lower, double* upper) {
+  // Quiet comparisons: a NaN must not raise the invalid operation in an armed
+  // thread.
+  if (!std::isgreater(a, 0.0) || !std::isgreater(x, 0.0) || std::isinf(a) || std::isinf(x)) {
+    return false;
+  }
   double p, q;
   if (smallShapeGammaRatios(a, x, &p, &q)) return finish(p < q ? p : q, p < q, lower, upper);
   if (temmeGammaRatios(a, x, &p, &q)) {
@@ -103,6 +108,16 @@ bool tails(double a, double x, double* lower, double* upper) {
   }
   double fraction;
   return upperFraction(a, x, &fraction) && finish(a * mass * fraction, false, lower, upper);
+}
+
+// A floating-point trap in the prefactor at extreme arguments (Stirling's
+// series squares a shape beyond 1e154) leaves the answer to the ELV routine.
+bool tails(double a, double x, double* lower, double* upper) {
+  try {
+    return tailsUnguarded(a, x, lower, upper);
+  } catch (const std::exception&) {
+    return false;
+  }
 }
 
 bool fastTails(double a, double x, double* lower, double* upper) {

@@ -66,7 +66,7 @@ double centralTFarTail(double t, double n) {
 // 1/2 + (1 - I_x)/2, free of cancellation. False where TOMS 708 does not
 // answer (historical ELV setting, deep tails, t^2 outside the double range).
 bool centralTByIncompleteBeta(double t, double n, double* lower, double* upper) {
-  if (!(std::fabs(t) < kFarT) || !(n > 0.0) || std::isinf(n)) return false;
+  if (!std::isless(std::fabs(t), kFarT) || !std::isgreater(n, 0.0) || std::isinf(n)) return false;
   if (t == 0.0) {
     *lower = *upper = 0.5;
     return true;
