@@ -152,8 +152,9 @@ def quantile_rows():
         a = d(shape)
         for p in ps:
             P = d(p)
-            q = increasing_root(lambda y: p_gamma(a, y) - P if p <= 0.5 else (1 - P) - q_gamma(a, y),
-                                mpmath.mpf(10) ** -20000, mpmath.mpf(10) ** 4)
+            def f(y):
+                return p_gamma(a, y) - P if p <= 0.5 else (1 - P) - q_gamma(a, y)
+            q = increasing_root(f, mpmath.mpf(10) ** -20000, mpmath.mpf(10) ** 4)
             out.append(["gamma", "inv", p, shape, 1.0, 0.0, 0.0, q])
     for a, b in ((0.05, 4.0), (0.2, 0.3), (0.5, 0.5), (0.3, 8.0), (6.0, 0.15)):
         A, B = d(a), d(b)
