@@ -12,6 +12,7 @@
 #include <boost/math/distributions.hpp>
 #include <cmath>
 #include <cstdio>
+#include <cstdlib>
 #include <fstream>
 #include <functional>
 #include <map>
@@ -311,6 +312,8 @@ int main(int argc, char** argv) {
   qel::RegisterLynSigfpeHandler();
   const std::string dir = argc > 1 ? argv[1] : "tests/data";
   const auto table = families();
+  const char* detailText = std::getenv("QEL_ACCURACY_DETAIL");
+  const double detail = detailText ? std::strtod(detailText, nullptr) : 0.0;
   struct Three {
     Worst qel, boost, r;
   };
@@ -318,7 +321,8 @@ int main(int argc, char** argv) {
   std::map<std::string, Eval> rTable;
   for (const auto& f : table) rTable[f.first] = rmath(f.first);
   for (const char* name : {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
-                           "distribution_precision_nct.csv", "noncentral_t_grid.csv"}) {
+                           "distribution_precision_nct.csv", "noncentral_t_grid.csv",
+                           "distribution_body.csv"}) {
     // The noncentral t grid has rows function,x,df,delta,expected.
     const bool tGrid = std::string(name) == "noncentral_t_grid.csv";
     std::ifstream in(dir + "/" + name);
@@ -357,6 +361,11 @@ int main(int argc, char** argv) {
       std::string key = family + (noncentral ? " (noncentral)" : "") + " | " + function +
                         (beyond ? " (p beyond 1e-12)" : "");
       auto& r = results[key];
+      // QEL_ACCURACY_DETAIL=<error> lists libqel's points above that error.
+      if (detail > 0.0 && relativeError(mine, expected) > detail) {
+        std::fprintf(stderr, "%s %s x=%.17g p=%.17g,%.17g,%.17g err=%.2e\n", family.c_str(),
+                     function.c_str(), x, p[0], p[1], p[2], relativeError(mine, expected));
+      }
       r.qel.add(relativeError(mine, expected), isTail);
       r.boost.add(relativeError(theirs, expected), isTail);
       r.r.add(relativeError(rs, expected), isTail);

@@ -10,6 +10,7 @@
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/beta_ratio.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
@@ -148,6 +149,13 @@ ElvStatus betaMixtureTails(double x, double df1, double df2, double noncentralit
   return elv_beta_ncdf2(w, d, c, L, upper, lower);
 }
 
+// True when df1 x and df2 + df1 x stay far inside the double range (the
+// comparisons are quiet, the division cannot overflow).
+bool centralFArgumentsFit(double x, double df1, double df2) {
+  return std::islessequal(df1, 1e300) && std::islessequal(df2, 1e300) &&
+         std::islessequal(x, 1e300 / std::fmax(df1, 1.0));
+}
+
 }  // namespace
 
 // --- Beta ------------------------------------------------------------------
@@ -175,6 +183,9 @@ double mBetaCdf(double x, double a, double b, bool upperTail) {
   if (x <= 0.0) return upperTail ? 1.0 : 0.0;
   if (x >= 1.0) return upperTail ? 0.0 : 1.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
+  if (betaratio::fastTails(a, b, x, 0.5 + (0.5 - x), &lower, &upper)) {
+    return upperTail ? upper : lower;
+  }
   if (ElvFailed(elv_beta_df(x, a, b, &lower, &upper, &density))) return mGetMissingValueCode();
   return upperTail ? upper : lower;
 }
@@ -186,7 +197,10 @@ double mBetaInvCdf(double p, double a, double b) {
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_beta_lower_quant(p, a, b, &q) : elv_beta_upper_quant(1.0 - p, a, b, &q);
+  // TOMS 708's tails where it answers: for small shapes the quantile
+  // magnifies a tail's relative error by about 1/a (1/b near 1).
   const TailPair tails = [a, b](double x, double* lower, double* upper) {
+    if (betaratio::fastTails(a, b, x, 0.5 + (0.5 - x), lower, upper)) return true;
     double density = 0.0;
     return !ElvFailed(elv_beta_df(x, a, b, lower, upper, &density));
   };
@@ -236,6 +250,15 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
     *lower = *upper = mGetMissingValueCode();
     return false;
   }
+  // Central: I_z(df1/2, df2/2) at z = df1 x/(df1 x + df2), whose complement
+  // df2/(df1 x + df2) is formed apart (TOMS 708).
+  if (noncentrality == 0.0 && centralFArgumentsFit(x, df1, df2)) {
+    const double scaled = df1 * x, sum = scaled + df2;
+    if (std::isfinite(sum) &&
+        betaratio::fastTails(df1 / 2.0, df2 / 2.0, scaled / sum, df2 / sum, lower, upper)) {
+      return true;
+    }
+  }
   const ElvStatus status = x > kLargestFArgument
                                ? betaMixtureTails(x, df1, df2, noncentrality, lower, upper)
                                : elv_F_ncdf(x, df1, df2, noncentrality, lower, upper);
@@ -273,6 +296,10 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
     // of a difference from 1.
     const TailPair tails = [df1, df2](double x, double* lower, double* upper) {
       const double w = df1 * x / (df2 + df1 * x);
+      if (centralFArgumentsFit(x, df1, df2) &&
+          betaratio::fastTails(df1 / 2.0, df2 / 2.0, w, df2 / (df2 + df1 * x), lower, upper)) {
+        return true;
+      }
       double density = 0.0;
       if (w <= 0.5) return !ElvFailed(elv_beta_df(w, df1 / 2.0, df2 / 2.0, lower, upper, &density));
       const double y = df2 / (df2 + df1 * x);

@@ -16,6 +16,7 @@
 #include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
+#include "utilities/distributions/beta_ratio.h"
 #include "utilities/distributions/discrete_rules.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/saddle_density.h"
@@ -33,6 +34,30 @@ constexpr double kExactCountLimit = 9007199254740992.0;
 // P(X <= k), 0 <= k < n, by the incomplete beta ratio.
 double binomialLowerTailByBeta(double k, double n, double p) {
   return mIncompleteBetaRatio(p, 1.0 - p, k + 1.0, n - k, true);
+}
+
+// P(X <= k) = 1 - I_p(k + 1, n - k) and P(X >= j) = I_p(j, n - j + 1) by
+// TOMS 708, each tail in its own right from the given p (no mirrored 1 - p);
+// the counts k and j are those of the mirrored route below. False where that
+// route decides: outside 0 < p < 1, beyond 2^53 trials, deep tails.
+bool binomialTailByBratio(double x, double n, double p, bool upperTail, double* out) {
+  if (!(std::isgreater(p, 0.0) && std::isless(p, 1.0) && std::islessequal(n, kExactCountLimit))) {
+    return false;
+  }
+  const double q = 0.5 + (0.5 - p);
+  double lower = 0.0, upper = 0.0;
+  if (!upperTail) {
+    const double k = discrete::cdfPoint(x);
+    if (k < 0.0 || k >= n) return false;
+    if (!betaratio::fastTails(k + 1.0, n - k, p, q, &upper, &lower)) return false;
+    *out = lower;
+    return true;
+  }
+  const double j = n - discrete::cdfPoint(n - x);
+  if (j <= 0.0 || j > n) return false;
+  if (!betaratio::fastTails(j, n - j + 1.0, p, q, &upper, &lower)) return false;
+  *out = upper;
+  return true;
 }
 
 }  // namespace
@@ -53,6 +78,8 @@ double mBinomialPdf(double x, int n, double p) {
 }
 
 double mBinomialCdf(double x, double n, double p, bool upperTail) {
+  double fast;
+  if (binomialTailByBratio(x, n, p, upperTail, &fast)) return fast;
   if (upperTail) {
     p = 1.0 - p;
     x = n - x;

@@ -11,6 +11,7 @@
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/gamma_ratio.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
@@ -67,7 +68,10 @@ double gammaElvQuantile(double p, double shape) {
 // beyond its range by the tail search started from its range limit.
 double gammaQuantileFromElv(double p, double shape) {
   if (!mPositiveShapes(shape)) return mGetMissingValueCode();
+  // The fast kernel's tails where it answers: for a small shape the quantile
+  // magnifies a tail's relative error by 1/shape.
   const TailPair tails = [shape](double x, double* lower, double* upper) {
+    if (gammaratio::fastTails(shape, x, lower, upper)) return true;
     double density = 0.0;
     return !ElvFailed(elv_gamma_df(x, shape, lower, upper, &density));
   };
@@ -159,6 +163,7 @@ double mGammaCdf(double x, double shape, double scale, double threshold, bool up
   if (x < threshold) return upperTail ? 1.0 : 0.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
   const double z = mStandardize(x, threshold, scale);
+  if (gammaratio::fastTails(shape, z, &lower, &upper)) return upperTail ? upper : lower;
   if (ElvFailed(elv_gamma_df(z, shape, &lower, &upper, &density))) return mGetMissingValueCode();
   return upperTail ? upper : lower;
 }
@@ -208,6 +213,7 @@ bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double*
     *upper = 1.0;
     return true;
   }
+  if (noncentrality == 0.0 && gammaratio::fastTails(df / 2.0, x / 2.0, lower, upper)) return true;
   if (ElvFailed(elv_chi2_ncdf(x, df, noncentrality, lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
     return false;

@@ -9,6 +9,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/discrete_rules.h"
+#include "utilities/distributions/gamma_ratio.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
@@ -37,6 +38,10 @@ double mPoissonCdf(double x, double mean, bool upperTail) {
   // above any finite mean's bulk (Chebyshev: mean + sqrt(mean) 1e150).
   if (k > 1e300 && k > 2.0 * mean) return upperTail ? 0.0 : 1.0;
   double chiLower = 0.0, chiUpper = 1.0;
+  // P(X <= k) = Q(k + 1, mean).
+  if (mean > 0.0 && gammaratio::fastTails(k + 1.0, mean, &chiLower, &chiUpper)) {
+    return upperTail ? chiLower : chiUpper;
+  }
   if (mean > 0.0 &&
       ElvFailed(elv_chi2_ncdf(2.0 * mean, 2.0 * (k + 1.0), 0.0, &chiLower, &chiUpper))) {
     return mGetMissingValueCode();

@@ -161,6 +161,13 @@ double mTailQuantile(const TailPair& tails, double p, TailSupport support, doubl
       const double g = eq(below);
       if (!std::isnan(g) && g < 0.0) return 1.0;
     }
+    // A lower quantile below the smallest normal double (a gamma or beta law
+    // of small shape at a tiny p, whose quantile is p^(1/shape) in order of
+    // magnitude) rounds to 0.
+    if (support != TailSupport::RealLine && !upper) {
+      const double g = eq(fromCoordinate(-kInfinity, support));
+      if (!std::isnan(g) && g > 0.0) return 0.0;
+    }
     return mGetMissingValueCode();
   }
   if (a.x == b.x) return a.x;

@@ -48,6 +48,10 @@ MixtureResult ended(MixtureResult result, MixtureEnd end, double sum) {
   return result;
 }
 
+// Scaled sums: the armed floating-point state treats subnormal operands as 0
+// (DAZ), so a tail near the smallest normal double would lose every term
+// below 2.2e-308, a relative 1e-8 of a sum of 1e-300. Terms and sum are
+// therefore carried in units of the peak term and multiplied by it once.
 bool restNegligible(double ratio, double term, double sum) {
   return ratio < 1.0 && term / (1.0 - ratio) / sum < mixtureStop();
 }
@@ -95,20 +99,23 @@ MixtureResult descendingMixtureSum(const MixtureComponents& components, long k,
   const double logPeak = logPeakTerm(components, j, factor, settings);
   if (logPeak < underflowLog()) return ended(result, MixtureEnd::Underflow, 0.0);
 
-  // Stage two: sum below the peak.
-  double term = std::exp(logPeak);
-  double sum = term + above * term;
-  if (sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, sum);
+  // Stage two: sum below the peak, in units of the peak term (see restNegligible).
+  const double peak = std::exp(logPeak);
+  double term = 1.0;
+  double sum = 1.0 + above;
+  if (peak * sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, peak * sum);
   while (j > 0) {
     const double ratio = downRatio(components, j, &factor, settings);
     --j;
     term *= ratio;
     sum += term;
     result.last = j;
-    if (sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, sum);
+    if (peak * sum > settings.switchAbove) {
+      return ended(result, MixtureEnd::AboveLimit, peak * sum);
+    }
     if (restNegligible(ratio, term, sum)) break;
   }
-  return ended(result, MixtureEnd::Normal, sum);
+  return ended(result, MixtureEnd::Normal, peak * sum);
 }
 
 MixtureResult ascendingMixtureSum(const MixtureComponents& components, long k,
@@ -138,10 +145,11 @@ MixtureResult ascendingMixtureSum(const MixtureComponents& components, long k,
   const double logPeak = logPeakTerm(components, j, factor, settings);
   if (logPeak < underflowLog()) return ended(result, MixtureEnd::Underflow, 0.0);
 
-  // Stage two: sum above the peak.
-  double term = std::exp(logPeak);
-  double sum = term + below * term;
-  if (sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, sum);
+  // Stage two: sum above the peak, in units of the peak term.
+  const double peak = std::exp(logPeak);
+  double term = 1.0;
+  double sum = 1.0 + below;
+  if (peak * sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, peak * sum);
   for (;;) {
     if (j >= settings.cap) {
       result.inSecondStage = true;
@@ -152,10 +160,12 @@ MixtureResult ascendingMixtureSum(const MixtureComponents& components, long k,
     term *= ratio;
     sum += term;
     result.last = j;
-    if (sum > settings.switchAbove) return ended(result, MixtureEnd::AboveLimit, sum);
+    if (peak * sum > settings.switchAbove) {
+      return ended(result, MixtureEnd::AboveLimit, peak * sum);
+    }
     if (restNegligible(ratio, term, sum)) break;
   }
-  return ended(result, MixtureEnd::Normal, sum);
+  return ended(result, MixtureEnd::Normal, peak * sum);
 }
 
 long long mixtureMethod(const MixtureResult& r, bool descending) {

@@ -58,6 +58,14 @@ void DIGAMI(double* d, double x, double p, double gplog, double gp1log, double p
 
 // Regularised lower incomplete gamma P(dP, dX).
 double mIncompleteGamma(double dX, double dP);
+// P(a, x) and Q(a, x) by Temme's uniform expansion as GRATIO evaluates it
+// (TOMS 654, first accuracy level), for a >= 40 and |1 - x/a| <= 0.25 only,
+// where its truncations stay near the rounding level; false, with *p and *q
+// untouched, elsewhere.
+bool temmeGammaRatios(double a, double x, double* p, double* q);
+// P(a, x) and Q(a, x) by GRATIO's series for 0 < a < 1 and 0 < x < 1.1, by
+// the error function for a = 1/2 and any finite x > 0; false elsewhere.
+bool smallShapeGammaRatios(double a, double x, double* p, double* q);
 double mLogGamma(double x);
 double mGamma(double x, bool throwOnError);
 double mPsi(double x);

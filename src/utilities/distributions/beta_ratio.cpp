@@ -1,0 +1,48 @@
+// Both tails of the incomplete beta ratio by TOMS 708 (see beta_ratio.h).
+#include "utilities/distributions/beta_ratio.h"
+
+#include <cmath>
+#include <exception>
+
+#include "utilities/elv/precision.h"
+#include "utilities/special_functions/incomplete_beta.h"
+
+namespace qel {
+namespace betaratio {
+
+namespace {
+
+// Below this, BRATIO's prefactor x^a y^b / B(a, b) nears the subnormal range.
+constexpr double kSmallestDirectTail = 1e-280;
+// Shapes up to 2^53, the largest binomial counts it serves; beyond, the ELV
+// routines answer (or refuse) as before.
+constexpr double kLargestShape = 9007199254740992.0;
+
+}  // namespace
+
+bool fastTails(double a, double b, double x, double y, double* lower, double* upper) {
+  if (elv::elvPrecision() != elv::ElvPrecision::Full) return false;
+  // Quiet comparisons: a NaN must not raise the invalid operation in an armed
+  // thread.
+  if (!(std::isgreater(a, 0.0) && std::isgreater(b, 0.0) && std::isgreater(x, 0.0) &&
+        std::isgreater(y, 0.0) && std::islessequal(a, kLargestShape) &&
+        std::islessequal(b, kLargestShape))) {
+    return false;
+  }
+  double w = 0.0, w1 = 0.0;
+  int ierr = 0;
+  try {
+    BRATIO(a, b, x, y, &w, &w1, &ierr);
+  } catch (const std::exception&) {
+    return false;  // a trap at extreme arguments: the ELV routine decides
+  }
+  if (ierr != 0 || !(std::fmin(w, w1) >= kSmallestDirectTail) || !(std::fmax(w, w1) <= 1.0)) {
+    return false;
+  }
+  *lower = w;
+  *upper = w1;
+  return true;
+}
+
+}  // namespace betaratio
+}  // namespace qel
