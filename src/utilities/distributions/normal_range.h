@@ -3,6 +3,8 @@
 #ifndef QEL_SRC_UTILITIES_DISTRIBUTIONS_NORMAL_RANGE_H
 #define QEL_SRC_UTILITIES_DISTRIBUTIONS_NORMAL_RANGE_H
 
+#include <vector>
+
 #include "utilities/RootsAndOptima.h"
 
 namespace qel {
@@ -17,6 +19,46 @@ double mNormalRangeInvCdf(double p, int k);
 double mNormalRangeCritValue(double alpha, int k);
 // P(R >= r).
 double mNormalRangePValue(double r, int k);
+
+// One tail of the normal range for a fixed k at many r, for the outer
+// integrals of the studentized range and for root searches. With x the
+// smallest of the k variables,
+//   P(R <= r) = k int phi(x) (Phi(x + r) - Phi(x))^(k-1) dx,
+//   P(R > r)  = k int phi(x) Q(x)^(k-1) (1 - (1 - Q(x + r)/Q(x))^(k-1)) dx,
+// Q the upper normal tail (the second since k int phi Q^(k-1) = 1), both by
+// the trapezoidal rule on the lattice x = i h. The integrands are entire and
+// decay like normal densities, so the rule converges geometrically in 1/h^2
+// (Trefethen and Weideman, SIAM Review 56 (2014) 385); h follows the width
+// of the integrand (that of the smallest of k normals, 1/sqrt(k) for the
+// lower tail at small r). The sum walks out from the mode until the terms
+// fall below 1e-18 of it. phi(x), Phi(x), Q(x) and Q(x)^(k-1) are kept per
+// lattice point, so each further r costs one erfc per point.
+class CmNormalRangeLattice {
+ public:
+  CmNormalRangeLattice(int k, bool upperTail);
+  // The chosen tail at r > 0 (r finite).
+  double operator()(double r);
+
+ private:
+  struct Node {
+    double upper, lower, kPhi, base, invUpper;  // Q(x), Phi(x), k phi(x), k phi(x) Q(x)^(k-1), 1/Q(x)
+  };
+  const Node& node(int i);
+  // The integrand at x = i h, y = x + r, given phi(y); Phi(y) to lowerY.
+  double term(int i, double y, double phiY, double* lowerY);
+  // The sum of k phi(x) Q(x)^(k-1) over the lattice up to index i.
+  double prefix(int i);
+  static constexpr int kSeriesTerms = 7;
+  int mK;
+  bool mUpper;
+  double mH, mDecay, mUnitBracket;
+  double mSeries[kSeriesTerms] = {};
+  int mFirst, mLast;  // lattice indices kept
+  std::vector<Node> mNodes;
+  std::vector<char> mReady;
+  std::vector<double> mPrefix;
+  int mPrefixFirst, mPrefixLast;
+};
 
 // The range distribution minus a target, for root finders.
 class CmNormalRangeCdf : public CmRealFunction {
