@@ -9,10 +9,12 @@
 // nodes). The integrand is entire in t, analytic in the strip |Im t| < pi/4
 // and decays at both ends, so the trapezoidal rule on the whole line
 // converges geometrically (Trefethen and Weideman, SIAM Review 56 (2014)
-// 385): the step is 0.14 for small df and 0.6 of the width 1/sqrt(2 df) of g
-// for large df, which holds 1e-12 against steps a third as large. The sum
-// walks out from an anchor near the mode until the terms fall below 1e-13 of
-// it. Where q e^t is small, U is 1 - W with the expansion
+// 385). The step is the least of 0.14 (the strip), 0.46/sqrt(df) (0.65 of
+// the width 1/sqrt(2 df) of g) and 0.6 of the relative spread of the range
+// (the width of U(q e^t) in t); on 876 points (k = 2 to 100, df = 0.3 to
+// 1e5, q to 1e6) it agrees with the former composite Gauss-Legendre panels,
+// themselves within 1e-12 of mpmath, to 3e-10. The sum walks out from an
+// anchor near the mode until the terms fall below 1e-13 of it. Where q e^t is small, U is 1 - W with the expansion
 //   W_k(w) = sqrt(k) (2 pi)^(-(k-1)/2) w^(k-1) exp(c w^2) (1 + O(k w^4)),
 //   c = (k-1)^2/(8k) - (k-1)/6 + (k-1)/(24k)
 // (from Phi(z) - Phi(z - w) = w phi(z) exp(z w/2 + w^2 (z^2/24 - 1/6) + ...)
@@ -66,14 +68,19 @@ struct LogChi {
   explicit LogChi(double df) : x(0.5 * df) {
     double d = 0.0;
     if (x >= 15.0) {
-      const double r = 1.0 / (x * x);
+      const double r = (1.0 / x) * (1.0 / x);
       d = (1.0 / 12.0 - r * (1.0 / 360.0 - r * (1.0 / 1260.0 - r / 1680.0))) / x;
     } else {
-      d = mLogGamma(x) - ((x - 0.5) * std::log(x) - x + 0.5 * kLog2Pi);
+      // log Gamma(x) = -log x - gamma x + O(x^2) below x = 1e-8.
+      const double logGamma = x < 1e-8 ? -std::log(x) - 0.57721566490153286061 * x : mLogGamma(x);
+      d = logGamma - ((x - 0.5) * std::log(x) - x + 0.5 * kLog2Pi);
     }
     c0 = std::log(2.0) + 0.5 * std::log(x) - 0.5 * kLog2Pi - d;
   }
-  double operator()(double t) const { return c0 - x * expm1MinusU(2.0 * t); }
+  double operator()(double t) const {
+    const double e = expm1MinusU(2.0 * t);
+    return e > 1e300 / std::max(1.0, x) ? -1e300 : c0 - x * e;
+  }
   double x, c0;
 };
 
@@ -89,15 +96,14 @@ struct SmallRange {
   double logA, c, logErr;
 };
 
-// sum over j >= 0 of exp(a + alpha t_j + beta e^(2 t_j)), t_j = t0 - j h, by
-// expanding exp(beta e^(2t)) (|beta| e^(2 t0) <= 1/2): each power is a
-// geometric series in j.
-double geometricTail(double a, double alpha, double beta, double t0, double h) {
-  const double z = beta * std::exp(2.0 * t0);
+// sum over j >= 0 of exp(a + alpha t_j + beta e^(2 t_j)), t_j = t0 - j h,
+// given logFirst = a + alpha t0 and z = beta e^(2 t0) (|z| <= 1/2), by
+// expanding exp(beta e^(2t)): each power is a geometric series in j.
+double geometricTail(double logFirst, double alpha, double z, double h) {
+  const double first = safeExp(logFirst);
   double coefficient = 1.0, sum = 0.0;
-  for (int m = 0; m < 40; ++m) {
-    const double term =
-        coefficient * safeExp(a + alpha * t0) / -std::expm1(-(alpha + 2.0 * m) * h);
+  for (int m = 0; m < 40 && first > 0.0; ++m) {
+    const double term = coefficient * first / -std::expm1(-(alpha + 2.0 * m) * h);
     sum += term;
     if (std::fabs(term) <= 1e-18 * std::fabs(sum)) break;
     coefficient *= z / (m + 1);
@@ -154,7 +160,7 @@ class OuterSum {
   // w = q e^t = sqrt(2 df + 4) for t < 0 (U falls like exp(-w^2/4)), kept
   // below 30 so that U(w) is representable.
   double anchor() const {
-    const double w = std::min(30.0, std::sqrt(2.0 * mDf + 4.0));
+    const double w = std::min(30.0, std::sqrt(2.0 * std::min(mDf, 1e6) + 4.0));
     return std::min(0.0, std::log(w) - mLogQ);
   }
 
@@ -164,24 +170,28 @@ class OuterSum {
     const double logW = mLogQ + t;
     const double logG = mG(t);
     if (logG < -745.0) return 0.0;
-    const double w2 = logW < 300.0 ? std::exp(2.0 * logW) : 1e300;
+    const double w2 = logW < 300.0 ? std::exp(2.0 * logW) : 1e290;
     const double logSmall = mSmall.logA + (mK - 1) * logW + mSmall.c * w2;
     // The expansion where its relative error 1e-3 (k+1) w^4 is small and
     // W times it below 1e-13.
     const double logErr = mSmall.logErr + 4.0 * logW;
     if (logErr <= std::log(1e-2) && logSmall + logErr <= std::log(1e-13)) {
-      const double beta = mSmall.c * std::exp(2.0 * mLogQ) - mG.x;
-      if (closed != nullptr && (mG.x + std::fabs(beta)) * std::exp(2.0 * t) <= 0.5) {
+      // Here t < 0 and w < 1: g(t) = exp(c0 + x + df t - x e^(2t)) and
+      // g W = exp(c0 + x + df t + log A + (k-1) log w + (c w^2 - x e^(2t))).
+      const double xe = mG.x * std::exp(2.0 * t);
+      const double zW = mSmall.c * w2 - xe;
+      if (closed != nullptr && t < 0.0 && xe + std::fabs(zW) <= 0.5) {
         *closed = true;
-        const double logC = mG.c0 + mG.x;
-        const double gSum = geometricTail(logC, mDf, -mG.x, t, mH);
-        const double wSum = geometricTail(logC + mSmall.logA + (mK - 1) * mLogQ,
-                                          mDf + mK - 1, beta, t, mH);
+        const double logFirst = mG.c0 + mG.x + mDf * t;
+        const double gSum = geometricTail(logFirst, mDf, -xe, mH);
+        const double wSum = geometricTail(logFirst + mSmall.logA + (mK - 1) * logW,
+                                          mDf + mK - 1, zW, mH);
         return gSum - wSum;
       }
       return std::exp(logG) * (1.0 - safeExp(logSmall));
     }
-    return std::exp(logG) * mUpper(std::exp(logW));
+    // Beyond w = e^700 the normal range tail is 0.
+    return logW > 700.0 ? 0.0 : std::exp(logG) * mUpper(std::exp(logW));
   }
 
   double mQ, mLogQ;
@@ -205,29 +215,41 @@ bool badArguments(int k, double df) {
 // (nearly linear: a power of q in the far tail), kept inside a bracket by
 // the Illinois rule once one is found, from the Bonferroni start
 // q0 = sqrt(2) t_df(1 - alpha / (k (k-1))) (C(k, 2) pairs, each
-// sqrt(2) |T_df|; within 15 percent for k <= 100), to a relative width of
-// 1e-11 in q, far below the two-decimal rounding. About six P-values.
+// sqrt(2) |T_df|; within 15 percent for k <= 100), to a step of 1e-9 in
+// log q (or 1e-11 in log P), far below the two-decimal rounding. About five
+// P-values.
 double solveUpper(double alpha, int k, double df) {
   CmNormalRangeLattice lattice(k, true);
   const double target = std::log(alpha);
+  // log q is kept in [-700, 700].
+  auto clampY = [](double y) { return std::max(-700.0, std::min(700.0, y)); };
   auto f = [&](double y) {
     const double p = upperTail(std::exp(y), k, df, lattice);
     return (p > 0.0 ? std::log(p) : -745.0) - target;
   };
   const double pairs = 0.5 * k * (k - 1.0);
-  double t0 = mTInvCdf(1.0 - 0.5 * alpha / pairs, df, 0.0);
-  if (mIsNumericMissing(t0) || !(t0 > 0.0)) t0 = 1.0;
-  double y0 = std::log(kSqrt2 * t0), f0 = f(y0);
-  double y1 = y0 + (f0 > 0.0 ? 0.05 : -0.05), f1 = f(y1);
-  // lo has f > 0 (q too small), hi f < 0, once found.
+  const double tail = 0.5 * alpha / pairs;
+  // (df capped at 1e10 for the start: the t law is then normal to 1e-10.)
+  const double startDf = std::min(df, 1e10);
+  double t0 = -mTInvCdf(tail, startDf, 0.0);
+  if (mIsNumericMissing(t0) || !(t0 > 0.0 && t0 < 1e300)) t0 = 1.0;
+  double y0 = clampY(std::log(kSqrt2 * t0)), f0 = f(y0);
+  // The first step is Newton's with the slope of the Bonferroni model,
+  // d log P / d log q = -t f_t(t) / P(T > t), held in [-200, -0.5].
+  double slope = -t0 * mTPdf(t0, startDf, 0.0) / tail;
+  if (!(slope < -0.5)) slope = -0.5;
+  slope = std::max(slope, -200.0);
+  const double step = std::max(-1.0, std::min(1.0, -f0 / slope));
+  double y1 = clampY(y0 + (std::fabs(step) > 1e-6 ? step : 1e-6)), f1 = f(y1);
   bool bracketed = (f0 > 0.0) != (f1 > 0.0);
-  for (int i = 0; i < 100; ++i) {
-    if (std::fabs(f1) < 1e-12 || std::fabs(y1 - y0) < 1e-11) return std::exp(y1);
-    double y2 = y1 - f1 * (y1 - y0) / (f1 - f0);
+  for (int i = 0; i < 200; ++i) {
+    if (std::fabs(f1) < 1e-11 || std::fabs(y1 - y0) < 1e-9) return std::exp(y1);
+    double y2 = f1 != f0 ? y1 - f1 * (y1 - y0) / (f1 - f0) : HUGE_VAL;
     if (!bracketed) {
       // March by at most 1 in log q (a factor e) until the sign changes.
       if (!std::isfinite(y2)) y2 = y1 + (f1 > 0.0 ? 1.0 : -1.0);
-      y2 = std::max(y1 - 1.0, std::min(y1 + 1.0, y2));
+      y2 = clampY(std::max(y1 - 1.0, std::min(y1 + 1.0, y2)));
+      if (y2 == y1) return std::exp(y1);
       const double f2 = f(y2);
       bracketed = (f2 > 0.0) != (f1 > 0.0);
       y0 = y1, f0 = f1, y1 = y2, f1 = f2;
