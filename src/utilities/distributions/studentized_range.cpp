@@ -123,6 +123,9 @@ class OuterSum {
 
   double operator()() {
     const double t0 = anchor();
+    // Terms are summed relative to g at the anchor, so a far tail of 1e-300
+    // keeps its digits (denormals are zero in the armed frame).
+    mLogScale = std::min(0.0, std::max(mG(t0), -600.0));
     double sum = 0.0;
     const double first = node(t0, nullptr);
     sum = first;
@@ -135,7 +138,7 @@ class OuterSum {
       // A zero from U (r beyond its range) or from g past its mode ends the walk;
       // one from g below its mode does not.
       const double t = t0 + j * mH;
-      if (f == 0.0 && (t >= 0.0 || mG(t) >= -745.0)) break;
+      if (f == 0.0 && (t >= 0.0 || logG(t) >= -745.0)) break;
       if (f <= 1e-13 * sum && f <= previous) break;
       previous = f;
     }
@@ -148,11 +151,11 @@ class OuterSum {
       sum += f;
       if (closed) break;
       // g(t) underflows below its mode: so it does further left.
-      if (f == 0.0 && mG(t0 - j * mH) < -745.0 && t0 - j * mH < 0.0) break;
+      if (f == 0.0 && logG(t0 - j * mH) < -745.0 && t0 - j * mH < 0.0) break;
       if (sum > 0.0 && f <= 1e-13 * sum && f <= previous) break;
       previous = f;
     }
-    return std::max(0.0, std::min(1.0, mH * sum));
+    return std::max(0.0, std::min(1.0, mH * sum * std::exp(mLogScale)));
   }
 
  private:
@@ -164,12 +167,15 @@ class OuterSum {
     return std::min(0.0, std::log(w) - mLogQ);
   }
 
+  // log g(t) relative to the scale.
+  double logG(double t) const { return mG(t) - mLogScale; }
+
   // g(t) U(q e^t); with closed non-null, where the expansion holds and
   // e^(2t) is small, the closed-form sum of this node and all to its left.
   double node(double t, bool* closed) {
     const double logW = mLogQ + t;
-    const double logG = mG(t);
-    if (logG < -745.0) return 0.0;
+    const double logGt = logG(t);
+    if (logGt < -745.0) return 0.0;
     const double w2 = logW < 300.0 ? std::exp(2.0 * logW) : 1e290;
     const double logSmall = mSmall.logA + (mK - 1) * logW + mSmall.c * w2;
     // The expansion where its relative error 1e-3 (k+1) w^4 is small and
@@ -182,16 +188,16 @@ class OuterSum {
       const double zW = mSmall.c * w2 - xe;
       if (closed != nullptr && t < 0.0 && xe + std::fabs(zW) <= 0.5) {
         *closed = true;
-        const double logFirst = mG.c0 + mG.x + mDf * t;
+        const double logFirst = mG.c0 + mG.x + mDf * t - mLogScale;
         const double gSum = geometricTail(logFirst, mDf, -xe, mH);
         const double wSum = geometricTail(logFirst + mSmall.logA + (mK - 1) * logW,
                                           mDf + mK - 1, zW, mH);
         return gSum - wSum;
       }
-      return std::exp(logG) * (1.0 - safeExp(logSmall));
+      return safeExp(logGt) * (1.0 - safeExp(logSmall));
     }
     // Beyond w = e^700 the normal range tail is 0.
-    return logW > 700.0 ? 0.0 : std::exp(logG) * mUpper(std::exp(logW));
+    return logW > 700.0 ? 0.0 : safeExp(logGt) * mUpper(std::exp(logW));
   }
 
   double mQ, mLogQ;
@@ -200,7 +206,7 @@ class OuterSum {
   LogChi mG;
   SmallRange mSmall;
   CmNormalRangeLattice& mUpper;
-  double mH;
+  double mH, mLogScale = 0.0;
 };
 
 double upperTail(double q, int k, double df, CmNormalRangeLattice& lattice) {
