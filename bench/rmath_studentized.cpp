@@ -1,8 +1,9 @@
 // Studentized range beside Rmath's ptukey/qtukey, same points, same run.
 #include <Rmath.h>
-#include <cmath>
 #include <benchmark/benchmark.h>
 #include <qel/distributions.h>
+
+#include <cmath>
 
 namespace {
 

@@ -45,8 +45,9 @@ TEST(StudentizedRange, UpperTailMatchesPtukey) {
 TEST(StudentizedRange, LargeDfIsNormalRange) {
   for (int k : {3, 100})
     for (double q : {3.0, 6.0, 9.0})
-      EXPECT_LE(relativeError(qel::mStudentizedRangePValue(q, k, 1e12), qel::mNormalRangeCdf(q, k, true)),
-                1e-9)
+      EXPECT_LE(
+          relativeError(qel::mStudentizedRangePValue(q, k, 1e12), qel::mNormalRangeCdf(q, k, true)),
+          1e-9)
           << k << " " << q;
 }
 
@@ -86,7 +87,8 @@ TEST(StudentizedRange, PossibleRules) {
                              {40, 5.5, 0.05, 1}, {14, 10, 0.005, 1},  {15, 10, 0.005, 0},
                              {40, 11, 0.005, 1}, {41, 11, 0.0099, 0}, {41, 11, 0.01, 1}};
   for (const auto& r : range)
-    EXPECT_EQ(qel::IsStudentizedRangePossible(int(r[0]), r[1], r[2]), r[3] != 0) << r[0] << " " << r[1];
+    EXPECT_EQ(qel::IsStudentizedRangePossible(int(r[0]), r[1], r[2]), r[3] != 0)
+        << r[0] << " " << r[1];
   EXPECT_TRUE(qel::IsStudentizedMaximumPossible(1, 1.0, 0.001));
   EXPECT_FALSE(qel::IsStudentizedMaximumPossible(3, 2.0, 0.05));
   EXPECT_FALSE(qel::IsStudentizedMaximumModulusPossible(40, 5.0, 0.05));

@@ -104,8 +104,8 @@ double integerPower(double b, int m) {
 
 // (Phi(x + r) - Phi(x))^(k - 1), each difference from the smaller tails.
 double lowerBracket(double x, double r, int k) {
-  const double d = x >= 0.0 ? upperNormal(x) - upperNormal(x + r)
-                            : upperNormal(-x - r) - upperNormal(-x);
+  const double d =
+      x >= 0.0 ? upperNormal(x) - upperNormal(x + r) : upperNormal(-x - r) - upperNormal(-x);
   return d <= 0.0 ? 0.0 : integerPower(d, k - 1);
 }
 

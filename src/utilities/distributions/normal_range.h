@@ -41,7 +41,8 @@ class CmNormalRangeLattice {
 
  private:
   struct Node {
-    double upper, lower, kPhi, base, invUpper;  // Q(x), Phi(x), k phi(x), k phi(x) Q(x)^(k-1), 1/Q(x)
+    double upper, lower, kPhi, base,
+        invUpper;  // Q(x), Phi(x), k phi(x), k phi(x) Q(x)^(k-1), 1/Q(x)
   };
   const Node& node(int i);
   // The integrand at x = i h, y = x + r, given phi(y); Phi(y) to lowerY.

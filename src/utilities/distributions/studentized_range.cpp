@@ -14,7 +14,8 @@
 // (the width of U(q e^t) in t); on 876 points (k = 2 to 100, df = 0.3 to
 // 1e5, q to 1e6) it agrees with the former composite Gauss-Legendre panels,
 // themselves within 1e-12 of mpmath, to 3e-10. The sum walks out from an
-// anchor near the mode until the terms fall below 1e-13 of it. Where q e^t is small, U is 1 - W with the expansion
+// anchor near the mode until the terms fall below 1e-13 of it. Where q e^t is small, U is 1 - W
+// with the expansion
 //   W_k(w) = sqrt(k) (2 pi)^(-(k-1)/2) w^(k-1) exp(c w^2) (1 + O(k w^4)),
 //   c = (k-1)^2/(8k) - (k-1)/6 + (k-1)/(24k)
 // (from Phi(z) - Phi(z - w) = w phi(z) exp(z w/2 + w^2 (z^2/24 - 1/6) + ...)
@@ -114,7 +115,7 @@ double geometricTail(double logFirst, double alpha, double z, double h) {
 class OuterSum {
  public:
   OuterSum(double q, int k, double df, CmNormalRangeLattice& upper)
-      : mQ(q), mLogQ(std::log(q)), mK(k), mDf(df), mG(df), mSmall(k), mUpper(upper) {
+      : mLogQ(std::log(q)), mK(k), mDf(df), mG(df), mSmall(k), mUpper(upper) {
     // The relative spread of the range, sd(R)/E(R) (0.52 at k = 3, 0.12 at
     // k = 100), is the width of U(q e^t) in t.
     const double spread = 0.85 / (1.0 + 1.3 * std::log(static_cast<double>(k)));
@@ -129,11 +130,10 @@ class OuterSum {
     double sum = 0.0;
     const double first = node(t0, nullptr);
     sum = first;
-    // Right: both factors fall beyond the mode.
+    // Right, until negligible past the mode (both factors fall beyond it).
     double previous = first;
     for (int j = 1; j < 100000; ++j) {
       const double f = node(t0 + j * mH, nullptr);
-
       sum += f;
       // A zero from U (r beyond its range) or from g past its mode ends the walk;
       // one from g below its mode does not.
@@ -147,7 +147,6 @@ class OuterSum {
     for (int j = 1; j < 100000; ++j) {
       bool closed = false;
       const double f = node(t0 - j * mH, &closed);
-
       sum += f;
       if (closed) break;
       // g(t) underflows below its mode: so it does further left.
@@ -160,10 +159,10 @@ class OuterSum {
 
  private:
   // Near the mode: where df (1 - e^(2t)) balances the fall of U, about
-  // w = q e^t = sqrt(2 df + 4) for t < 0 (U falls like exp(-w^2/4)), kept
-  // below 30 so that U(w) is representable.
+  // w = q e^t = sqrt(2 df + 4) for t < 0 (U falls like exp(-w^2/4)), and at
+  // the mode t = 0 of g when q is below that.
   double anchor() const {
-    const double w = std::min(30.0, std::sqrt(2.0 * std::min(mDf, 1e6) + 4.0));
+    const double w = std::sqrt(2.0) * std::sqrt(mDf + 2.0);
     return std::min(0.0, std::log(w) - mLogQ);
   }
 
@@ -182,16 +181,16 @@ class OuterSum {
     // W times it below 1e-13.
     const double logErr = mSmall.logErr + 4.0 * logW;
     if (logErr <= std::log(1e-2) && logSmall + logErr <= std::log(1e-13)) {
-      // Here t < 0 and w < 1: g(t) = exp(c0 + x + df t - x e^(2t)) and
+      // g(t) = exp(c0 + x + df t - x e^(2t)) and
       // g W = exp(c0 + x + df t + log A + (k-1) log w + (c w^2 - x e^(2t))).
-      const double xe = mG.x * std::exp(2.0 * t);
+      const double xe = t < 0.0 ? mG.x * std::exp(2.0 * t) : 1.0;
       const double zW = mSmall.c * w2 - xe;
       if (closed != nullptr && t < 0.0 && xe + std::fabs(zW) <= 0.5) {
         *closed = true;
         const double logFirst = mG.c0 + mG.x + mDf * t - mLogScale;
         const double gSum = geometricTail(logFirst, mDf, -xe, mH);
-        const double wSum = geometricTail(logFirst + mSmall.logA + (mK - 1) * logW,
-                                          mDf + mK - 1, zW, mH);
+        const double wSum =
+            geometricTail(logFirst + mSmall.logA + (mK - 1) * logW, mDf + mK - 1, zW, mH);
         return gSum - wSum;
       }
       return safeExp(logGt) * (1.0 - safeExp(logSmall));
@@ -200,7 +199,7 @@ class OuterSum {
     return logW > 700.0 ? 0.0 : safeExp(logGt) * mUpper(std::exp(logW));
   }
 
-  double mQ, mLogQ;
+  double mLogQ;
   int mK;
   double mDf;
   LogChi mG;
