@@ -124,7 +124,7 @@ double smallestMode(int k) {
 }  // namespace
 
 CmNormalRangeLattice::CmNormalRangeLattice(int k, bool upperTail) : mK(k), mUpper(upperTail) {
-  // Steps that hold the trapezoidal error below 1e-14 of the tail (checked
+  // Steps that hold the trapezoidal error below 3e-13 of the tail (checked
   // against steps a third as large for k = 2 to 1000 and r up to 50): the
   // upper integrand has the width of the smallest of k normals, the lower one
   // at small r that of phi(x)^k.

@@ -31,8 +31,11 @@ double mNormalRangePValue(double r, int k);
 // (Trefethen and Weideman, SIAM Review 56 (2014) 385); h follows the width
 // of the integrand (that of the smallest of k normals, 1/sqrt(k) for the
 // lower tail at small r). The sum walks out from the mode until the terms
-// fall below 1e-18 of it. phi(x), Phi(x), Q(x) and Q(x)^(k-1) are kept per
-// lattice point, so each further r costs one erfc per point.
+// fall below 1e-16 of it; on the left of the upper tail's integrand, once
+// its bracket is 1 to double precision, the rest is a kept running sum.
+// phi(x), Phi(x), Q(x) and Q(x)^(k-1) are kept per lattice point, and along
+// a walk phi(x + r) follows by recurrence, so each further r costs one
+// rational erfc (no exp) per point.
 class CmNormalRangeLattice {
  public:
   CmNormalRangeLattice(int k, bool upperTail);
