@@ -240,21 +240,18 @@ double CmNormalRangeLattice::operator()(double r) {
 
 namespace {
 
-// The r in [0, 80] where the chosen tail reaches target, by bisection on
-// the monotone tail to the last bit.
+// The r where the chosen tail reaches target, by the secant method on the
+// log tail against log r (linear in the polynomial lower tail, nearly
+// quadratic in the upper one) from r = 3 and 3.5, to full precision.
 double solveTail(double target, int k, bool upperTail) {
   CmNormalRangeLattice tail(k, upperTail);
-  double lo = 0.0, hi = 80.0;
-  for (int i = 0; i < 200 && hi - lo > 1e-16 * hi; ++i) {
-    const double mid = 0.5 * (lo + hi);
-    const double v = k == 2 || farTail(mid, k) ? mNormalRangeCdf(mid, k, upperTail) : tail(mid);
-    if ((v < target) != upperTail) {
-      lo = mid;
-    } else {
-      hi = mid;
-    }
-  }
-  return 0.5 * (lo + hi);
+  const double logTarget = std::log(target);
+  auto f = [&](double y) {
+    const double r = std::exp(y);
+    const double v = k == 2 || farTail(r, k) ? mNormalRangeCdf(r, k, upperTail) : tail(r);
+    return (v > 0.0 ? std::log(v) : -745.0) - logTarget;
+  };
+  return mSolveOnLogScale(f, upperTail ? -1 : 1, std::log(3.0), std::log(3.5), 3.0, 1e-15, 1e-15);
 }
 
 }  // namespace

@@ -3,6 +3,8 @@
 #ifndef QEL_SRC_UTILITIES_DISTRIBUTIONS_NORMAL_RANGE_H
 #define QEL_SRC_UTILITIES_DISTRIBUTIONS_NORMAL_RANGE_H
 
+#include <algorithm>
+#include <cmath>
 #include <vector>
 
 #include "utilities/RootsAndOptima.h"
@@ -63,6 +65,43 @@ class CmNormalRangeLattice {
   std::vector<double> mPrefix;
   int mPrefixFirst, mPrefixLast;
 };
+
+// The root of f, a monotone function of y = log r (a log tail minus its
+// target; slopeSign +1 if it increases), from y0 and y1: secant steps, at
+// most maxStep each (marching where f is flat), until the
+// sign changes, then regula falsi with the Illinois halving (Dowell and
+// Jarratt, BIT 11 (1971) 168); y stays in [-700, 700]. Returns exp(y) once
+// |f| < fTolerance or a step is below yTolerance.
+template <class F>
+double mSolveOnLogScale(F f, int slopeSign, double y0, double y1, double maxStep, double fTolerance,
+                        double yTolerance) {
+  auto clampY = [](double y) { return y < -700.0 ? -700.0 : (y > 700.0 ? 700.0 : y); };
+  y0 = clampY(y0), y1 = clampY(y1);
+  double f0 = f(y0), f1 = f(y1);
+  bool bracketed = (f0 > 0.0) != (f1 > 0.0);
+  for (int i = 0; i < 300; ++i) {
+    if (std::fabs(f1) < fTolerance || std::fabs(y1 - y0) < yTolerance) break;
+    double y2 = f1 != f0 ? y1 - f1 * (y1 - y0) / (f1 - f0) : HUGE_VAL;
+    if (!bracketed) {
+      if (!std::isfinite(y2)) y2 = y1 + (f1 > 0.0 ? -slopeSign : slopeSign) * maxStep;
+      y2 = clampY(std::max(y1 - maxStep, std::min(y1 + maxStep, y2)));
+      if (y2 == y1) break;
+      const double f2 = f(y2);
+      bracketed = (f2 > 0.0) != (f1 > 0.0);
+      y0 = y1, f0 = f1, y1 = y2, f1 = f2;
+      continue;
+    }
+    if (!(y2 > std::min(y0, y1) && y2 < std::max(y0, y1))) y2 = 0.5 * (y0 + y1);
+    const double f2 = f(y2);
+    if ((f2 > 0.0) != (f1 > 0.0)) {
+      y0 = y1, f0 = f1;
+    } else {
+      f0 *= 0.5;
+    }
+    y1 = y2, f1 = f2;
+  }
+  return std::exp(y1);
+}
 
 // The range distribution minus a target, for root finders.
 class CmNormalRangeCdf : public CmRealFunction {

@@ -226,10 +226,8 @@ bool badArguments(int k, double df) {
 double solveUpper(double alpha, int k, double df) {
   CmNormalRangeLattice lattice(k, true);
   const double target = std::log(alpha);
-  // log q is kept in [-700, 700].
-  auto clampY = [](double y) { return std::max(-700.0, std::min(700.0, y)); };
   auto f = [&](double y) {
-    const double p = upperTail(std::exp(y), k, df, lattice);
+    const double p = std::isinf(df) ? lattice(std::exp(y)) : upperTail(std::exp(y), k, df, lattice);
     return (p > 0.0 ? std::log(p) : -745.0) - target;
   };
   const double pairs = 0.5 * k * (k - 1.0);
@@ -238,39 +236,16 @@ double solveUpper(double alpha, int k, double df) {
   const double startDf = std::min(df, 1e10);
   double t0 = -mTInvCdf(tail, startDf, 0.0);
   if (mIsNumericMissing(t0) || !(t0 > 0.0 && t0 < 1e300)) t0 = 1.0;
-  double y0 = clampY(std::log(kSqrt2 * t0)), f0 = f(y0);
+  const double y0 = std::log(kSqrt2 * t0), f0 = f(y0);
   // The first step is Newton's with the slope of the Bonferroni model,
   // d log P / d log q = -t f_t(t) / P(T > t), held in [-200, -0.5].
   double slope = -t0 * mTPdf(t0, startDf, 0.0) / tail;
   if (!(slope < -0.5)) slope = -0.5;
   slope = std::max(slope, -200.0);
   const double step = std::max(-1.0, std::min(1.0, -f0 / slope));
-  double y1 = clampY(y0 + (std::fabs(step) > 1e-6 ? step : 1e-6)), f1 = f(y1);
-  bool bracketed = (f0 > 0.0) != (f1 > 0.0);
-  for (int i = 0; i < 200; ++i) {
-    if (std::fabs(f1) < 1e-11 || std::fabs(y1 - y0) < 1e-9) return std::exp(y1);
-    double y2 = f1 != f0 ? y1 - f1 * (y1 - y0) / (f1 - f0) : HUGE_VAL;
-    if (!bracketed) {
-      // March by at most 1 in log q (a factor e) until the sign changes.
-      if (!std::isfinite(y2)) y2 = y1 + (f1 > 0.0 ? 1.0 : -1.0);
-      y2 = clampY(std::max(y1 - 1.0, std::min(y1 + 1.0, y2)));
-      if (y2 == y1) return std::exp(y1);
-      const double f2 = f(y2);
-      bracketed = (f2 > 0.0) != (f1 > 0.0);
-      y0 = y1, f0 = f1, y1 = y2, f1 = f2;
-      continue;
-    }
-    // Bracketed between y0 and y1: regula falsi with the Illinois halving.
-    if (!(y2 > std::min(y0, y1) && y2 < std::max(y0, y1))) y2 = 0.5 * (y0 + y1);
-    const double f2 = f(y2);
-    if ((f2 > 0.0) != (f1 > 0.0)) {
-      y0 = y1, f0 = f1;
-    } else {
-      f0 *= 0.5;
-    }
-    y1 = y2, f1 = f2;
-  }
-  return std::exp(y1);
+  auto cached = [&](double y) { return y == y0 ? f0 : f(y); };
+  return mSolveOnLogScale(cached, -1, y0, y0 + (std::fabs(step) > 1e-6 ? step : 1e-6), 1.0, 1e-11,
+                          1e-9);
 }
 
 }  // namespace
@@ -319,7 +294,7 @@ double mStudentizedRangeCritValue(double alpha, int k, double df) {
   }
   double q = 0.0;
   if (mTukeyTable(df, k, alpha, &q)) return q;
-  q = std::isinf(df) ? mNormalRangeCritValue(alpha, k) : solveUpper(alpha, k, df);
+  q = solveUpper(alpha, k, df);
   return mNearestInteger(100.0 * q) / 100.0;
 }
 
