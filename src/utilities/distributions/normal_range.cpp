@@ -240,6 +240,22 @@ double CmNormalRangeLattice::operator()(double r) {
 
 namespace {
 
+// The chosen tail at r > 0 (finite): closed forms for k = 2 (R = sqrt(2)
+// |Z|), beyond the double range and, for the lower tail, at small r, where
+// the lattice's Phi(x + r) - Phi(x) would lose 1e-16/r relative; the lattice
+// otherwise.
+double chosenTail(CmNormalRangeLattice& lattice, double r, int k, bool upperTail) {
+  if (k == 2) return upperTail ? std::erfc(0.5 * r) : std::erf(0.5 * r);
+  if (farTail(r, k)) return upperTail ? 0.0 : 1.0;
+  if (!upperTail) {
+    const CmSmallRangeExpansion small(k);
+    const double logR = std::log(r);
+    if (small.logErrorFactor + 4.0 * logR <= std::log(1e-15))
+      return std::exp(std::max(-745.0, small.logA + (k - 1) * logR + small.c * r * r));
+  }
+  return lattice(r);
+}
+
 // The r where the chosen tail reaches target, by the secant method on the
 // log tail against log r (linear in the polynomial lower tail, nearly
 // quadratic in the upper one) from r = 3 and 3.5, to full precision.
@@ -248,7 +264,7 @@ double solveTail(double target, int k, bool upperTail) {
   const double logTarget = std::log(target);
   auto f = [&](double y) {
     const double r = std::exp(y);
-    const double v = k == 2 || farTail(r, k) ? mNormalRangeCdf(r, k, upperTail) : tail(r);
+    const double v = chosenTail(tail, r, k, upperTail);
     return (v > 0.0 ? std::log(v) : -745.0) - logTarget;
   };
   return mSolveOnLogScale(f, upperTail ? -1 : 1, std::log(3.0), std::log(3.5), 3.0, 1e-15, 1e-15);
@@ -264,10 +280,8 @@ double mNormalRangeCdf(double r, int k, bool upperTail) {
   if (k < 2 || std::isnan(r)) return mGetMissingValueCode();
   if (r <= 0.0) return upperTail ? 1.0 : 0.0;
   if (std::isinf(r)) return upperTail ? 0.0 : 1.0;
-  // k = 2: R = sqrt(2) |Z|.
-  if (k == 2) return upperTail ? std::erfc(0.5 * r) : std::erf(0.5 * r);
-  if (farTail(r, k)) return upperTail ? 0.0 : 1.0;
-  return CmNormalRangeLattice(k, upperTail)(r);
+  CmNormalRangeLattice lattice(k, upperTail);
+  return chosenTail(lattice, r, k, upperTail);
 }
 
 double mNormalRangeInvCdf(double p, int k) {

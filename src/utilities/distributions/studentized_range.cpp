@@ -85,18 +85,6 @@ struct LogChi {
   double x, c0;
 };
 
-// The expansion of W_k(w) for small w: log of its leading factor, and its
-// quadratic coefficient c.
-struct SmallRange {
-  explicit SmallRange(int k) {
-    const double m = k - 1.0;
-    logA = 0.5 * std::log(static_cast<double>(k)) - 0.5 * m * kLog2Pi;
-    c = m * m / (8.0 * k) - m / 6.0 + m / (24.0 * k);
-    logErr = std::log(1e-3 * (k + 1.0));
-  }
-  double logA, c, logErr;
-};
-
 // sum over j >= 0 of exp(a + alpha t_j + beta e^(2 t_j)), t_j = t0 - j h,
 // given logFirst = a + alpha t0 and z = beta e^(2 t0) (|z| <= 1/2), by
 // expanding exp(beta e^(2t)): each power is a geometric series in j.
@@ -179,7 +167,7 @@ class OuterSum {
     const double logSmall = mSmall.logA + (mK - 1) * logW + mSmall.c * w2;
     // The expansion where its relative error 1e-3 (k+1) w^4 is small and
     // W times it below 1e-13.
-    const double logErr = mSmall.logErr + 4.0 * logW;
+    const double logErr = mSmall.logErrorFactor + 4.0 * logW;
     if (logErr <= std::log(1e-2) && logSmall + logErr <= std::log(1e-13)) {
       // g(t) = exp(c0 + x + df t - x e^(2t)) and
       // g W = exp(c0 + x + df t + log A + (k-1) log w + (c w^2 - x e^(2t))).
@@ -203,7 +191,7 @@ class OuterSum {
   int mK;
   double mDf;
   LogChi mG;
-  SmallRange mSmall;
+  CmSmallRangeExpansion mSmall;
   CmNormalRangeLattice& mUpper;
   double mH, mLogScale = 0.0;
 };
