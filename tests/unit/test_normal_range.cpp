@@ -14,7 +14,7 @@ using qeltest::relativeError;
 
 TEST(NormalRange, MatchesMpmath) {
   const auto rows = qeltest::loadReferenceData("normal_range.csv", 1);
-  ASSERT_EQ(rows.size(), 21u);
+  ASSERT_EQ(rows.size(), 29u);
   for (const auto& row : rows) {
     const auto& v = row.numbers;
     const int k = int(v[0]);

@@ -54,7 +54,9 @@ def main():
     for k in (2, 3, 10, 50):
         # At r = 30 mpmath.quad misses the upper tail of k >= 3 by 3e-4 even
         # so; there P(R > r) = C(k, 2) erfc(r/2) to 1e-90, which the test uses.
-        for r in (0.1, 0.5, 2.0, 5.0, 12.0) + ((30.0,) if k == 2 else ()):
+        # r = 1e-10 and 1e-3: the lower tail where Phi(x + r) - Phi(x)
+        # cancels in double precision.
+        for r in (1e-10, 1e-3, 0.1, 0.5, 2.0, 5.0, 12.0) + ((30.0,) if k == 2 else ()):
             r = mp.mpf(r)
             out.append("cdf,%d,%s,%s,%s" % (k, mp.nstr(r, 5), mp.nstr(lower(r, k), 20),
                                             mp.nstr(upper(r, k), 20)))
