@@ -112,10 +112,9 @@ double mNormalCdf(double x, double mean, double sigma, bool upperTail) {
 // A quantile beyond the double range (sigma near DBL_MAX) has no double:
 // no answer.
 double mNormalInvCdf(double p, double mean, double sigma) {
-  if (elv::elvPrecision() == elv::ElvPrecision::Full && p > 0.0 && p < 1.0) {
-    return mean + sigma * elv::normalQuantile(p);
-  }
-  const double z = standardNormalQuantile(p);
+  const double z = elv::elvPrecision() == elv::ElvPrecision::Full && p > 0.0 && p < 1.0
+                       ? elv::normalQuantile(p)
+                       : standardNormalQuantile(p);
   if (mIsNumericMissing(z)) return z;
   try {
     return mean + sigma * z;
