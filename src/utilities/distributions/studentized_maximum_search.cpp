@@ -44,7 +44,7 @@ bool prepare(const double* lambdas, unsigned count, double df, std::vector<doubl
              std::vector<unsigned>& counts) {
   if (lambdas == nullptr || count == 0 || std::isnan(df) || !(df > 0.0)) return false;
   for (unsigned i = 0; i < count; ++i)
-    if (!(std::fabs(lambdas[i]) < 1.0)) return false;
+    if (std::isnan(lambdas[i]) || !(std::fabs(lambdas[i]) < 1.0)) return false;
   return ConsolidateLambdas(lambdas, count, distinct, counts) == 0;
 }
 
