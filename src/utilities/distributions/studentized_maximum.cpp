@@ -87,8 +87,8 @@ bool logNormalCdf(double x, double* out) {
 constexpr double kReach = 8.0;
 // Panel widths: at most kMaxWidth, and kSigmaWidth sigma within kZoneHalf
 // sigma of a feature.
-constexpr double kMaxWidth = 4.0;
-constexpr double kSigmaWidth = 6.0;
+constexpr double kMaxWidth = 3.0;
+constexpr double kSigmaWidth = 5.0;
 constexpr double kZoneHalf = 10.0;
 
 struct Zone {
@@ -323,12 +323,12 @@ struct OuterNodes {
     auto wAt = [&](double t) { return sign * std::exp(std::min(logAbsX + t, 7.0)); };
     auto width = [&](double t) {
       const double e2 = std::exp(2.0 * std::min(t, 300.0));
-      double h = kMaxWidth;
+      double h = 4.0;
       const double slope = df * std::fabs(1.0 - e2);
       if (slope > 0.0) h = std::min(h, 16.0 / slope);
       h = std::min(h, 4.0 / std::sqrt(2.0 * df * e2));
       const double r = x == 0.0 ? 0.0 : std::fabs(wAt(t));
-      if (r > 1.0) h = std::min({h, 6.0 / (r * r), 2.8 / r});
+      if (r > 1.0) h = std::min({h, 10.0 / (r * r), 4.0 / r});
       return h;
     };
     const double lowerBound = std::max(inner.studentizedLowerBound(x, df), 1e-300);
@@ -426,6 +426,8 @@ int fitPiece(const CbStudentizedInner& inner, ChebyshevPiece& piece) {
         tail = std::max(tail, std::fabs(piece.c[k]));
       piece.logarithmic = logarithmic != 0;
       if (tail <= (logarithmic ? 1e-13 : 1e-15) * scale) return 1;
+      // Far from converging at 33 points: halving the piece is cheaper.
+      if (logarithmic && n == 32 && tail > 1e-7 * scale) return 0;
     }
   }
   return 0;
@@ -461,7 +463,7 @@ bool interpolateLogTail(const CbStudentizedInner& inner, const OuterNodes& nodes
   const auto range = std::minmax_element(nodes.w.begin(), nodes.w.end());
   if (!(*range.second > *range.first)) return false;
   std::vector<ChebyshevPiece> pieces;
-  int budget = static_cast<int>(3 * nodes.w.size() / 4);
+  int budget = static_cast<int>(nodes.w.size());
   if (!fitPieces(inner, *range.first, *range.second, budget, pieces)) return false;
   logU.resize(nodes.w.size());
   for (size_t i = 0; i < nodes.w.size(); ++i) {
