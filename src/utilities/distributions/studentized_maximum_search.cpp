@@ -145,7 +145,8 @@ void mBDMCB1(int k, double df, double p, double* lower, double* upper) {
 }
 
 void mBDMCC2(int k, double df, double p, double* lower, double* upper) {
-  // One variable below; Sidak's inequality for |Y_i| (any correlation) above.
+  // One variable below; above, Sidak's inequality for the |Y_i| under any
+  // correlation (Z. Sidak, JASA 62, 1967).
   const double perVariable = -std::expm1(std::log(p) / k);
   bracketFromTails(0.5 * (1.0 - p), 0.5 * perVariable, 1.0, lower, upper, df);
 }
