@@ -163,7 +163,7 @@ MIXED = [[mpf("0.8"), mpf("0.3"), mpf("0.8"), mpf("0.5"), mpf("0.3"), mpf("0.8")
          [mpf("0.9"), mpf("-0.4"), mpf(0), mpf("0.6"), mpf("-0.4")]]
 for kind in ("max", "mod"):
     for lam in MIXED:
-        for df in (2.5, 5, 30, 1000, inf):
+        for df in (5, 30, inf):
             for x in (2.43, 3.81):
                 POINTS.append((kind, lam, df, x))
 # Far tails and a strong correlation.

@@ -109,16 +109,26 @@ void addZone(std::vector<Zone>& zones, double p, double sigma) {
     zones.push_back({p - kZoneHalf * sigma, p + kZoneHalf * sigma, width});
 }
 
-// Walks [lo, hi] in panels no wider than the zones they enter allow.
+// Walks [lo, hi] in panels no wider than the zones they enter allow. With
+// more than 64 zones (many distinct lambdas) the panels take the narrowest
+// zone width throughout, but no fewer than 1/4096 of the range, so that the
+// walk stays short.
 template <class F>
 double integratePanels(double lo, double hi, const std::vector<Zone>& zones, const F& f) {
+  double uniform = kMaxWidth;
+  if (zones.size() > 64) {
+    for (const Zone& zone : zones) uniform = std::min(uniform, zone.width);
+    uniform = std::max(uniform, (hi - lo) / 4096.0);
+  }
   double sum = 0.0;
   double z = lo;
   for (int panel = 0; panel < 1000000 && z < hi; ++panel) {
-    double h = std::min(kMaxWidth, hi - z);
-    for (const Zone& zone : zones) {
-      if (zone.hi <= z || zone.lo >= z + h) continue;
-      h = zone.lo > z ? std::min(h, std::max(zone.lo - z, zone.width)) : std::min(h, zone.width);
+    double h = std::min(uniform, hi - z);
+    if (zones.size() <= 64) {
+      for (const Zone& zone : zones) {
+        if (zone.hi <= z || zone.lo >= z + h) continue;
+        h = zone.lo > z ? std::min(h, std::max(zone.lo - z, zone.width)) : std::min(h, zone.width);
+      }
     }
     if (hi - (z + h) < 0.125 * h) h = hi - z;
     sum += gauss16(z, z + h, f);
