@@ -158,20 +158,22 @@ CmMaximumInner::CmMaximumInner(const std::vector<double>& distinct,
         merged = true;
       }
     }
-    if (!merged) mFactors.push_back({d, std::sqrt((1.0 - d) * (1.0 + d)), m});
+    if (merged) continue;
+    const double c = std::sqrt((1.0 - d) * (1.0 + d));
+    mFactors.push_back({d, c, 1.0 / c, m});
   }
 }
 
 double CmMaximumInner::logProduct(double z, double w) const {
   double sum = 0.0;
   for (const Factor& f : mFactors) {
-    const double a = (w - f.d * z) / f.c;
+    const double a = (w - f.d * z) * f.invC;
     double logF;
     if (!mModulus) {
       if (!logNormalCdf(a, &logF)) return 1.0;
     } else {
       // F = Phi(a) - Phi(b), b = (-w - d z)/c <= a.
-      const double b = (-w - f.d * z) / f.c;
+      const double b = a - 2.0 * w * f.invC;
       const double qa = upperNormal(a), qb = upperNormal(-b);
       const double q = qa + qb;
       if (q <= 0.5) {

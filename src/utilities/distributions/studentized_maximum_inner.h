@@ -22,7 +22,9 @@ class CmMaximumInner : public CbStudentizedInner {
 
  private:
   struct Factor {
-    double d, c, m;  // lambda (its modulus for the maximum modulus), sqrt(1 - d^2), count
+    // lambda (its modulus for the maximum modulus), c = sqrt(1 - d^2), 1/c,
+    // count
+    double d, c, invC, m;
   };
   // sum_j m_j log F_j(z), or -1 when some F_j is 0.
   double logProduct(double z, double w) const;
