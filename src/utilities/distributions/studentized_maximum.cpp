@@ -43,6 +43,7 @@
 #include "utilities/distributions/normal_range.h"
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/studentized_maximum_inner.h"
+#include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 namespace {
@@ -224,6 +225,8 @@ double CmMaximumInner::zIntegral(double w) const {
 double CmMaximumInner::upperTail(double w) const {
   if (mModulus && w <= 0.0) return 1.0;
   if (w > 0.0 && upperBound(w) == 0.0) return 0.0;
+  // P(all Y_i <= w) <= Phi(w).
+  if (w < 0.0 && !(upperNormal(-w) > 1e-300)) return 1.0;
   // The lambdas 0: Phi(w)^m0 or (1 - 2 Q(w))^m0, outside the z-integral.
   double logZeros = 0.0;
   if (mZeros > 0.0) {
@@ -293,7 +296,10 @@ class LogChi {
       : mA(0.5 * df),
         mC(std::log(2.0) + 0.5 * std::log(mA) - 0.5 * std::log(2.0 * M_PI) - saddle::stirlerr(mA)) {
   }
-  double operator()(double t) const { return mC - mA * excess(t); }
+  double operator()(double t) const {
+    const double e = excess(t);
+    return e > 1e300 / std::max(mA, 1.0) ? -1e300 : mC - mA * e;
+  }
 
  private:
   // e^(2t) - 1 - 2t without cancellation near t = 0.
@@ -346,13 +352,29 @@ struct OuterNodes {
       double h = 4.0;
       const double slope = df * std::fabs(1.0 - e2);
       if (slope > 0.0) h = std::min(h, 16.0 / slope);
-      h = std::min(h, 4.0 / std::sqrt(2.0 * df * e2));
-      const double r = x == 0.0 ? 0.0 : std::fabs(wAt(t));
-      if (r > 1.0) h = std::min({h, 10.0 / (r * r), 4.0 / r});
+      const double curvature = 2.0 * df * e2;
+      if (curvature > 0.0) h = std::min(h, 4.0 / std::sqrt(curvature));
+      // U changes on the scale 1/r^2; beyond r = 40 it is 0 or 1.
+      const double r = std::fabs(wAt(t));
+      if (r > 1.0 && r < 40.0) h = std::min({h, 10.0 / (r * r), 4.0 / r});
       return h;
     };
     const double lowerBound = std::max(inner.studentizedLowerBound(x, df), 1e-300);
     double t = lowerEnd(lowerBound, df);
+    // Below w = x e^-700, U(w) is U(0) to double precision: for small df,
+    // whose chi density spreads over a long range of t, the mass below is
+    // taken whole as U times the chi-square lower tail (its leading term
+    // (y/2)^(df/2) / Gamma(df/2 + 1) below y = e^-600).
+    const double flat = -700.0 - logAbsX;
+    if (t < flat) {
+      t = flat;
+      const double logY = std::log(df) + 2.0 * t;
+      const double lowerTail =
+          logY < -600.0 ? safeExp(0.5 * df * (logY - std::log(2.0)) - mLogGamma(0.5 * df + 1.0))
+                        : mChiSqCdf(std::exp(logY), df, 0.0, false);
+      if (!mIsNumericMissing(lowerTail) && lowerTail > 0.0)
+        below = lowerTail * inner.upperTail(wAt(t));
+    }
     for (int panel = 0; panel < 100000; ++panel) {
       double h = width(t);
       for (int i = 0; i < 60; ++i) {
@@ -379,6 +401,7 @@ struct OuterNodes {
     }
   }
   std::vector<double> w, weight;
+  double below = 0.0;  // the integral below the first panel
 };
 
 // A Chebyshev interpolant of log U, or of U itself, on [lo, hi] from the
@@ -482,8 +505,10 @@ bool interpolateLogTail(const CbStudentizedInner& inner, const OuterNodes& nodes
 double mGLV(const CbStudentizedInner& inner, double x, double df) {
   // Beyond df = 1e15 the law differs from that of a known sigma by O(1/df).
   if (df > 1e15) return inner.upperTail(x);
+  // x = 0: U(0) for every s.
+  if (x == 0.0) return inner.upperTail(0.0);
   const OuterNodes nodes(inner, x, df);
-  double sum = 0.0;
+  double sum = nodes.below;
   std::vector<double> logU;
   if (interpolateLogTail(inner, nodes, logU)) {
     for (size_t i = 0; i < nodes.w.size(); ++i) sum += nodes.weight[i] * safeExp(logU[i]);

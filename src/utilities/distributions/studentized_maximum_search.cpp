@@ -82,8 +82,9 @@ double critValue(double alpha, double df, const double* lambdas, unsigned count,
   } else {
     mBDMCB1(k, df, 1.0 - alpha, &lower, &upper);
   }
-  const double x =
-      mMRGFLS([&](double v) { return tail(inner, v, df, modulus); }, alpha, lower, upper);
+  double x = mMRGFLS([&](double v) { return tail(inner, v, df, modulus); }, alpha, lower, upper);
+  // The modulus tail is 1 at x <= 0.
+  if (modulus) x = std::max(x, 0.0);
   return mNearestInteger(100.0 * x) / 100.0;
 }
 
@@ -173,7 +174,8 @@ double mMRGFLS(const std::function<double(double)>& upperTail, double alpha, dou
   }
   int side = 0;
   for (int i = 0; i < 200 && hi - lo > 1e-10 * std::max(1.0, std::fabs(hi)); ++i) {
-    double x = hi - fhi * (hi - lo) / (fhi - flo);
+    // Bisection where the tail is flat to double precision.
+    double x = fhi != flo ? hi - fhi * (hi - lo) / (fhi - flo) : 0.5 * (lo + hi);
     if (!(x > lo && x < hi)) x = 0.5 * (lo + hi);
     const double fx = f(x);
     if (fx == 0.0) return x;
