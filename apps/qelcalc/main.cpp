@@ -12,6 +12,7 @@
 #include "distribution_mode.h"
 #include "fit_mode.h"
 #include "matrix_mode.h"
+#include "maxmod_mode.h"
 #include "power_mode.h"
 #include "gof_mode.h"
 #include "proportion_variance_mode.h"
@@ -54,6 +55,7 @@ void printUsage(std::ostream& out) {
   qelcalc::printGroupUsage(out);
   qelcalc::printRanksUsage(out);
   qelcalc::printTukeyUsage(out);
+  qelcalc::printMaxModUsage(out);
   out << "  qelcalc --help\n";
 }
 
@@ -95,6 +97,7 @@ int main(int argc, char** argv) {
     if (mode == "group") return qelcalc::runGroupMode(argc, argv, std::cout);
     if (mode == "ranks") return qelcalc::runRanksMode(argc, argv, std::cout);
     if (mode == "tukey") return qelcalc::runTukeyMode(argc, argv, std::cout);
+    if (mode == "maxmod") return qelcalc::runMaxModMode(argc, argv, std::cout);
     throw qelcalc::UsageError("unknown family or mode '" + mode + "' (see qelcalc --help)");
   } catch (const qelcalc::UsageError& e) {
     std::cerr << "qelcalc: " << e.what() << "\n";

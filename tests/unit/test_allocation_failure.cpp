@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <qel/basic_types.h>
 #include <qel/contingency_table.h>
+#include <qel/distributions.h>
 #include <qel/descriptive.h>
 #include <qel/fits.h>
 #include <qel/location_tests.h>
@@ -14,6 +15,10 @@
 #include <cmath>
 #include <cstdlib>
 #include <new>
+#include <vector>
+
+#include "utilities/LYNBasicTypes.h"
+#include "utilities/distributions/studentized_maximum.h"
 
 namespace {
 bool failNextAllocation = false;
@@ -433,6 +438,21 @@ TEST(AllocationFailure, CurveFitReportsOutOfMemory) {
       [&](int k) { EXPECT_TRUE(nan({c[0], c[1], c[2], c[3], c[4], r2})) << "allocation " << k; });
   EXPECT_GT(allocations, 6);  // the column array and five columns at least
   EXPECT_TRUE(std::isfinite(c[3]) && r2 > 0.9);
+}
+
+// Merging lambdas: 30001 with both outputs emptied; the exported P-value
+// gives the missing value.
+TEST(AllocationFailure, ConsolidateLambdas) {
+  const double lambdas[] = {0.5, 0.5, 0.2};
+  std::vector<double> distinct{1.0};
+  std::vector<unsigned> counts{1};
+  EXPECT_EQ(failingFirstAllocation(
+                [&] { return qel::ConsolidateLambdas(lambdas, 3, distinct, counts); }),
+            qel::qelFailOutOfMemory);
+  EXPECT_TRUE(distinct.empty() && counts.empty());
+  EXPECT_EQ(failingFirstAllocation(
+                [&] { return qel::GetStudentizedMaximumModulusPValue(2.0, 10.0, lambdas, 3); }),
+            qel::mGetMissingValueCode());
 }
 
 }  // namespace
