@@ -41,6 +41,7 @@ const std::map<std::string, std::string>& examples() {
       {"group", "printf '1,10\\n2,20\\n1,30\\n' | qelcalc group - --by 1 --value-column 2"},
       {"ranks", "printf '3\\n1\\n2\\n1\\n' | qelcalc ranks -"},
       {"tukey", "qelcalc tukey crit 0.05 --k 3 --df 12"},
+      {"maxmod", "qelcalc maxmod crit 0.05 --df 20 --lambdas 0.7071,0.7071,0.7071,0.7071"},
   };
   return table;
 }

@@ -601,22 +601,29 @@ QEL_API double GetStudentizedRangeCritValue(double alpha, int k, double df);
 QEL_API double GetStudentizedRangePValue(double q, int k, double df);
 //@}
 
-// Studentized maximum (one-sided) and maximum modulus (two-sided) of
-// count normal variables with correlations lambda_i lambda_j (|lambda| < 1;
-// 1/sqrt(2) for comparisons with one control), over an independent estimate
-// of sigma with df degrees of freedom (df = inf: sigma known). Armed frame;
-// the missing value itself for count 0, a null array, |lambda| >= 1, df <= 0,
-// alpha outside (0, 1) or NaN arguments. P-values are upper tails: 1 for the
-// modulus at x <= 0; the maximum takes any x. Critical values are rounded to
-// two decimals except for count 1 (Student's t quantile).
+/// \name Studentized maximum and maximum modulus
+/// The studentized maximum (one-sided) and maximum modulus (two-sided) of
+/// count normal variables with correlations lambda_i lambda_j (|lambda| < 1;
+/// 1/sqrt(2) for comparisons with one control), over an independent estimate
+/// of sigma with df degrees of freedom (df = inf: sigma known). Armed frame;
+/// the missing value itself for count 0, a null array, |lambda| >= 1, df <= 0,
+/// alpha outside (0, 1) or NaN arguments. P-values are upper tails: 1 for the
+/// modulus at x <= 0; the maximum takes any x. Critical values are rounded to
+/// two decimals except for count 1 (Student's t quantile).
+//@{
+/// The x whose upper tail P(max_i Z_i / s > x) is alpha.
 QEL_API double GetStudentizedMaximumCritValue(double alpha, double df, const double* lambdas,
                                               unsigned count);
+/// The upper tail P(max_i Z_i / s > x).
 QEL_API double GetStudentizedMaximumPValue(double x, double df, const double* lambdas,
                                            unsigned count);
-QEL_API double GetStudentizedMaximumModulusCritValue(double alpha, double df,
-                                                     const double* lambdas, unsigned count);
+/// The x whose upper tail P(max_i |Z_i| / s > x) is alpha.
+QEL_API double GetStudentizedMaximumModulusCritValue(double alpha, double df, const double* lambdas,
+                                                     unsigned count);
+/// The upper tail P(max_i |Z_i| / s > x).
 QEL_API double GetStudentizedMaximumModulusPValue(double x, double df, const double* lambdas,
                                                   unsigned count);
+//@}
 
 namespace v0 {
 
