@@ -42,6 +42,7 @@ FactorialRequest readFactorial(py::object reps, py::object centerPoints, py::obj
   r.given.effect = !effect.is_none();
   r.given.power = !power.is_none();
   requireGiven(r.given, 3, "reps, center_points, effect and power");
+  if (factors.is_none() || runs.is_none()) throw py::type_error("factors and runs are required");
   r.factors = countOption(factors, "factors", 2, 0);
   r.runs = countOption(runs, "runs", 4, 0);
   r.blocks = countOption(blocks, "blocks", 1, 1);
