@@ -8,6 +8,7 @@ Tests return result objects with named fields; a failure code of the
 library raises :class:`qel.Error` (``code`` and ``name``)."""
 from . import _qel
 from . import _errors
+from . import power  # noqa: F401
 from ._errors import *  # noqa: F401,F403
 from ._qel import *  # noqa: F401,F403
 
