@@ -17,9 +17,6 @@ double fromBits(std::uint64_t bits) {
 
 }  // namespace
 
-double mGetMissingValueCode() {
-  return fromBits(0x462F2A2831AE5ED5ULL);
-}
 double mGetUndefinedCode() {
   return fromBits(0xC62F2689C074B614ULL);
 }
@@ -31,12 +28,6 @@ double mGetMaxInteger() {
 }
 double mGetNearlyZero() {
   return fromBits(0x39B4484BFEEBC2A0ULL);
-}
-double mGetEps(bool newEps) {
-  return newEps ? fromBits(0x3CD0000000000000ULL) : fromBits(0x3D719799812DEA11ULL);
-}
-double mGetNewEps() {
-  return fromBits(0x3CD0000000000000ULL);
 }
 double mGetMaxTrigArg() {
   return fromBits(0x412921FA00000000ULL);
@@ -53,10 +44,6 @@ double mGetE() {
 double mGetEulerConst() {
   return fromBits(0x3FE2788CFC6FB619ULL);
 }
-double mQuietNaN() {
-  return fromBits(0x7FF8000000000000ULL);
-}
-
 CmLYNConst::CmLYNConst() {}
 CmLYNConst::~CmLYNConst() {}
 
@@ -74,10 +61,6 @@ bool IsPlusInfinity(double x) {
 }
 bool IsMinusInfinity(double x) {
   return std::isinf(x) && std::signbit(x);
-}
-
-bool mIsNumericMissing(double x) {
-  return x == mGetMissingValueCode();
 }
 
 bool mIsInteger(double x) {

@@ -8,6 +8,7 @@
 #include <cmath>
 #include <csignal>
 #include <cstdint>
+#include <cstring>
 #include <vector>
 
 namespace qel {
@@ -17,13 +18,28 @@ namespace qel {
 static const double MAX_EXPONENT = std::nextafter(709.782712893384, 0.0);
 static const double XEXP = std::nextafter(709.782712893384, 0.0);
 
-double mGetMissingValueCode();
+// The constants read on every call of a distribution function are defined
+// here, inline: an out-of-line call per argument check cost more than the
+// check. Each is an exact bit pattern, so no decimal conversion moves it.
+inline double mDoubleFromBits(std::uint64_t bits) {
+  double d;
+  std::memcpy(&d, &bits, sizeof d);
+  return d;
+}
+
+inline double mGetMissingValueCode() {
+  return mDoubleFromBits(0x462F2A2831AE5ED5ULL);
+}
 double mGetUndefinedCode();
 double mGetMaxDataValue();
 double mGetMaxInteger();
 double mGetNearlyZero();
-double mGetEps(bool newEps = false);
-double mGetNewEps();
+inline double mGetEps(bool newEps = false) {
+  return newEps ? mDoubleFromBits(0x3CD0000000000000ULL) : mDoubleFromBits(0x3D719799812DEA11ULL);
+}
+inline double mGetNewEps() {
+  return mDoubleFromBits(0x3CD0000000000000ULL);
+}
 double mGetMaxTrigArg();
 double mGetMaxExponent();
 double mGetPi();
@@ -31,7 +47,9 @@ double mGetE();
 double mGetEulerConst();
 
 // Quiet NaN with the bits 0x7FF8000000000000, the "not available" answer.
-double mQuietNaN();
+inline double mQuietNaN() {
+  return mDoubleFromBits(0x7FF8000000000000ULL);
+}
 
 // Carries the name of the constants' source; no data, no behaviour.
 class CmLYNConst {
@@ -40,7 +58,10 @@ class CmLYNConst {
   ~CmLYNConst();
 };
 
-bool mIsNumericMissing(double x);
+// A quiet comparison: a NaN argument is simply not the missing value.
+inline bool mIsNumericMissing(double x) {
+  return x == mGetMissingValueCode();
+}
 bool mIsInteger(double x);
 int mToINTG(unsigned int x);
 int mToINTG(double x);

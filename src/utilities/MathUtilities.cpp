@@ -7,29 +7,6 @@
 
 namespace qel {
 
-namespace {
-
-// Absolute part of the tolerance for a scale f.
-double absolutePart(double f) {
-  return f == 0.0 ? 1e-30 : mGetFuzzMax(f);
-}
-
-}  // namespace
-
-double mGetFuzzMax(double x) {
-  return x * 0.01 * mGetEps(false);
-}
-
-int mCompareWithFuzz(double a, double b, double f) {
-  const double tolerance = absolutePart(f) + mGetEps(false) * std::max(std::fabs(a), std::fabs(b));
-  if (std::fabs(a - b) <= tolerance) return 0;
-  return a < b ? -1 : 1;
-}
-
-bool mEqualWithinFuzz(double a, double b, double f) {
-  return mCompareWithFuzz(a, b, f) == 0;
-}
-
 bool mApproxEqual(double a, double b, double relative, double absolute) {
   const double difference = std::fabs(a - b);
   return relative * std::fabs(a) >= difference || absolute >= difference;
@@ -47,10 +24,6 @@ bool mIsEven(double x, double f) {
 
 double mModulo(double a, double b) {
   return std::fmod(a, b);
-}
-
-double mNearestInteger(double x) {
-  return x >= 0.0 ? std::floor(x + 0.5) : std::ceil(x - 0.5);
 }
 
 double mTransferSign(double magnitude, double sign) {

@@ -6,7 +6,11 @@
 #ifndef QEL_SRC_UTILITIES_MATHUTILITIES_H
 #define QEL_SRC_UTILITIES_MATHUTILITIES_H
 
+#include <algorithm>
+#include <cmath>
 #include <vector>
+
+#include "utilities/LYNBasicTypes.h"
 
 namespace qel {
 
@@ -30,16 +34,28 @@ int mLogVector(const std::vector<double>& x, std::vector<double>& out);
 // The values of a (in a's order, repeats kept) that also occur in b.
 std::vector<int> mGetINTGVectorIntersection(const std::vector<int>& a, const std::vector<int>& b);
 
-double mGetFuzzMax(double x);
-int mCompareWithFuzz(double a, double b, double f);
-bool mEqualWithinFuzz(double a, double b, double f);
+// Inline: the distribution kernels compare within the fuzz on every call.
+inline double mGetFuzzMax(double x) {
+  return x * 0.01 * mGetEps(false);
+}
+inline int mCompareWithFuzz(double a, double b, double f) {
+  const double absolutePart = f == 0.0 ? 1e-30 : mGetFuzzMax(f);
+  const double tolerance = absolutePart + mGetEps(false) * std::max(std::fabs(a), std::fabs(b));
+  if (std::fabs(a - b) <= tolerance) return 0;
+  return a < b ? -1 : 1;
+}
+inline bool mEqualWithinFuzz(double a, double b, double f) {
+  return mCompareWithFuzz(a, b, f) == 0;
+}
 // Only |a| scales the relative part: not symmetric in a and b.
 bool mApproxEqual(double a, double b, double relative, double absolute);
 bool mIsIntegerWithinFuzz(double x, double f);
 bool mIsEven(double x, double f);
 double mModulo(double a, double b);
 // Halves go away from zero.
-double mNearestInteger(double x);
+inline double mNearestInteger(double x) {
+  return x >= 0.0 ? std::floor(x + 0.5) : std::ceil(x - 0.5);
+}
 // The magnitude's bits with the sign bit of the second argument.
 double mTransferSign(double magnitude, double sign);
 

@@ -8,8 +8,10 @@
 #include <cstring>
 #include <map>
 #include <string>
+#include <thread>
 
 #include "reference_data.h"
+#include "utilities/elv/limits.h"
 #include "utilities/elv/wrappers.h"
 
 namespace {
@@ -158,6 +160,22 @@ TEST(ElvArithmetic, MatchesHighPrecisionValues) {
     std::printf("[ accuracy ] %-28s largest error %.3g\n", f.c_str(), err);
   }
   EXPECT_EQ(worst.size(), 15u);
+}
+
+// The deep-tail flag belongs to the thread that opened the scope, and the
+// scope restores what it found, nested or not.
+TEST(ElvFrame, DeepTailScopeIsPerThreadAndRestores) {
+  using qel::elv::underflowLog;
+  ASSERT_EQ(underflowLog(), qel::elv::kUnderflowLog);
+  double seenByOtherThread = 0.0;
+  {
+    const qel::elv::DeepTailScope outer;
+    std::thread([&] { seenByOtherThread = underflowLog(); }).join();
+    { const qel::elv::DeepTailScope inner; }
+    EXPECT_EQ(underflowLog(), qel::elv::kDeepUnderflowLog);
+  }
+  EXPECT_EQ(seenByOtherThread, qel::elv::kUnderflowLog);
+  EXPECT_EQ(underflowLog(), qel::elv::kUnderflowLog);
 }
 
 }  // namespace

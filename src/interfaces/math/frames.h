@@ -39,8 +39,10 @@ inline double missingToNaN(double result) {
   return bits == kMissingBits ? mQuietNaN() : result;
 }
 
+// Inlined into each exported function, so that the kernel is a direct call
+// and the whole frame costs the four state loads and a few moves.
 template <class Kernel, class X, class... Params>
-double armed(Kernel kernel, X x, Params... params) {
+__attribute__((always_inline)) inline double armed(Kernel kernel, X x, Params... params) {
   const elv::DeepTailScope deep;
   fpu::arm();
   const double result = kernel(x, params...);

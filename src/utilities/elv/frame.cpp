@@ -7,9 +7,10 @@
 // outer routine that ends normally keep an inner failure standing.
 #include <qel/elv.h>
 
+#include <cstddef>
 #include <cstdio>
-#include <cstring>
 
+#include "utilities/elv/limits.h"
 #include "utilities/elv/thread_status.h"
 
 extern "C" {
@@ -35,15 +36,19 @@ const char* const ELVerrlist[5] = {
 namespace {
 
 // The calling thread's code: ELVerrno's twin that no other thread writes.
-thread_local int threadErrno = 0;
+// Initial-exec TLS (limits.h): every run opens and closes on it.
+thread_local int threadErrno QEL_FAST_TLS = 0;
 
+// The name as strncpy would store it (at most 30 bytes, the rest zero), by
+// hand: the names are short literals, and the library call with its
+// padding cost more than the routine's own work on a short series.
 void storeRoutineName(const char* name) {
-  if (name == nullptr) {
-    ELVroutine[0] = '\0';
-    return;
+  constexpr std::size_t kUsable = sizeof ELVroutine - 1;
+  std::size_t i = 0;
+  if (name != nullptr) {
+    for (; i < kUsable && name[i] != '\0'; ++i) ELVroutine[i] = name[i];
   }
-  std::strncpy(ELVroutine, name, sizeof ELVroutine - 1);
-  ELVroutine[sizeof ELVroutine - 1] = '\0';
+  for (; i < sizeof ELVroutine; ++i) ELVroutine[i] = '\0';
 }
 
 }  // namespace

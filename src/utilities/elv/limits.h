@@ -17,7 +17,13 @@ constexpr double kDeepUnderflowLog = -708.3964185322641;
 // Deep tails: the exported distribution functions answer tails down to the
 // smallest normal double, below the routines' own underflow limit (where a
 // direct call reports an exact 0 with code 1). Set per thread by a scope.
-inline thread_local bool deepTails = false;
+//
+// Read on every underflow test, so it takes the initial-exec TLS model: an
+// offset from the thread pointer, where the default model of a shared
+// library calls __tls_get_addr on each read. The flag is one byte of the
+// static TLS block that glibc keeps spare for libraries loaded at run time.
+#define QEL_FAST_TLS __attribute__((tls_model("initial-exec")))
+inline thread_local bool deepTails QEL_FAST_TLS = false;
 
 inline double underflowLog() {
   return deepTails ? kDeepUnderflowLog : kUnderflowLog;

@@ -12,11 +12,13 @@
 #ifndef QEL_SRC_UTILITIES_ELV_PRECISION_H
 #define QEL_SRC_UTILITIES_ELV_PRECISION_H
 
+#include <atomic>
+
 namespace qel {
 namespace elv {
 
 enum class ElvPrecision {
-  Full,     // double precision (the default)
+  Full,        // double precision (the default)
   Historical,  // cut-off 1e-9, mixture stop 5e-10
 };
 
@@ -27,10 +29,29 @@ struct ElvTolerances {
   double mixtureStop;   // tail weight and relative rest of a mixture sum
 };
 
-// Process-wide; a change applies to the runs that start after it.
-void setElvPrecision(ElvPrecision precision);
-ElvPrecision elvPrecision();
-const ElvTolerances& elvTolerances();
+// Full: a series stops once its term falls below 2^-56 of the leading 1, so
+// the dropped rest is far below one unit in the last place. Newton and the
+// continued fractions stop at a relative step of 1e-13 / gap of 2e-15: the
+// quadratic convergence of Newton puts the applied last step's error near
+// 1e-26, and a continued-fraction midpoint is off by half the gap, while the
+// rounding noise of a tail (a few units of 1e-16) can never stall either.
+inline constexpr ElvTolerances kFullTolerances = {1.4e-17, 1e-13, 2e-15, 1e-17};
+inline constexpr ElvTolerances kHistoricalTolerances = {1e-9, 1e-9, 1e-9, 5e-10};
+
+// Process-wide; a change applies to the runs that start after it. Read
+// inline (a relaxed load and a select): the series ask for their cut-off on
+// every term.
+inline std::atomic<int> currentElvPrecision{static_cast<int>(ElvPrecision::Full)};
+
+inline void setElvPrecision(ElvPrecision precision) {
+  currentElvPrecision.store(static_cast<int>(precision), std::memory_order_relaxed);
+}
+inline ElvPrecision elvPrecision() {
+  return static_cast<ElvPrecision>(currentElvPrecision.load(std::memory_order_relaxed));
+}
+inline const ElvTolerances& elvTolerances() {
+  return elvPrecision() == ElvPrecision::Full ? kFullTolerances : kHistoricalTolerances;
+}
 
 inline double seriesCutoff() {
   return elvTolerances().seriesCutoff;
