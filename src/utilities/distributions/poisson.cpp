@@ -32,16 +32,19 @@ double mPoissonPdf(double x, double mean) {
 
 namespace {
 
-// Means beyond this are a point mass at the mean to double precision: the
-// spread sqrt(mean) lies below a billionth of the mean's last place, and
-// 2 mean (the chi-square argument of the general route) may overflow.
-constexpr double kHugeMean = 1e300;
+// Beyond this mean the leading term of Temme's expansion alone gives the
+// tails to double precision, and every quantile rounds to the mean (the
+// spread 40 sqrt(mean) is below half its last place); the general route
+// has no answer there (2 mean may even overflow).
+constexpr double kHugeMean = 1e40;
 
 // P(X <= k) = Q(k + 1, mean) for a mean beyond kHugeMean by the leading term
 // of Temme's uniform expansion, Q(a, x) = erfc(eta sqrt(a/2))/2 with
-// eta^2/2 = lambda - 1 - ln lambda, lambda = x/a (DLMF 8.12.3, 8.12.4); the
-// terms left out are smaller by 1/sqrt(a) < 1e-150. Outside lambda in
-// [1/2, 2] the tail lies below e^-(a/10), far under the double range.
+// eta^2/2 = lambda - 1 - ln lambda, lambda = x/a (DLMF 8.12.3, 8.12.4). The
+// first term left out is smaller by eta c0(eta) ~ eta/3 and 1/(3 sqrt(2 pi a)),
+// below 1e-18 wherever the tail is above the double range's floor (there
+// eta < sqrt(1490/a)). Outside lambda in [1/2, 2] the tail lies below
+// e^-(a/10).
 void hugeMeanTails(double k, double mean, double* lower, double* upper) {
   const double a = k + 1.0;
   if (a < 0.5 * mean || 0.5 * a > mean) {
@@ -86,7 +89,7 @@ double mPoissonInvCdf(double p, double mean) {
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
   // The quantile mean + z sqrt(mean) + O(z^2) rounds to the mean itself for
-  // every p the doubles hold (|z| < 40): z sqrt(mean) is below 1e-140 of it.
+  // every p the doubles hold (|z| < 40).
   if (std::isgreater(mean, kHugeMean) && p > 0.0 && p < 1.0) return std::floor(mean);
   unsigned long k = 0;
   double fraction = 0.0;
