@@ -150,20 +150,34 @@ ElvStatus betaMixtureTails(double x, double df1, double df2, double noncentralit
   return elv_beta_ncdf2(w, d, c, L, upper, lower);
 }
 
-// Central F tails where a df is tiny, from the beta law (df1/2, df2/2) at
-// y = c x/(d + c x) and w = d/(d + c x), c = df1/2, d = df2/2, both formed
-// in logarithms from ln(c x/d) (c x may overflow, y or w fall below the
-// normal range).
+// Central F tails where a df is tiny, from the beta law (c, d) = (df1/2,
+// df2/2) at y = c x/(d + c x) and w = d/(d + c x), both formed in
+// logarithms from ln(c x/d) (c x may overflow, y or w fall below the normal
+// range). A half df below the normal range (which the armed state reads as
+// 0) is taken doubled: to first order in it the tail at the far end from it
+// is proportional to it (halved afterwards), and with both halves that small
+// the tails depend on their ratio only.
 bool tinyDfFTails(double x, double df1, double df2, double* lower, double* upper) {
-  const double c = 0.5 * df1, d = 0.5 * df2;
-  if (!(c >= DBL_MIN && d >= DBL_MIN && x >= DBL_MIN) || std::isinf(x)) return false;
-  const double lr = std::log(c) + std::log(x) - std::log(d);
+  if (!(df1 >= DBL_MIN && df2 >= DBL_MIN && x >= DBL_MIN) || std::isinf(x)) return false;
+  double c = 0.5 * df1, d = 0.5 * df2;
+  const bool cDoubled = !(c >= DBL_MIN), dDoubled = !(d >= DBL_MIN);
+  if (cDoubled) c = df1;
+  if (dDoubled) d = df2;
+  const double lr = std::log(df1) + std::log(x) - std::log(df2);
   // ln y = -ln(1 + e^-lr), ln w = -ln(1 + e^lr), each with exp of a
   // non-positive argument.
   const double ly = lr <= 0.0 ? lr - std::log1p(std::exp(lr)) : -std::log1p(std::exp(-lr));
   const double lw = lr >= 0.0 ? -lr - std::log1p(std::exp(-lr)) : -std::log1p(std::exp(lr));
   const auto expOrZero = [](double v) { return v < -708.39 ? 0.0 : std::exp(v); };
-  return smallshape::betaTails(c, d, expOrZero(ly), ly, expOrZero(lw), lw, lower, upper);
+  if (!smallshape::betaTails(c, d, expOrZero(ly), ly, expOrZero(lw), lw, lower, upper)) {
+    return false;
+  }
+  if (cDoubled != dDoubled) {
+    double* proportional = cDoubled ? upper : lower;
+    *proportional *= 0.5;
+    *(cDoubled ? lower : upper) = 0.5 + (0.5 - *proportional);
+  }
+  return true;
 }
 
 // True when df1 x and df2 + df1 x stay far inside the double range (the

@@ -248,7 +248,14 @@ bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double*
   }
   if (noncentrality == 0.0 &&
       (std::islessequal(df, 2.0 * smallshape::kTinyShape) || x < 2.0 * smallshape::kTinyArgument) &&
-      smallShapeGammaTails(df / 2.0, x / 2.0, x, 2.0, true, lower, upper)) {
+      smallShapeGammaTails(df < 2.0 * DBL_MIN ? df : df / 2.0, x / 2.0, x, 2.0, true, lower,
+                           upper)) {
+    if (df < 2.0 * DBL_MIN) {
+      // df/2 below the normal range (read as 0 when armed), taken doubled:
+      // the upper tail is proportional to the shape to first order.
+      *upper *= 0.5;
+      *lower = 0.5 + (0.5 - *upper);
+    }
     return true;
   }
   if (noncentrality == 0.0 && gammaratio::fastTails(df / 2.0, x / 2.0, lower, upper)) return true;

@@ -57,24 +57,29 @@ double logOnePlusScaled(double s, double u) {
   return std::fabs(su) < 1e-8 ? u * (1.0 - 0.5 * su) : std::log1p(su) / s;
 }
 
-// D = ln Gamma(1 + a + b) - ln Gamma(1 + a) - ln Gamma(1 + b) for
+// ln Gamma(1 + a) / a, by its Taylor series (A&S 6.1.33) for a tiny a,
+// whose product with a alone could fall below the normal range.
+double logGammaOnePlusOverA(double a) {
+  return a <= kTinyShape ? -kEuler + a * (kZeta2 / 2.0 - a * kZeta3 / 3.0) : gamln1(a) / a;
+}
+
+// D/a, D = ln Gamma(1 + a + b) - ln Gamma(1 + a) - ln Gamma(1 + b) for
 // a <= kTinyShape, by the Taylor series of ln Gamma(1 + z) (A&S 6.1.33):
 // with both shapes tiny its linear terms cancel exactly, leaving
 // a b (zeta(2) - zeta(3)(a + b) + ...), relatively accurate however small;
 // otherwise a psi(1 + b) + a^2 psi'(1 + b)/2 + a^3 psi''(1 + b)/6 - ln Gamma(1 + a).
-bool logGammaDefect(double a, double b, double* d) {
+bool logGammaDefectOverA(double a, double b, double* d) {
   if (b <= kTinyShape) {
     const double s = a + b;
-    *d = a * b *
-         (kZeta2 - kZeta3 * s + kZeta4 * (a * a + 1.5 * a * b + b * b) -
-          kZeta5 * (a * a * a + 2.0 * a * b * s + b * b * b));
+    *d = b * (kZeta2 - kZeta3 * s + kZeta4 * (a * a + 1.5 * a * b + b * b) -
+              kZeta5 * (a * a * a + 2.0 * a * b * s + b * b * b));
     return true;
   }
   double ans[2] = {0.0, 0.0};
   int nz = 0, ierr = 0;
   XDPSIFN(1.0 + b, 1, 1, 2, ans, &nz, &ierr);  // psi', -psi''/2
   if (ierr != 0) return false;
-  *d = a * psi(1.0 + b) + a * a * (ans[0] / 2.0 - a * ans[1] / 3.0) - gamln1(a);
+  *d = psi(1.0 + b) + a * (ans[0] / 2.0 - a * ans[1] / 3.0) - logGammaOnePlusOverA(a);
   return std::isfinite(*d);
 }
 
@@ -84,11 +89,15 @@ double logOnePlusRatio(double u, double v) {
 }
 
 // ln I_x(s, t) at x <= 1/2 by the series, s <= kTinyShape; ln G(s, t) =
-// D(s, t) - ln(1 + s/t).
+// D(s, t) - ln(1 + s/t). The terms proportional to s are summed before the
+// multiplication by s, which may leave them below the normal range.
 bool logLowerNearZero(double s, double t, double x, double lx, double* out) {
   double d = 0.0, sum = 0.0;
-  if (!logGammaDefect(s, t, &d) || !powerSeries(s, t, x, 2000, &sum)) return false;
-  *out = s * (lx + logOnePlusScaled(s, sum)) + d - logOnePlusRatio(s, t);
+  if (!logGammaDefectOverA(s, t, &d) || !powerSeries(s, t, x, 2000, &sum)) return false;
+  const double r = s / t;
+  const double ratioTerm = r < 1e-8 ? (1.0 - 0.5 * r) / t : 0.0;
+  *out = s * (lx + logOnePlusScaled(s, sum) + d - ratioTerm) -
+         (r < 1e-8 ? 0.0 : logOnePlusRatio(s, t));
   return std::isfinite(*out);
 }
 
@@ -98,8 +107,8 @@ bool logLowerNearZero(double s, double t, double x, double lx, double* out) {
 bool logLowerOfMirror(double s, double t, double y, double ly, double x, double* out) {
   double d = 0.0, sum = 0.0;
   const int terms = 200 + static_cast<int>(60.0 / std::fmax(x, 1e-3));
-  if (!logGammaDefect(s, t, &d) || !powerSeries(t, s, y, terms, &sum)) return false;
-  *out = t * (ly + logOnePlusScaled(t, sum)) + d - logOnePlusRatio(t, s);
+  if (!logGammaDefectOverA(s, t, &d) || !powerSeries(t, s, y, terms, &sum)) return false;
+  *out = t * (ly + logOnePlusScaled(t, sum)) + s * d - logOnePlusRatio(t, s);
   return std::isfinite(*out);
 }
 
@@ -128,7 +137,7 @@ bool gammaTails(double a, double z, double lz, double* lower, double* upper) {
   if (z <= 1.0) {
     double sum = 0.0;
     if (!powerSeries(a, 0.0, -z, 200, &sum, true)) return false;
-    fromLog(a * (lz + logOnePlusScaled(a, sum)) - gamln1(a), true, lower, upper);
+    fromLog(a * (lz + logOnePlusScaled(a, sum) - logGammaOnePlusOverA(a)), true, lower, upper);
     return true;
   }
   // Q(a, z) = a Gamma(a, z) / Gamma(1 + a), Gamma(a, z) = z^a e^-z times

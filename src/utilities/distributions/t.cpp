@@ -93,6 +93,12 @@ bool tinyDfTails(double t, double n, double* lower, double* upper) {
       t == 0.0) {
     return false;
   }
+  if (n < 2.0 * DBL_MIN) {
+    // n/2 below the normal range: the tail beyond |t| is 1/2 within
+    // n |ln z| < 1e-304 of it, on either side.
+    *lower = *upper = 0.5;
+    return true;
+  }
   const double at = std::fabs(t);
   double lz, lw;
   if (at >= 1.0) {
