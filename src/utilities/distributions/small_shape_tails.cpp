@@ -184,6 +184,13 @@ bool betaTails(double a, double b, double x, double lx, double y, double ly, dou
     fromLog(logTail, true, lower, upper);
     return true;
   }
+  if (b >= 1e20) {
+    // I_x(a, b) = P(a, b x) (1 + O((b x)^2 / b)): (1 - t)^(b - 1) is
+    // e^-(b t) within b t^2, so the beta law scaled by b is the gamma law to
+    // 3e-15 wherever b x < 745; beyond, both tails are 0 or 1 to double
+    // precision either way.
+    return gammaTails(a, b * x, std::log(b) + lx, lower, upper);
+  }
   if (!nearZero || x >= 1e-3) {
     if (!logLowerOfMirror(a, b, y, ly, x, &logTail)) return false;
     fromLog(logTail, false, lower, upper);
