@@ -34,15 +34,16 @@ void fromLog(double logS, bool sIsLower, double* lower, double* upper) {
 }
 
 // sum_k>=1 c_k z^k / (p + k), c_k = (1 - q)_k / k!, or c_k = 1/k! for the
-// gamma series (gammaForm); false after maxTerms terms.
+// gamma series (gammaForm); false after maxTerms terms. The product c_k z^k
+// is carried as one factor: c_k alone overflows for a large q, where the
+// callers keep q z small.
 bool powerSeries(double p, double q, double z, int maxTerms, double* sum, bool gammaForm = false) {
-  double c = 1.0, zk = 1.0, s = 0.0;
+  double cz = 1.0, s = 0.0;
   for (int k = 1; k <= maxTerms; ++k) {
-    c *= gammaForm ? 1.0 / k : (k - q) / k;
-    zk *= z;
-    const double term = c * zk / (p + k);
+    cz *= gammaForm ? z / k : (k - q) / k * z;
+    const double term = cz / (p + k);
     s += term;
-    if (std::fabs(term) <= kRelativeStop * std::fabs(s) || zk == 0.0 || c == 0.0) {
+    if (std::fabs(term) <= kRelativeStop * std::fabs(s) || cz == 0.0) {
       *sum = s;
       return true;
     }
