@@ -75,6 +75,14 @@ def rows():
                 with mp.workdps(400):
                     w = 1 - d(x)  # exact
                 add("beta", x, a, b, beta_tails(d(a), d(b), d(x), w))
+    # A tiny shape beside a huge one: the scale of the law is 1/b.
+    for a in [1e-300, 1e-10]:
+        for b in [1e25, 1e300]:
+            for bx in [1e-5, 0.1, 3.0]:
+                x = bx / b
+                with mp.workdps(400):
+                    w = 1 - d(x)  # exact
+                add("beta", x, a, b, beta_tails(d(a), d(b), d(x), w))
     for m in [1e-300, 1e-30, 1e-8, 2e-5]:
         for n in [1e-300, 1e-30, 1e-8, 2e-5]:
             for x in [1e-300, 1e-10, 1.0, 1e10, 1e300]:
