@@ -93,6 +93,12 @@ TEST(HostileRegressions, DistributionAnswersAsRuled) {
     {"loglogistic pdf, distance beyond DBL_MAX", [] { return LogLogisticPdf(DBL_MAX, 0, 1, -1e300); }, "", 0, 0},
     {"F cdf, x DBL_MAX, noncentral", [] { return FCdf(DBL_MAX, 3, 7, 1, false); }, "", 1, 1},
     {"F cdf, x 1e-300, df2 1e300", [] { return FCdf(1e-300, 3, 1e300, 1, true); }, "", 1, 1},
+    // A mean of DBL_MAX (2 mean once overflowed): a point mass at the mean.
+    {"poisson cdf, mean DBL_MAX", [] { return PoissonCdf(7, DBL_MAX, false); }, "", 0, 0},
+    {"poisson upper at the mean DBL_MAX", [] { return PoissonCdf(DBL_MAX, DBL_MAX, true); }, "", 0.5, 0.5},
+    {"poisson inv, mean DBL_MAX", [] { return PoissonInvCdf(1e-300, DBL_MAX); }, "", DBL_MAX, DBL_MAX},
+    {"gamma inv, scale DBL_MAX, beyond", [] { return GammaInvCdf(0.5, 2, DBL_MAX, 0); }, "", kNaN, kNaN},
+    {"gamma inv, scale DBL_MAX, within", [] { return GammaInvCdf(0.25, 2, DBL_MAX, 0); }, "", 0.96 * DBL_MAX, 0.97 * DBL_MAX},
   };
   // clang-format on
   for (const Case& c : cases) {

@@ -14,6 +14,7 @@
 #include <vector>
 
 #include "fpu_state.h"
+#include "interfaces/math/frames.h"
 #include "utilities/LYNBasicTypes.h"
 
 namespace {
@@ -198,18 +199,25 @@ TEST(ArmedFrame, OverflowCaughtByTheKernelGivesTheLimit) {
 }
 
 TEST(ArmedFrame, UncaughtExceptionsLeaveTheFunctionAndTheThreadArmed) {
-  // The overflow of a quantile times a scale near DBL_MAX is not caught by
-  // the gamma inverse: it leaves the function with the thread armed.
-  EXPECT_THROW(qel::GammaInvCdf(0.5, 2.0, DBL_MAX, 0.0), std::runtime_error);
+  // An overflow that no kernel catches, inside the frame of the exported
+  // functions: it leaves the function with the thread armed.
+  volatile double big = DBL_MAX;
+  const auto product = [](double x, double scale) { return x * scale; };
+  EXPECT_THROW(qel::frame::armed(product, 2.0, static_cast<double>(big)), std::runtime_error);
   EXPECT_TRUE(isArmedState());
   qel::ResetFpuStates();
   // In the array form the remaining elements stay unwritten.
-  std::vector<double> x = {0.1, 0.5, 0.1};
+  std::vector<double> x = {0.5, 2.0, 0.5};
   std::vector<double> out(3, -1.0);
-  EXPECT_THROW(qel::GammaInvCdf(out.data(), x.data(), 3UL, 2.0, DBL_MAX, 0.0), std::runtime_error);
+  EXPECT_THROW(qel::frame::armedArray(product, out.data(), x.data(), 3UL, static_cast<double>(big)),
+               std::runtime_error);
   qel::ResetFpuStates();
   EXPECT_GT(out[0], 0.0);
   EXPECT_EQ(out[2], -1.0);
+  // The gamma quantile times a scale near DBL_MAX, which once overflowed
+  // here, is NaN beyond the double range.
+  EXPECT_TRUE(std::isnan(qel::GammaInvCdf(0.5, 2.0, DBL_MAX, 0.0)));
+  EXPECT_TRUE(isDefaultState());
 }
 
 TEST(BareFrame, UniformTouchesNoStateAndChecksNothing) {

@@ -15,6 +15,7 @@
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -149,6 +150,36 @@ ElvStatus betaMixtureTails(double x, double df1, double df2, double noncentralit
   return elv_beta_ncdf2(w, d, c, L, upper, lower);
 }
 
+// Central F tails where a df is tiny, from the beta law (c, d) = (df1/2,
+// df2/2) at y = c x/(d + c x) and w = d/(d + c x), both formed in
+// logarithms from ln(c x/d) (c x may overflow, y or w fall below the normal
+// range). A half df below the normal range (which the armed state reads as
+// 0) is taken doubled: to first order in it the tail at the far end from it
+// is proportional to it (halved afterwards), and with both halves that small
+// the tails depend on their ratio only.
+bool tinyDfFTails(double x, double df1, double df2, double* lower, double* upper) {
+  if (!(df1 >= DBL_MIN && df2 >= DBL_MIN && x >= DBL_MIN) || std::isinf(x)) return false;
+  double c = 0.5 * df1, d = 0.5 * df2;
+  const bool cDoubled = !(c >= DBL_MIN), dDoubled = !(d >= DBL_MIN);
+  if (cDoubled) c = df1;
+  if (dDoubled) d = df2;
+  const double lr = std::log(df1) + std::log(x) - std::log(df2);
+  // ln y = -ln(1 + e^-lr), ln w = -ln(1 + e^lr), each with exp of a
+  // non-positive argument.
+  const double ly = lr <= 0.0 ? lr - std::log1p(std::exp(lr)) : -std::log1p(std::exp(-lr));
+  const double lw = lr >= 0.0 ? -lr - std::log1p(std::exp(-lr)) : -std::log1p(std::exp(lr));
+  const auto expOrZero = [](double v) { return v < -708.39 ? 0.0 : std::exp(v); };
+  if (!smallshape::betaTails(c, d, expOrZero(ly), ly, expOrZero(lw), lw, lower, upper)) {
+    return false;
+  }
+  if (cDoubled != dDoubled) {
+    double* proportional = cDoubled ? upper : lower;
+    *proportional *= 0.5;
+    *(cDoubled ? lower : upper) = 0.5 + (0.5 - *proportional);
+  }
+  return true;
+}
+
 // True when df1 x and df2 + df1 x stay far inside the double range (the
 // comparisons are quiet, the division cannot overflow).
 bool centralFArgumentsFit(double x, double df1, double df2) {
@@ -183,6 +214,16 @@ double mBetaCdf(double x, double a, double b, bool upperTail) {
   if (x <= 0.0) return upperTail ? 1.0 : 0.0;
   if (x >= 1.0) return upperTail ? 0.0 : 1.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
+  // A tiny shape or argument: the series in logarithms (small_shape_tails.h).
+  if (std::islessequal(a, smallshape::kTinyShape) || std::islessequal(b, smallshape::kTinyShape) ||
+      x < smallshape::kTinyArgument) {
+    const double lx = std::log(x), ly = std::log1p(-x);
+    if (std::fmin(a, b) <= smallshape::kTinyShape
+            ? smallshape::betaTails(a, b, x, lx, 0.5 + (0.5 - x), ly, &lower, &upper)
+            : smallshape::betaTailsAtTinyArgument(a, b, x, lx, &lower, &upper)) {
+      return upperTail ? upper : lower;
+    }
+  }
   if (betaratio::fastTails(a, b, x, 0.5 + (0.5 - x), &lower, &upper)) {
     return upperTail ? upper : lower;
   }
@@ -245,6 +286,12 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
     return true;
   }
   if (noncentrality < kSmallestNoncentrality) noncentrality = 0.0;
+  if (noncentrality == 0.0 &&
+      (std::islessequal(df1, 2.0 * smallshape::kTinyShape) ||
+       std::islessequal(df2, 2.0 * smallshape::kTinyShape)) &&
+      tinyDfFTails(x, df1, df2, lower, upper)) {
+    return true;
+  }
   if (tinyBetaArgument(x, df1, df2, noncentrality, lower, upper)) {
     if (!std::isnan(*lower)) return true;
     *lower = *upper = mGetMissingValueCode();

@@ -16,6 +16,7 @@
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/standardize.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/precision.h"
@@ -109,6 +110,33 @@ double centralChiSqQuantile(double p, double df) {
   return searchUpwardFromZero(f, q);
 }
 
+// Both tails at a tiny shape or a tiny standardized argument z = x/scale,
+// whose logarithm is taken from x and the scale where z itself falls below
+// the normal range (the armed state reads such a z as 0).
+bool smallShapeGammaTails(double shape, double z, double x, double scale, bool fromOrigin,
+                          double* lower, double* upper) {
+  double lz;
+  if (z >= DBL_MIN) {
+    lz = std::log(z);
+  } else if (fromOrigin && x >= DBL_MIN && scale >= DBL_MIN && std::isfinite(scale)) {
+    lz = std::log(x) - std::log(scale);
+  } else {
+    return false;
+  }
+  return smallshape::gammaTails(shape, z, lz, lower, upper);
+}
+
+// The quantile on the caller's scale, q scale + threshold, or NaN where it
+// lies beyond the double range.
+double scaledQuantile(double q, double scale, double threshold) {
+  if (q > 1.0 && scale > DBL_MAX / q) return mQuietNaN();
+  const double v = q * scale;
+  if ((v > 0.0) == (threshold > 0.0) && std::fabs(threshold) > DBL_MAX - std::fabs(v)) {
+    return mQuietNaN();
+  }
+  return v + threshold;
+}
+
 }  // namespace
 
 // --- Function objects ------------------------------------------------------
@@ -163,6 +191,11 @@ double mGammaCdf(double x, double shape, double scale, double threshold, bool up
   if (x < threshold) return upperTail ? 1.0 : 0.0;
   double lower = 0.0, upper = 0.0, density = 0.0;
   const double z = mStandardize(x, threshold, scale);
+  if ((std::islessequal(shape, smallshape::kTinyShape) ||
+       std::isless(z, smallshape::kTinyArgument)) &&
+      smallShapeGammaTails(shape, z, x, scale, threshold == 0.0, &lower, &upper)) {
+    return upperTail ? upper : lower;
+  }
   if (gammaratio::fastTails(shape, z, &lower, &upper)) return upperTail ? upper : lower;
   if (ElvFailed(elv_gamma_df(z, shape, &lower, &upper, &density))) return mGetMissingValueCode();
   return upperTail ? upper : lower;
@@ -182,7 +215,7 @@ double mGammaInvCdf(double p, double shape, double scale, double threshold) {
     q = searchUpwardFromZero(f, q);
     if (mIsNumericMissing(q)) return q;
   }
-  return q * scale + threshold;
+  return scaledQuantile(q, scale, threshold);
 }
 
 double mGammaInvCdfByRootFinder(double p, double shape, double start) {
@@ -211,6 +244,18 @@ bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double*
   if (x <= 0.0) {
     *lower = 0.0;
     *upper = 1.0;
+    return true;
+  }
+  if (noncentrality == 0.0 &&
+      (std::islessequal(df, 2.0 * smallshape::kTinyShape) || x < 2.0 * smallshape::kTinyArgument) &&
+      smallShapeGammaTails(df < 2.0 * DBL_MIN ? df : df / 2.0, x / 2.0, x, 2.0, true, lower,
+                           upper)) {
+    if (df < 2.0 * DBL_MIN) {
+      // df/2 below the normal range (read as 0 when armed), taken doubled:
+      // the upper tail is proportional to the shape to first order.
+      *upper *= 0.5;
+      *lower = 0.5 + (0.5 - *upper);
+    }
     return true;
   }
   if (noncentrality == 0.0 && gammaratio::fastTails(df / 2.0, x / 2.0, lower, upper)) return true;

@@ -30,10 +30,46 @@ double mPoissonPdf(double x, double mean) {
   }
 }
 
+namespace {
+
+// Beyond this mean the leading term of Temme's expansion alone gives the
+// tails to double precision, and every quantile rounds to the mean (the
+// spread 40 sqrt(mean) is below half its last place); the general route
+// has no answer there (2 mean may even overflow).
+constexpr double kHugeMean = 1e40;
+
+// P(X <= k) = Q(k + 1, mean) for a mean beyond kHugeMean by the leading term
+// of Temme's uniform expansion, Q(a, x) = erfc(eta sqrt(a/2))/2 with
+// eta^2/2 = lambda - 1 - ln lambda, lambda = x/a (DLMF 8.12.3, 8.12.4). The
+// first term left out is smaller by eta c0(eta) ~ eta/3 and 1/(3 sqrt(2 pi a)),
+// below 1e-18 wherever the tail is above the double range's floor (there
+// eta < sqrt(1490/a)). Outside lambda in [1/2, 2] the tail lies below
+// e^-(a/10).
+void hugeMeanTails(double k, double mean, double* lower, double* upper) {
+  const double a = k + 1.0;
+  if (a < 0.5 * mean || 0.5 * a > mean) {
+    *lower = a < mean ? 0.0 : 1.0;
+    *upper = a < mean ? 1.0 : 0.0;
+    return;
+  }
+  const double d = (mean - a) / a;
+  const double eta = std::copysign(std::sqrt(2.0 * rlog1(d)), d);
+  const double v = eta * std::sqrt(0.5 * a);
+  *lower = 0.5 * erfc1(0, v);
+  *upper = 0.5 * erfc1(0, -v);
+}
+
+}  // namespace
+
 // The upper tail P(X >= k) is P(X > k - 1).
 double mPoissonCdf(double x, double mean, bool upperTail) {
   const double k = upperTail ? discrete::upperPoint(x) - 1.0 : discrete::cdfPoint(x);
   if (k < 0.0) return upperTail ? 1.0 : 0.0;
+  if (std::isgreater(mean, kHugeMean)) {
+    double lower = 0.0, upper = 0.0;
+    hugeMeanTails(k, mean, &lower, &upper);
+    return upperTail ? upper : lower;
+  }
   // 2(k + 1) degrees of freedom beyond the double range: the count lies far
   // above any finite mean's bulk (Chebyshev: mean + sqrt(mean) 1e150).
   if (k > 1e300 && k > 2.0 * mean) return upperTail ? 0.0 : 1.0;
@@ -52,6 +88,9 @@ double mPoissonCdf(double x, double mean, bool upperTail) {
 double mPoissonInvCdf(double p, double mean) {
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
+  // The quantile mean + z sqrt(mean) + O(z^2) rounds to the mean itself for
+  // every p the doubles hold (|z| < 40).
+  if (std::isgreater(mean, kHugeMean) && p > 0.0 && p < 1.0) return std::floor(mean);
   unsigned long k = 0;
   double fraction = 0.0;
   const bool lowerRoutine = p <= 0.5;

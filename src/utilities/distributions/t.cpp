@@ -6,6 +6,7 @@
 // The noncentral quantile solves the smaller tail in logarithms
 // (tail_quantile.h), started from the mean of the noncentral t.
 #include <algorithm>
+#include <cfloat>
 #include <cmath>
 #include <stdexcept>
 
@@ -16,6 +17,7 @@
 #include "utilities/distributions/noncentral_t.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
@@ -76,6 +78,42 @@ bool centralTByIncompleteBeta(double t, double n, double* lower, double* upper) 
   const double s = n + t2;
   double ratio = 0.0, complement = 0.0;
   if (!betaratio::fastTails(n / 2.0, 0.5, n / s, t2 / s, &ratio, &complement)) return false;
+  *(t < 0.0 ? lower : upper) = 0.5 * ratio;
+  *(t < 0.0 ? upper : lower) = 0.5 + 0.5 * complement;
+  return true;
+}
+
+// Central tails at df n <= 2e-5 by the beta law (n/2, 1/2) at
+// z = n/(n + t^2), 1 - z = t^2/(n + t^2), both in logarithms (t^2 may
+// overflow, z fall below the normal range): almost all the mass lies beyond
+// any fixed |t|, half on each side, so both tails near 1/2 carry the tiny
+// tail I_z(n/2, 1/2)/2 of the series.
+bool tinyDfTails(double t, double n, double* lower, double* upper) {
+  if (!std::islessequal(n, 2.0 * smallshape::kTinyShape) || !(n >= DBL_MIN) || !std::isfinite(t) ||
+      t == 0.0) {
+    return false;
+  }
+  if (n < 2.0 * DBL_MIN) {
+    // n/2 below the normal range: the tail beyond |t| is 1/2 within
+    // n |ln z| < 1e-304 of it, on either side.
+    *lower = *upper = 0.5;
+    return true;
+  }
+  const double at = std::fabs(t);
+  double lz, lw;
+  if (at >= 1.0) {
+    lw = -std::log1p(n / at / at);
+    lz = std::log(n) - 2.0 * std::log(at) + lw;
+  } else {
+    lz = -std::log1p(at * at / n);
+    lw = 2.0 * std::log(at) - std::log(n) + lz;
+  }
+  const auto expOrZero = [](double v) { return v < -708.39 ? 0.0 : std::exp(v); };
+  double ratio = 0.0, complement = 0.0;
+  if (!smallshape::betaTails(n / 2.0, 0.5, expOrZero(lz), lz, expOrZero(lw), lw, &ratio,
+                             &complement)) {
+    return false;
+  }
   *(t < 0.0 ? lower : upper) = 0.5 * ratio;
   *(t < 0.0 ? upper : lower) = 0.5 + 0.5 * complement;
   return true;
@@ -154,6 +192,7 @@ bool mTCdf(double x, double df, double noncentrality, double* lower, double* upp
   }
   ElvStatus status;
   try {
+    if (noncentrality == 0.0 && tinyDfTails(x, df, lower, upper)) return true;
     if (noncentrality == 0.0 && centralTByIncompleteBeta(x, df, lower, upper)) return true;
     if (noncentrality == 0.0 && std::fabs(x) > kFarT && df > 0.0 && df <= kElvMaxDf &&
         elv::elvPrecision() == elv::ElvPrecision::Full) {
