@@ -39,13 +39,29 @@ inline double missingToNaN(double result) {
   return bits == kMissingBits ? mQuietNaN() : result;
 }
 
+// The compiler does not see that arithmetic depends on the floating-point
+// state: an inlined kernel's register arithmetic could move across the state
+// switches. An empty asm that claims to change its operand pins the value to
+// its place in the instruction stream (no instruction is emitted).
+inline double pinned(double v) {
+  __asm__ __volatile__("" : "+x"(v));
+  return v;
+}
+template <class T>
+inline T pinned(T v) {
+  __asm__ __volatile__("" : "+m"(v));
+  return v;
+}
+
 // Inlined into each exported function, so that the kernel is a direct call
-// and the whole frame costs the four state loads and a few moves.
+// and the whole frame costs the four state loads and a few moves. The
+// argument is pinned after arming and the result before the reset, so the
+// kernel runs armed even where it is inlined.
 template <class Kernel, class X, class... Params>
 __attribute__((always_inline)) inline double armed(Kernel kernel, X x, Params... params) {
   const elv::DeepTailScope deep;
   fpu::arm();
-  const double result = kernel(x, params...);
+  const double result = pinned(kernel(pinned(x), params...));
   fpu::reset();
   // Tested in the default state, after the reset.
   return missingToNaN(result);
