@@ -15,7 +15,8 @@ Method (30 digits):
     decays like a Gaussian at both ends, so the rule converges exponentially;
     Trefethen and Weideman, SIAM Review 56, 2014), steps h and h/2; the nodes of h
     are a subset of those of h/2, |T_h - T_h/2| is the error estimate.
-  * V_k on w in [0, 17] by piecewise Chebyshev-Lobatto interpolation on unit pieces,
+  * V_k on w in [0, 17] by piecewise Chebyshev-Lobatto interpolation on pieces of
+    width 1 / ceil(k / 20) (V_k steepens with k),
     degrees n and 2n (nested nodes); their largest difference at the midpoints of
     the finer nodes is the error estimate. Beyond w = 17, V_k < 1e-26 is taken as 0.
   * The outer integral in t = log s, over the support where f(s) s > 1e-28, by
@@ -122,8 +123,10 @@ class Interpolant:
         self.interp_err = mpf(0)
         self.pieces = []
         fine_t = lobatto(2 * CHEB_N)
-        for lo in range(W_MAX):
-            xs = [lo + (t + 1) / 2 for t in fine_t]
+        self.per_unit = -(-k // 20)
+        for j in range(W_MAX * self.per_unit):
+            lo = mpf(j) / self.per_unit
+            xs = [lo + (t + 1) / (2 * self.per_unit) for t in fine_t]
             ys = []
             for x in xs:
                 v, e = tail(x)
@@ -139,7 +142,7 @@ class Interpolant:
     def __call__(self, w):
         if w >= W_MAX:
             return mpf(0)
-        xs, ys = self.pieces[int(w)]
+        xs, ys = self.pieces[int(w * self.per_unit)]
         return bary(xs, ys, w)
 
 
