@@ -31,7 +31,7 @@ that value is written, its difference from the quadrature is the row's error.
 The q of each (k, df, P) comes from tests/data/studentized_range_r.csv (R's root
 near P = 0.5, 0.1, 0.05, 0.01, 0.001); the rows are exact (k, df, q, P(Q > q)).
 Writes tests/data/studentized_range_grid_mp.csv: k, df, q, upper, error estimate.
-Run from the repository root (about 2 minutes per k on an idle core):
+Run from the repository root (1 to 6 minutes per k, k = 100 the longest; about 25 in all):
     python3 tools/reference/gen_studentized_grid.py [k ...]
 """
 import math
