@@ -1,5 +1,5 @@
 // The studentized range against mpmath double integrals
-// (tools/reference/gen_studentized_range.py) and R's ptukey
+// (tools/reference/gen_studentized_range.py, gen_studentized_grid.py) and R's ptukey
 // (tools/reference/studentized_range_r.R), its table, rules and edges.
 #include <gtest/gtest.h>
 
@@ -24,6 +24,20 @@ TEST(StudentizedRange, UpperTailMatchesMpmath) {
     const auto& v = row.numbers;
     EXPECT_LE(relativeError(qel::mStudentizedRangePValue(v[2], int(v[0]), v[1]), v[3]), 1e-9)
         << row.line;
+  }
+}
+
+// The grid k = 2..100, df = 1..1000 (10.5 and 241 off the integers), P = 0.5
+// to 0.001, each row an exact (q, P) pair to 25 digits
+// (tools/reference/gen_studentized_grid.py): 1e-9 absolute and 1e-7 relative.
+TEST(StudentizedRange, UpperTailOnMpmathGrid) {
+  const auto rows = qeltest::loadReferenceData("studentized_range_grid_mp.csv", 0);
+  ASSERT_EQ(rows.size(), 420u);
+  for (const auto& row : rows) {
+    const auto& v = row.numbers;
+    const double p = qel::GetStudentizedRangePValue(v[2], int(v[0]), v[1]);
+    EXPECT_LE(std::fabs(p - v[3]), 1e-9) << row.line;
+    EXPECT_LE(relativeError(p, v[3]), 1e-7) << row.line;
   }
 }
 
