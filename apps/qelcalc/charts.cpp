@@ -86,9 +86,9 @@ void drawNotes(Svg& svg, const Area& a, const std::vector<std::string>& notes) {
 // The listed percentages of a probability axis.
 const double kPercents[] = {0.1, 1, 5, 10, 20, 30, 50, 70, 80, 90, 95, 99, 99.9};
 
-// The score range of the probability axis: the points' scores widened to
-// the nearest listed percentages around them (a little beyond the points
-// where the list ends first).
+// The score range of the probability axis: the points' scores, widened by a
+// margin so that no point sits on the frame, then to the nearest listed
+// percentages around them (the margin alone where the list ends first).
 std::pair<double, double> scoreRange(const ProbabilityPlotPicture& p) {
   const auto mm = std::minmax_element(p.scores.begin(), p.scores.end());
   const double lo = *mm.first, hi = *mm.second;
@@ -96,8 +96,8 @@ std::pair<double, double> scoreRange(const ProbabilityPlotPicture& p) {
   double below = -HUGE_VAL, above = HUGE_VAL;
   for (double pc : kPercents) {
     const double s = p.scoreOf(pc / 100);
-    if (s <= lo) below = std::max(below, s);
-    if (s >= hi) above = std::min(above, s);
+    if (s <= lo - pad) below = std::max(below, s);
+    if (s >= hi + pad) above = std::min(above, s);
   }
   return {std::isfinite(below) ? below : lo - pad, std::isfinite(above) ? above : hi + pad};
 }
