@@ -26,8 +26,9 @@ class CmMaximumInner : public CbStudentizedInner {
     // count
     double d, c, invC, m;
   };
-  // sum_j m_j log F_j(z), or -1 when some F_j is 0.
-  double logProduct(double z, double w) const;
+  // sum_j m_j log F_j(z), or 1 when some F_j is 0; normal tails beyond
+  // cut are taken as 0.
+  double logProduct(double z, double w, double cut) const;
   // int phi(z) (1 - prod_j F_j(z)^m_j) dz over the lambdas other than 0.
   double zIntegral(double w) const;
 
