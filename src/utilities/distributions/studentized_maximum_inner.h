@@ -38,6 +38,10 @@ class CmMaximumInner : public CbStudentizedInner {
   bool mModulus;
 };
 
+// P(T > x s) for the maximum or modulus: a trapezoidal sum over log s for
+// df >= 4, mGLV otherwise.
+double mMaximumTail(const CmMaximumInner& inner, double x, double df);
+
 // P(R > w), R the range of k standard normal variables.
 class CmRangeInner : public CbStudentizedInner {
  public:

@@ -51,7 +51,7 @@ bool prepare(const double* lambdas, unsigned count, double df, std::vector<doubl
 double tail(const CmMaximumInner& inner, double x, double df, bool modulus) {
   if (modulus && x <= 0.0) return 1.0;
   if (std::isinf(x)) return x > 0.0 ? 0.0 : 1.0;
-  return mGLV(inner, x, df);
+  return mMaximumTail(inner, x, df);
 }
 
 double pValue(double x, double df, const double* lambdas, unsigned count, bool modulus) {
