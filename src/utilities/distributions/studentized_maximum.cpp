@@ -125,39 +125,52 @@ CmMaximumInner::CmMaximumInner(const std::vector<double>& distinct,
 
 double CmMaximumInner::logProduct(double z, double w, double cut) const {
   using studentized::fastUpperNormal;
-  double sum = 0.0;
+  // The factors F = 1 - q with q < 1e-4 enter the log-sum by their series;
+  // the others are multiplied (one logarithm per point), folded into the
+  // sum before the product could underflow.
+  double sum = 0.0, product = 1.0;
+  auto multiply = [&](double F, double m) {
+    // (F > 0; a small one is taken alone, so that the product stays normal.)
+    if (F < 1e-30) {
+      sum += m * std::log(F);
+      return;
+    }
+    for (double i = 0.0; i < m; ++i) {
+      product *= F;
+      if (product < 1e-250) sum += std::log(product), product = 1.0;
+    }
+  };
   for (const Factor& f : mFactors) {
     const double a = (w - f.d * z) * f.invC;
-    double logF;
+    double q = 0.0, F = 1.0;
     if (!mModulus) {
       if (a > cut) continue;
       if (a >= 0.0) {
-        logF = log1mSmall(fastUpperNormal(a));
+        q = fastUpperNormal(a);
       } else {
-        const double p = fastUpperNormal(-a);
-        if (!(p > 0.0)) return 1.0;
-        logF = std::log(p);
+        F = fastUpperNormal(-a);
+        if (!(F > 0.0)) return 1.0;
+        q = 1.0;
       }
     } else {
       // F = Phi(a) - Phi(b), b = (-w - d z)/c <= a.
       const double b = a - 2.0 * w * f.invC;
       const double qa = a > cut ? 0.0 : fastUpperNormal(a);
       const double qb = -b > cut ? 0.0 : fastUpperNormal(-b);
-      const double q = qa + qb;
-      if (q == 0.0) continue;
-      if (q <= 0.5) {
-        logF = log1mSmall(q);
-      } else {
-        const double F = b >= 0.0   ? fastUpperNormal(b) - qa
-                         : a <= 0.0 ? fastUpperNormal(-a) - qb
-                                    : 1.0 - q;
+      q = qa + qb;
+      if (q > 0.5) {
+        F = b >= 0.0 ? fastUpperNormal(b) - qa : a <= 0.0 ? fastUpperNormal(-a) - qb : 1.0 - q;
         if (!(F > 0.0)) return 1.0;
-        logF = std::log(F);
       }
     }
-    sum += f.m * logF;
+    if (q == 0.0) continue;
+    if (q < 1e-4) {
+      sum += f.m * log1mSmall(q);
+    } else {
+      multiply(q > 0.5 ? F : 1.0 - q, f.m);
+    }
   }
-  return sum;
+  return product == 1.0 ? sum : sum + std::log(product);
 }
 
 double CmMaximumInner::zIntegral(double w) const {
@@ -168,12 +181,15 @@ double CmMaximumInner::zIntegral(double w) const {
     peakLo = first ? p : std::min(peakLo, p);
     peakHi = first ? p : std::max(peakHi, p);
     first = false;
-    narrowest = std::min(narrowest, f.c);
+    narrowest = std::min(narrowest, f.c / std::sqrt(1.0 + 0.5 * std::log(f.m)));
   }
-  // Every piece is at least as wide as a normal of sd c_j (the curvature
-  // of log phi(z) Q((w - l z)/c) is 1/c^2 at its peak): a step of 0.6 sd
-  // leaves a trapezoidal error of about 2 exp(-2 pi^2 / 0.36) = 2e-24.
-  const double h = 0.6 * narrowest / std::sqrt(1.0 + 0.5 * std::log(mK));
+  // Each piece phi(z) (1 - F_j^m_j) is about as wide as a normal of sd c_j
+  // (the curvature of log phi(z) Q((w - l z)/c) is 1/c^2 at its peak),
+  // narrowed by a power m_j (its step sharpens like sqrt(log m)). A step of
+  // 0.62 of that width holds the trapezoidal error below 1e-13 relative,
+  // also for ten distinct lambdas 0.9 to 0.99 (checked against steps a third
+  // as large).
+  const double h = 0.62 * narrowest;
   // A normal tail beyond cut, summed over the k factors and the z-lattice
   // (whose weights sum to about 1), is below 1e-17 of the lower bound
   // Q(|w|) of the answer: Q(cut) / Q(|w|) <= exp(-(cut^2 - w^2)/2) (cut/|w|
