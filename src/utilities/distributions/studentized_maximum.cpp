@@ -156,7 +156,10 @@ double CmMaximumInner::logProduct(double z, double w, double cut) const {
       // F = Phi(a) - Phi(b), b = (-w - d z)/c <= a.
       const double b = a - 2.0 * w * f.invC;
       const double qa = a > cut ? 0.0 : fastUpperNormal(a);
-      const double qb = -b > cut ? 0.0 : fastUpperNormal(-b);
+      // Q(-b) / Q(a) <= exp(-(b^2 - a^2)/2) = exp(-2 w d z / c^2) (z, d >= 0):
+      // below 1e-17 it does not change q.
+      const double gap = 2.0 * w * f.d * z * f.invC * f.invC;
+      const double qb = -b > cut || (gap > 40.0 && qa > 0.0) ? 0.0 : fastUpperNormal(-b);
       q = qa + qb;
       if (q > 0.5) {
         F = b >= 0.0 ? fastUpperNormal(b) - qa : a <= 0.0 ? fastUpperNormal(-a) - qb : 1.0 - q;
@@ -204,7 +207,9 @@ double CmMaximumInner::zIntegral(double w) const {
   double lo, hi;
   if (mModulus) {
     // Even in z: the trapezoidal rule on the whole line from z >= 0.
-    hi = peakHi + kReach;
+    // Beyond z the integrand is below phi(z), and Q(z) is below 1e-16 of
+    // the lower bound 2 Q(w) of the answer at the z given.
+    hi = std::min(peakHi + kReach, std::sqrt(w * w + 2.0 * std::log(1e16)) + 1.0);
     double sum = 0.5 * f(0.0);
     const int last = static_cast<int>(std::ceil(hi / h));
     for (int i = 1; i <= last; ++i) sum += f(i * h);
