@@ -123,12 +123,42 @@ CmMaximumInner::CmMaximumInner(const std::vector<double>& distinct,
   }
 }
 
-double CmMaximumInner::logProduct(double z, double w, double cut) const {
-  using studentized::fastUpperNormal;
+// phi(y) along y_i = y_0 + i s without an exponential at most points:
+// phi(y + s) = phi(y) r, r = exp(-y s - s^2/2), and r itself is multiplied
+// by exp(-s^2) per step. Restarted from exp every 8 steps (the rounding
+// stays below 2e-15 relative) and wherever phi is below 1e-250.
+class DensityWalk {
+ public:
+  DensityWalk(double y, double s) : mS(s), mDecay(std::exp(-s * s)) { restart(y); }
+  double value() const { return mPhi; }
+  // Moves to y (the previous point plus s).
+  void advance(double y) {
+    if (++mSteps >= 8 || mPhi < 1e-250) {
+      restart(y);
+      return;
+    }
+    mPhi *= mRatio;
+    mRatio *= mDecay;
+  }
+
+ private:
+  void restart(double y) {
+    mPhi = studentized::phi(y);
+    mRatio = safeExp(-y * mS - 0.5 * mS * mS);
+    mSteps = 0;
+  }
+  double mS, mDecay, mPhi = 0.0, mRatio = 0.0;
+  int mSteps = 0;
+};
+
+double CmMaximumInner::logProduct(double z, double w, double cut,
+                                  std::vector<DensityWalk>& walks) const {
+  using studentized::upperNormalFromDensity;
   // The factors F = 1 - q with q < 1e-4 enter the log-sum by their series;
   // the others are multiplied (one logarithm per point), folded into the
   // sum before the product could underflow.
   double sum = 0.0, product = 1.0;
+  bool vanishes = false;
   auto multiply = [&](double F, double m) {
     // (F > 0; a small one is taken alone, so that the product stays normal.)
     if (F < 1e-30) {
@@ -140,39 +170,49 @@ double CmMaximumInner::logProduct(double z, double w, double cut) const {
       if (product < 1e-250) sum += std::log(product), product = 1.0;
     }
   };
-  for (const Factor& f : mFactors) {
+  const size_t stride = mModulus ? 2 : 1;
+  for (size_t j = 0; j < mFactors.size(); ++j) {
+    const Factor& f = mFactors[j];
     const double a = (w - f.d * z) * f.invC;
+    // Q(a), or Phi(a) for a < 0, from phi(a).
+    const double pa = walks[stride * j].value();
+    const double smallA = a >= 0.0 ? upperNormalFromDensity(a, pa) : upperNormalFromDensity(-a, pa);
+    if (vanishes) continue;
     double q = 0.0, F = 1.0;
     if (!mModulus) {
       if (a > cut) continue;
       if (a >= 0.0) {
-        q = fastUpperNormal(a);
+        q = smallA;
       } else {
-        F = fastUpperNormal(-a);
-        if (!(F > 0.0)) return 1.0;
+        F = smallA;
+        if (!(F > 0.0)) vanishes = true;
         q = 1.0;
       }
     } else {
       // F = Phi(a) - Phi(b), b = (-w - d z)/c <= a.
       const double b = a - 2.0 * w * f.invC;
-      const double qa = a > cut ? 0.0 : fastUpperNormal(a);
+      const double qa = a > cut ? 0.0 : a >= 0.0 ? smallA : 1.0 - smallA;
       // Q(-b) / Q(a) <= exp(-(b^2 - a^2)/2) = exp(-2 w d z / c^2) (z, d >= 0):
       // below 1e-17 it does not change q.
       const double gap = 2.0 * w * f.d * z * f.invC * f.invC;
-      const double qb = -b > cut || (gap > 40.0 && qa > 0.0) ? 0.0 : fastUpperNormal(-b);
+      const double pb = walks[stride * j + 1].value();
+      const double qb = -b > cut || (gap > 40.0 && qa > 0.0) ? 0.0
+                        : -b >= 0.0                          ? upperNormalFromDensity(-b, pb)
+                                                             : 1.0 - upperNormalFromDensity(b, pb);
       q = qa + qb;
       if (q > 0.5) {
-        F = b >= 0.0 ? fastUpperNormal(b) - qa : a <= 0.0 ? fastUpperNormal(-a) - qb : 1.0 - q;
-        if (!(F > 0.0)) return 1.0;
+        F = b >= 0.0 ? upperNormalFromDensity(b, pb) - qa : a <= 0.0 ? smallA - qb : 1.0 - q;
+        if (!(F > 0.0)) vanishes = true;
       }
     }
-    if (q == 0.0) continue;
+    if (vanishes || q == 0.0) continue;
     if (q < 1e-4) {
       sum += f.m * log1mSmall(q);
     } else {
       multiply(q > 0.5 ? F : 1.0 - q, f.m);
     }
   }
+  if (vanishes) return 1.0;
   return product == 1.0 ? sum : sum + std::log(product);
 }
 
@@ -198,10 +238,29 @@ double CmMaximumInner::zIntegral(double w) const {
   // Q(|w|) of the answer: Q(cut) / Q(|w|) <= exp(-(cut^2 - w^2)/2) (cut/|w|
   // bounded), and the 1 added absorbs the ratio of the prefactors.
   const double cut = std::sqrt(w * w + 2.0 * std::log(1e17 * mK)) + 1.0;
+  // The lattice is walked upwards from z0: phi at the a and -b of each
+  // factor follows from its last value.
+  std::vector<DensityWalk> walks;
+  bool started = false;
   auto f = [&](double z) {
+    if (!started) {
+      walks.reserve(2 * mFactors.size());
+      for (const Factor& g : mFactors) {
+        walks.emplace_back((w - g.d * z) * g.invC, -g.d * h * g.invC);
+        if (mModulus) walks.emplace_back((w + g.d * z) * g.invC, g.d * h * g.invC);
+      }
+      started = true;
+    } else {
+      for (size_t j = 0; j < mFactors.size(); ++j) {
+        const Factor& g = mFactors[j];
+        const size_t stride = mModulus ? 2 : 1;
+        walks[stride * j].advance((w - g.d * z) * g.invC);
+        if (mModulus) walks[stride * j + 1].advance((w + g.d * z) * g.invC);
+      }
+    }
     const double density = studentized::phi(z);
     if (density == 0.0) return 0.0;
-    const double s = logProduct(z, w, cut);
+    const double s = logProduct(z, w, cut, walks);
     return s > 0.0 ? density : -density * std::expm1(s);
   };
   double lo, hi;

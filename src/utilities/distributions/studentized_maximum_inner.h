@@ -9,6 +9,8 @@
 
 namespace qel {
 
+class DensityWalk;
+
 // P(max Y_i > w) or P(max |Y_i| > w) for consolidated lambdas.
 class CmMaximumInner : public CbStudentizedInner {
  public:
@@ -28,7 +30,8 @@ class CmMaximumInner : public CbStudentizedInner {
   };
   // sum_j m_j log F_j(z), or 1 when some F_j is 0; normal tails beyond
   // cut are taken as 0.
-  double logProduct(double z, double w, double cut) const;
+  // phi at a and -b of each factor, walked along the z-lattice.
+  double logProduct(double z, double w, double cut, std::vector<DensityWalk>& walks) const;
   // int phi(z) (1 - prod_j F_j(z)^m_j) dz over the lambdas other than 0.
   double zIntegral(double w) const;
 
