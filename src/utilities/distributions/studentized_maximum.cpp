@@ -271,7 +271,12 @@ double CmMaximumInner::zIntegral(double w) const {
     hi = std::min(peakHi + kReach, std::sqrt(w * w + 2.0 * std::log(1e16)) + 1.0);
     double sum = 0.5 * f(0.0);
     const int last = static_cast<int>(std::ceil(hi / h));
-    for (int i = 1; i <= last; ++i) sum += f(i * h);
+    for (int i = 1; i <= last; ++i) {
+      const double z = i * h;
+      sum += f(z);
+      // The integrand is below phi, so the rest is below Q(z) <= phi(z)/z.
+      if (z >= 1.0 && studentized::phi(z) <= 1e-16 * z * h * sum) break;
+    }
     return 2.0 * h * sum;
   }
   lo = peakLo - kReach;
