@@ -582,7 +582,8 @@ double trapezoidTail(const CmMaximumInner& inner, double x, double df) {
   const double sign = x < 0.0 ? -1.0 : 1.0;
   const double spread = 0.75 / (1.0 + 1.3 * std::log(inner.size()));
   const double h = std::min({0.14, 0.46 / std::sqrt(df), 0.6 * spread});
-  const double t0 = x > 0.0 ? 0.5 * std::log(df / (df + x * x)) : 0.0;
+  const double r = x / std::sqrt(df);
+  const double t0 = x <= 0.0 ? 0.0 : r > 1e150 ? -std::log(r) : -0.5 * std::log1p(r * r);
   auto term = [&](double t) {
     const double logG = g(t);
     if (logG < -745.0) return 0.0;
