@@ -16,11 +16,11 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
+#include "utilities/distributions/studentized_common.h"
 
 namespace qel {
 namespace {
 
-constexpr double kInvSqrt2Pi = 0.39894228040143267794;
 constexpr double kSqrtHalf = 0.70710678118654752440;
 // The lattice spans x in [-48, 12]: beyond r = 54 both tails are 0 and 1 to
 // double precision, and the mass of P(R > r) lies near x = -r/2.
@@ -29,9 +29,9 @@ constexpr double kLatticeHigh = 12.0;
 // k phi(x) Q(x)^(k-1) below x = -9.5 is under 2e-20 k: its sums start there.
 constexpr double kPrefixLow = 9.5;
 
-double phi(double x) {
-  return x * x > 1500.0 ? 0.0 : kInvSqrt2Pi * std::exp(-0.5 * x * x);
-}
+using studentized::phi;
+using studentized::upperNormalFromDensity;
+
 double upperNormal(double x) {
   return 0.5 * std::erfc(x * kSqrtHalf);
 }
@@ -44,52 +44,6 @@ void normalTails(double y, double* upper, double* lower) {
     *lower = upperNormal(-y);
     *upper = 1.0 - *lower;
   }
-}
-
-// Q(y) for y >= 0 from phi(y), without exp: erfc by the rational
-// approximations of ACM TOMS 708 (Didonato and Morris, 1992; routines ERF
-// and ERFC1), highest power first: erfc(u) = 1 - u a(u^2)/b(u^2) for
-// u <= 1/2, e^(u^2) erfc(u) = p(u)/q(u) for 1/2 < u <= 4 and
-// (1/sqrt(pi) - t r(t)/s(t))/u, t = 1/u^2, beyond; within 3e-15 of erfc for
-// u in [0, 26]. With u = y/sqrt(2), Q(y) = sqrt(pi/2) phi(y) e^(u^2) erfc(u).
-double upperNormalFromDensity(double y, double phiY) {
-  static const double a[5] = {.771058495001320e-04, -.133733772997339e-02, .323076579225834e-01,
-                              .479137145607681e-01, .128379167095513e+00};
-  static const double b[3] = {.301048631703895e-02, .538971687740286e-01, .375795757275549e+00};
-  static const double p[8] = {-1.36864857382717e-07, 5.64195517478974e-01, 7.21175825088309e+00,
-                              4.31622272220567e+01,  1.52989285046940e+02, 3.39320816734344e+02,
-                              4.51918953711873e+02,  3.00459261020162e+02};
-  static const double q[8] = {1.00000000000000e+00, 1.27827273196294e+01, 7.70001529352295e+01,
-                              2.77585444743988e+02, 6.38980264465631e+02, 9.31354094850610e+02,
-                              7.90950925327898e+02, 3.00459260956983e+02};
-  static const double r[5] = {2.10144126479064e+00, 2.62370141675169e+01, 2.13688200555087e+01,
-                              4.65807828718470e+00, 2.82094791773523e-01};
-  static const double s[4] = {9.41537750555460e+01, 1.87114811799590e+02, 9.90191814623914e+01,
-                              1.80124575948747e+01};
-  constexpr double kSqrtHalfPi = 1.25331413731550025121;
-  constexpr double kInvSqrtPi = .564189583547756e+00;
-  const double u = y * kSqrtHalf;
-  if (u <= 0.5) {
-    const double t = u * u;
-    const double top = (((a[0] * t + a[1]) * t + a[2]) * t + a[3]) * t + a[4] + 1.0;
-    const double bot = ((b[0] * t + b[1]) * t + b[2]) * t + 1.0;
-    return 0.5 * (0.5 + (0.5 - u * (top / bot)));
-  }
-  double scaled = 0.0;
-  if (u <= 4.0) {
-    double top = 0.0, bot = 0.0;
-    for (int i = 0; i < 8; ++i) {
-      top = top * u + p[i];
-      bot = bot * u + q[i];
-    }
-    scaled = top / bot;
-  } else {
-    const double t = 1.0 / (u * u);
-    const double top = (((r[0] * t + r[1]) * t + r[2]) * t + r[3]) * t + r[4];
-    const double bot = (((s[0] * t + s[1]) * t + s[2]) * t + s[3]) * t + 1.0;
-    scaled = (kInvSqrtPi - t * top / bot) / u;
-  }
-  return kSqrtHalfPi * phiY * scaled;
 }
 
 // b^m for m >= 1 by repeated squaring.

@@ -9,6 +9,8 @@
 
 namespace qel {
 
+class DensityWalk;
+
 // P(max Y_i > w) or P(max |Y_i| > w) for consolidated lambdas.
 class CmMaximumInner : public CbStudentizedInner {
  public:
@@ -26,8 +28,10 @@ class CmMaximumInner : public CbStudentizedInner {
     // count
     double d, c, invC, m;
   };
-  // sum_j m_j log F_j(z), or -1 when some F_j is 0.
-  double logProduct(double z, double w) const;
+  // sum_j m_j log F_j(z), or 1 when some F_j is 0; normal tails beyond
+  // cut are taken as 0.
+  // phi at a and -b of each factor, walked along the z-lattice.
+  double logProduct(double z, double w, double cut, std::vector<DensityWalk>& walks) const;
   // int phi(z) (1 - prod_j F_j(z)^m_j) dz over the lambdas other than 0.
   double zIntegral(double w) const;
 
@@ -36,6 +40,10 @@ class CmMaximumInner : public CbStudentizedInner {
   double mK = 0.0;
   bool mModulus;
 };
+
+// P(T > x s) for the maximum or modulus: a trapezoidal sum over log s for
+// df >= 4, mGLV otherwise.
+double mMaximumTail(const CmMaximumInner& inner, double x, double df);
 
 // P(R > w), R the range of k standard normal variables.
 class CmRangeInner : public CbStudentizedInner {

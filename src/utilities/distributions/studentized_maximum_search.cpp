@@ -9,6 +9,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/normal_range.h"
 #include "utilities/distributions/studentized_maximum_inner.h"
 
 namespace qel {
@@ -51,7 +52,7 @@ bool prepare(const double* lambdas, unsigned count, double df, std::vector<doubl
 double tail(const CmMaximumInner& inner, double x, double df, bool modulus) {
   if (modulus && x <= 0.0) return 1.0;
   if (std::isinf(x)) return x > 0.0 ? 0.0 : 1.0;
-  return mGLV(inner, x, df);
+  return mMaximumTail(inner, x, df);
 }
 
 double pValue(double x, double df, const double* lambdas, unsigned count, bool modulus) {
@@ -65,6 +66,23 @@ double pValue(double x, double df, const double* lambdas, unsigned count, bool m
     return mIsNumericMissing(t) ? t : std::min(1.0, (modulus ? 2.0 : 1.0) * t);
   }
   return tail(CmMaximumInner(distinct, counts, modulus), x, df, modulus);
+}
+
+// For alpha < 1/2 the root is positive (P(max > 0) >= P(Y_1 > 0) = 1/2):
+// the secant method on log P against log x, as for the studentized range,
+// from the Bonferroni point t_df(1 - alpha/k) (alpha/(2k) per tail for the
+// modulus), which lies above the root, and a step 5 percent below it; to
+// 1e-9 in log x, far below the two-decimal rounding.
+double solveOnLogScale(const CmMaximumInner& inner, double alpha, double df, int k, bool modulus) {
+  const double target = std::log(alpha);
+  auto f = [&](double y) {
+    const double p = tail(inner, std::exp(y), df, modulus);
+    return (p > 0.0 ? std::log(p) : -745.0) - target;
+  };
+  double t0 = tUpperQuantile((modulus ? 0.5 : 1.0) * alpha / k, std::min(df, 1e10));
+  if (mIsNumericMissing(t0) || !(t0 > 0.0 && t0 < 1e300)) t0 = 1.0;
+  const double y0 = std::log(t0);
+  return mSolveOnLogScale(f, -1, y0, y0 - 0.05, 1.0, 1e-11, 1e-9);
 }
 
 double critValue(double alpha, double df, const double* lambdas, unsigned count, bool modulus) {
@@ -82,7 +100,12 @@ double critValue(double alpha, double df, const double* lambdas, unsigned count,
   } else {
     mBDMCB1(k, df, 1.0 - alpha, &lower, &upper);
   }
-  double x = mMRGFLS([&](double v) { return tail(inner, v, df, modulus); }, alpha, lower, upper);
+  double x = 0.0;
+  if (alpha < 0.5) {
+    x = solveOnLogScale(inner, alpha, df, k, modulus);
+  } else {
+    x = mMRGFLS([&](double v) { return tail(inner, v, df, modulus); }, alpha, lower, upper);
+  }
   // The modulus tail is 1 at x <= 0.
   if (modulus) x = std::max(x, 0.0);
   return mNearestInteger(100.0 * x) / 100.0;

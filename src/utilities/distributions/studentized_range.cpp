@@ -34,56 +34,20 @@
 #include "utilities/MathUtilities.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/normal_range.h"
+#include "utilities/distributions/studentized_common.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {
 namespace {
 
 constexpr double kSqrt2 = 1.41421356237309504880;
-constexpr double kLog2Pi = 1.83787706640934548356;
 
 const double kTukeyTable[60][8] = {
 #include "utilities/distributions/tukey_table.inc"
 };
 
-double safeExp(double x) {
-  return x < -745.0 ? 0.0 : std::exp(std::min(x, 700.0));
-}
-
-// e^u - 1 - u without cancellation (u = 2t; 1e300 beyond the exp range).
-double expm1MinusU(double u) {
-  if (std::fabs(u) >= 0.5) return u > 700.0 ? 1e300 : std::expm1(u) - u;
-  double term = 0.5 * u * u, sum = term;
-  for (int n = 3; n < 30 && std::fabs(term) > 1e-18 * sum; ++n) {
-    term *= u / n;
-    sum += term;
-  }
-  return sum;
-}
-
-// log g(t) = c0 - x (e^(2t) - 1 - 2t), x = df/2, with
-// c0 = log 2 + x log x - x - log Gamma(x) = log 2 + log(x)/2 - log(2 pi)/2 - d(x),
-// d(x) the remainder of Stirling's series, so that very large df keeps its
-// accuracy.
-struct LogChi {
-  explicit LogChi(double df) : x(0.5 * df) {
-    double d = 0.0;
-    if (x >= 15.0) {
-      const double r = (1.0 / x) * (1.0 / x);
-      d = (1.0 / 12.0 - r * (1.0 / 360.0 - r * (1.0 / 1260.0 - r / 1680.0))) / x;
-    } else {
-      // log Gamma(x) = -log x - gamma x + O(x^2) below x = 1e-8.
-      const double logGamma = x < 1e-8 ? -std::log(x) - 0.57721566490153286061 * x : mLogGamma(x);
-      d = logGamma - ((x - 0.5) * std::log(x) - x + 0.5 * kLog2Pi);
-    }
-    c0 = std::log(2.0) + 0.5 * std::log(x) - 0.5 * kLog2Pi - d;
-  }
-  double operator()(double t) const {
-    const double e = expm1MinusU(2.0 * t);
-    return e > 1e300 / std::max(1.0, x) ? -1e300 : c0 - x * e;
-  }
-  double x, c0;
-};
+using studentized::LogChi;
+using studentized::safeExp;
 
 // sum over j >= 0 of exp(a + alpha t_j + beta e^(2 t_j)), t_j = t0 - j h,
 // given logFirst = a + alpha t0 and z = beta e^(2 t0) (|z| <= 1/2), by
