@@ -8,6 +8,8 @@ packages=(build-essential cmake git googletest libgtest-dev libbenchmark-dev
 packages+=(doxygen)
 # The Python module (QEL_BUILD_PYTHON) and its tests.
 packages+=(python3-dev python3-pybind11 python3-numpy python3-pytest)
+# Headless Chromium renders qelcalc's SVG pictures once (the test skips without it).
+packages+=(chromium)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")
