@@ -153,7 +153,11 @@ double bpser(double a, double b, double x, double eps) {
     }
   }
   if (result == 0.0 || a <= 0.1 * eps) return result;
-  // The series sum of (1 - b/n)...(x^n)/(a + n).
+  // The series sum of c_n/(a + n), c_n = (1 - b/1)...(1 - b/n) x^n. One
+  // division per term: with q = 1/(n (a + n)), the term is
+  // c_(n-1) (n - b) x q and c_n = c_(n-1) (n - b) x (a + n) q; n - b is exact
+  // near n = b, so the factor keeps its digits where it nears 0. The chain
+  // from term to term is one multiplication.
   double sum = 0.0;
   double n = 0.0;
   double c = 1.0;
@@ -161,8 +165,11 @@ double bpser(double a, double b, double x, double eps) {
   double w;
   do {
     n += 1.0;
-    c *= (0.5 + (0.5 - b / n)) * x;
-    w = c / (a + n);
+    const double apn = a + n;
+    const double q = 1.0 / (n * apn);
+    const double h = (n - b) * x * q;
+    w = c * h;
+    c *= h * apn;
     sum += w;
   } while (std::fabs(w) > tol);
   return result * (1.0 + a * sum);
