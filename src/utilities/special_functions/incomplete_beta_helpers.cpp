@@ -4,6 +4,7 @@
 // exp(mu + x) without intermediate overflow (esum).
 #include <algorithm>
 #include <cmath>
+#include <limits>
 
 #include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/special_functions/transcendental.h"
@@ -112,6 +113,34 @@ double prefactor(double a, double b, double x, double y, Exp expo) {
   return a0 * expo(z) * (1.0 + gam1(b0)) / t;
 }
 
+// The last shapes and value of a function of the two shapes, per thread.
+// The distribution functions call the ratio over and over at the same shapes
+// (array forms, grids, quantile searches), and one call can need ln Beta(a, b)
+// twice (the bup and bpser pieces of BRATIO); the lookup replaces the
+// log-gamma work by two comparisons. NaN keys match nothing.
+struct ShapeMemo {
+  double a = std::numeric_limits<double>::quiet_NaN();
+  double b = std::numeric_limits<double>::quiet_NaN();
+  double value = 0.0;
+};
+// initial-exec: an offset from the thread pointer, no __tls_get_addr call.
+thread_local ShapeMemo lastLnBeta __attribute__((tls_model("initial-exec")));
+thread_local ShapeMemo lastBcorr __attribute__((tls_model("initial-exec")));
+
+// Both functions are symmetric in the shapes: either order matches.
+template <class F>
+double memoised(ShapeMemo& memo, double a, double b, F f) {
+  if ((a == memo.a && b == memo.b) || (a == memo.b && b == memo.a)) return memo.value;
+  const double value = f(a, b);
+  memo.a = a;
+  memo.b = b;
+  memo.value = value;
+  return value;
+}
+
+double lnBetaDirect(double a0, double b0);
+double bcorrDirect(double a0, double b0);
+
 }  // namespace
 
 double brcomp(double a, double b, double x, double y) {
@@ -123,6 +152,16 @@ double brcmp1(int mu, double a, double b, double x, double y) {
 }
 
 double betaln(double a0, double b0) {
+  return memoised(lastLnBeta, a0, b0, lnBetaDirect);
+}
+
+double bcorr(double a0, double b0) {
+  return memoised(lastBcorr, a0, b0, bcorrDirect);
+}
+
+namespace {
+
+double lnBetaDirect(double a0, double b0) {
   const double e = .918938533204673e+00;  // ln(2 pi)/2
   double a = std::min(a0, b0);
   double b = std::max(a0, b0);
@@ -174,6 +213,23 @@ double betaln(double a0, double b0) {
   return w + std::log(z) + (gamln(a) + (gamln(b) - gsumln(a, b)));
 }
 
+double bcorrDirect(double a0, double b0) {
+  const double a = std::min(a0, b0);
+  const double b = std::max(a0, b0);
+  const double h = a / b;
+  const double w = stirlingDifference(h / (1.0 + h), 1.0 / (1.0 + h), b);
+  const double t = (1.0 / a) * (1.0 / a);
+  const double del =
+      (((((kStirling[5] * t + kStirling[4]) * t + kStirling[3]) * t + kStirling[2]) * t +
+        kStirling[1]) *
+           t +
+       kStirling[0]) /
+      a;
+  return del + w;
+}
+
+}  // namespace
+
 double algdiv(double a, double b) {
   // c = a/(a + b) and x = b/(a + b), each formed from the smaller ratio.
   double c, x, d;
@@ -193,21 +249,6 @@ double algdiv(double a, double b) {
   const double v = a * (std::log(b) - 1.0);
   if (u > v) return (w - v) - u;
   return (w - u) - v;
-}
-
-double bcorr(double a0, double b0) {
-  const double a = std::min(a0, b0);
-  const double b = std::max(a0, b0);
-  const double h = a / b;
-  const double w = stirlingDifference(h / (1.0 + h), 1.0 / (1.0 + h), b);
-  const double t = (1.0 / a) * (1.0 / a);
-  const double del =
-      (((((kStirling[5] * t + kStirling[4]) * t + kStirling[3]) * t + kStirling[2]) * t +
-        kStirling[1]) *
-           t +
-       kStirling[0]) /
-      a;
-  return del + w;
 }
 
 double gsumln(double a, double b) {
