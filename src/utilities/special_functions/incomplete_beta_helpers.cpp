@@ -96,21 +96,10 @@ double prefactor(double a, double b, double x, double y, Exp expo) {
     const double c = (1.0 + gam1(a)) * (1.0 + gam1(b)) / gammaOfSumFactor(a, b);
     return value * (a0 * c) / (1.0 + a0 / b0);
   }
-  // 1 < b0 < 8: reduce b0 into (0, 1] by Gamma(b0) = (b0 - 1) Gamma(b0 - 1).
-  double u = gamln1(a0);
-  const int n = static_cast<int>(b0 - 1.0);
-  if (n >= 1) {
-    double c = 1.0;
-    for (int i = 1; i <= n; ++i) {
-      b0 -= 1.0;
-      c *= b0 / (a0 + b0);
-    }
-    u += std::log(c);
-  }
-  z -= u;
-  b0 -= 1.0;
-  const double t = gammaOfSumFactor(a0, b0);
-  return a0 * expo(z) * (1.0 + gam1(b0)) / t;
+  // 1 < b0 < 8.
+  double u, k;
+  smallShapeFactors(a0, b0, &u, &k);
+  return a0 * expo(z - u) * k;
 }
 
 // The last shapes and value of a function of the two shapes, per thread.
@@ -141,7 +130,41 @@ double memoised(ShapeMemo& memo, double a, double b, F f) {
 double lnBetaDirect(double a0, double b0);
 double bcorrDirect(double a0, double b0);
 
+// The pair of smallShapeFactors for the last shapes of each thread.
+struct FactorMemo {
+  double a0 = std::numeric_limits<double>::quiet_NaN();
+  double b0 = std::numeric_limits<double>::quiet_NaN();
+  double u = 0.0;
+  double k = 0.0;
+};
+thread_local FactorMemo lastSmallShape __attribute__((tls_model("initial-exec")));
+
 }  // namespace
+
+void smallShapeFactors(double a0, double b0, double* u, double* k) {
+  FactorMemo& memo = lastSmallShape;
+  if (!(a0 == memo.a0 && b0 == memo.b0)) {
+    // Gamma(b0) = (b0 - 1) Gamma(b0 - 1) down to b0 in (0, 1].
+    double lnFactor = gamln1(a0);
+    double b = b0;
+    const int n = static_cast<int>(b - 1.0);
+    if (n >= 1) {
+      double c = 1.0;
+      for (int i = 1; i <= n; ++i) {
+        b -= 1.0;
+        c *= b / (a0 + b);
+      }
+      lnFactor += std::log(c);
+    }
+    b -= 1.0;
+    memo.u = lnFactor;
+    memo.k = (1.0 + gam1(b)) / gammaOfSumFactor(a0, b);
+    memo.a0 = a0;
+    memo.b0 = b0;
+  }
+  *u = memo.u;
+  *k = memo.k;
+}
 
 double brcomp(double a, double b, double x, double y) {
   return prefactor(a, b, x, y, [](double z) { return std::exp(z); });

@@ -134,22 +134,11 @@ double bpser(double a, double b, double x, double eps) {
       const double c = (1.0 + gam1(a)) * (1.0 + gam1(b)) / z;
       result *= c * (b / apb);
     } else {
-      // 1 < b0 < 8: shift b0 down into (0, 1].
-      double u = gamln1(a0);
-      const int m = static_cast<int>(b0 - 1.0);
-      if (m >= 1) {
-        double c = 1.0;
-        for (int i = 1; i <= m; ++i) {
-          b0 -= 1.0;
-          c *= b0 / (a0 + b0);
-        }
-        u += std::log(c);
-      }
-      const double z = a * std::log(x) - u;
-      b0 -= 1.0;
-      const double apb = a0 + b0;
-      const double t = (apb > 1.0) ? (1.0 + gam1(a0 + b0 - 1.0)) / apb : 1.0 + gam1(apb);
-      result = std::exp(z) * (a0 / a) * (1.0 + gam1(b0)) / t;
+      // 1 < b0 < 8: b0 shifted down into (0, 1], the same factors as the
+      // prefactor of bup (remembered for the last shapes).
+      double u, k;
+      smallShapeFactors(a0, b0, &u, &k);
+      result = std::exp(a * std::log(x) - u) * (a0 / a) * k;
     }
   }
   if (result == 0.0 || a <= 0.1 * eps) return result;
