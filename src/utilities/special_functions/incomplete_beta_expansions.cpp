@@ -16,31 +16,21 @@ double bfrac(double a, double b, double x, double y, double lambda, double eps) 
   const double c = 1.0 + lambda;
   const double c0 = b / a;
   const double c1 = 1.0 + 1.0 / a;
-  const double ainv = 1.0 / a;
   const double yp1 = y + 1.0;
-  // Beyond these magnitudes of the denominator the four partial terms are
-  // brought back to the denominator 1. For shapes up to 2^53 one step
-  // multiplies them by at most about 2^110, far inside the headroom of 2^700
-  // left above and below.
-  constexpr double kBig = 0x1p+300, kSmall = 0x1p-300;
   double n = 0.0, p = 1.0, s = a + 1.0;
   double an = 0.0, bn = 1.0, anp1 = 1.0, bnp1 = c / c1;
   double r = c1 / c;
-  // The recurrence of the numerators and denominators is linear, so the
-  // rescaling of TOMS 708 at every step (three divisions on the chain from
-  // step to step) is needed only before the terms leave the exponent range;
-  // the convergent r and the stopping test are as published.
   for (;;) {
     n += 1.0;
-    double t = n * ainv;
+    double t = n / a;
     const double w = n * (b - n) * x;
-    const double sinv = 1.0 / s;
-    double e = a * sinv;
+    double e = a / s;
     const double alpha = (p * (p + c0) * e * e) * (w * x);
     e = (1.0 + t) / (c1 + t + t);
-    const double beta = n + w * sinv + e * (c + n * yp1);
+    const double beta = n + w / s + e * (c + n * yp1);
     p = 1.0 + t;
     s += 2.0;
+    // Three-term recurrence of the numerators and denominators.
     t = alpha * an + beta * anp1;
     an = anp1;
     anp1 = t;
@@ -50,14 +40,11 @@ double bfrac(double a, double b, double x, double y, double lambda, double eps) 
     const double r0 = r;
     r = anp1 / bnp1;
     if (std::fabs(r - r0) <= eps * r) break;
-    const double size = std::fabs(bnp1);
-    if (!(size < kBig && size > kSmall)) {
-      const double scale = 1.0 / bnp1;
-      an *= scale;
-      bn *= scale;
-      anp1 = r;
-      bnp1 = 1.0;
-    }
+    // Rescale so that the recurrence stays in range.
+    an /= bnp1;
+    bn /= bnp1;
+    anp1 = r;
+    bnp1 = 1.0;
   }
   return prefix * r;
 }

@@ -97,9 +97,9 @@ double prefactor(double a, double b, double x, double y, Exp expo) {
     return value * (a0 * c) / (1.0 + a0 / b0);
   }
   // 1 < b0 < 8.
-  double u, k;
-  smallShapeFactors(a0, b0, &u, &k);
-  return a0 * expo(z - u) * k;
+  double u, k, t;
+  smallShapeFactors(a0, b0, &u, &k, &t);
+  return a0 * expo(z - u) * k / t;
 }
 
 // The last shapes and value of a function of the two shapes, per thread.
@@ -136,12 +136,13 @@ struct FactorMemo {
   double b0 = std::numeric_limits<double>::quiet_NaN();
   double u = 0.0;
   double k = 0.0;
+  double t = 0.0;
 };
 thread_local FactorMemo lastSmallShape __attribute__((tls_model("initial-exec")));
 
 }  // namespace
 
-void smallShapeFactors(double a0, double b0, double* u, double* k) {
+void smallShapeFactors(double a0, double b0, double* u, double* k, double* t) {
   FactorMemo& memo = lastSmallShape;
   if (!(a0 == memo.a0 && b0 == memo.b0)) {
     // Gamma(b0) = (b0 - 1) Gamma(b0 - 1) down to b0 in (0, 1].
@@ -158,12 +159,14 @@ void smallShapeFactors(double a0, double b0, double* u, double* k) {
     }
     b -= 1.0;
     memo.u = lnFactor;
-    memo.k = (1.0 + gam1(b)) / gammaOfSumFactor(a0, b);
+    memo.k = 1.0 + gam1(b);
+    memo.t = gammaOfSumFactor(a0, b);
     memo.a0 = a0;
     memo.b0 = b0;
   }
   *u = memo.u;
   *k = memo.k;
+  *t = memo.t;
 }
 
 double brcomp(double a, double b, double x, double y) {

@@ -136,9 +136,9 @@ double bpser(double a, double b, double x, double eps) {
     } else {
       // 1 < b0 < 8: b0 shifted down into (0, 1], the same factors as the
       // prefactor of bup (remembered for the last shapes).
-      double u, k;
-      smallShapeFactors(a0, b0, &u, &k);
-      result = std::exp(a * std::log(x) - u) * (a0 / a) * k;
+      double u, k, t;
+      smallShapeFactors(a0, b0, &u, &k, &t);
+      result = std::exp(a * std::log(x) - u) * (a0 / a) * k / t;
     }
   }
   if (result == 0.0 || a <= 0.1 * eps) return result;
