@@ -130,7 +130,7 @@ double memoised(ShapeMemo& memo, double a, double b, F f) {
 double lnBetaDirect(double a0, double b0);
 double bcorrDirect(double a0, double b0);
 
-// The pair of smallShapeFactors for the last shapes of each thread.
+// The factors of smallShapeFactors for the last shapes of each thread.
 struct FactorMemo {
   double a0 = std::numeric_limits<double>::quiet_NaN();
   double b0 = std::numeric_limits<double>::quiet_NaN();
