@@ -60,6 +60,8 @@ const bm::non_central_t_distribution<double> kNct(10.0, 2.0);
 const bm::gamma_distribution<double> kGamma(4.5, 1.0);
 const bm::beta_distribution<double> kBeta(2.5, 7.0);
 const bm::binomial_distribution<double> kBinomial(200.0, 0.3);
+const bm::fisher_f_distribution<double> kF(5.0, 12.0);
+const bm::students_t_distribution<double> kT(10.0);
 const bm::poisson_distribution<double> kPoisson(40.0);
 const bm::hypergeometric_distribution<double> kHyper(150, 400, 1000);
 
@@ -75,6 +77,10 @@ QEL_PEER_ROW(GammaCdf, 0.1, 15.0, qel::GammaCdf(x, 4.5, 1.0, 0.0, false), pgamma
              bm::cdf(kGamma, x))
 QEL_PEER_ROW(BetaCdf, 0.001, 0.999, qel::BetaCdf(x, 2.5, 7.0, false), pbeta(x, 2.5, 7.0, 1, 0),
              bm::cdf(kBeta, x))
+QEL_PEER_ROW(FCdf, 0.05, 6.0, qel::FCdf(x, 5.0, 12.0, 0.0, false), pf(x, 5.0, 12.0, 1, 0),
+             bm::cdf(kF, x))
+QEL_PEER_ROW(CentralTCdf, -5.0, 5.0, qel::TCdf(x, 10.0, 0.0, false), pt(x, 10.0, 1, 0),
+             bm::cdf(kT, x))
 QEL_PEER_ROW(BinomialCdf, 30.0, 90.0, qel::BinomialCdf(static_cast<int>(x), 200.0, 0.3, false),
              pbinom(static_cast<int>(x), 200.0, 0.3, 1, 0),
              bm::cdf(kBinomial, static_cast<double>(static_cast<int>(x))))

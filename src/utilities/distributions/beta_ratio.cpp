@@ -36,7 +36,9 @@ bool fastTails(double a, double b, double x, double y, double* lower, double* up
   } catch (const std::exception&) {
     return false;  // a trap at extreme arguments: the ELV routine decides
   }
-  if (ierr != 0 || !(std::fmin(w, w1) >= kSmallestDirectTail) || !(std::fmax(w, w1) <= 1.0)) {
+  // Written out rather than fmin/fmax (a libm call each); NaN fails each test.
+  if (ierr != 0 ||
+      !(w >= kSmallestDirectTail && w1 >= kSmallestDirectTail && w <= 1.0 && w1 <= 1.0)) {
     return false;
   }
   *lower = w;

@@ -37,11 +37,15 @@ double basym(double a, double b, double lambda, double eps);
 double brcomp(double a, double b, double x, double y);
 double brcmp1(int mu, double a, double b, double x, double y);
 double betaln(double a0, double b0);  // ln Beta(a0, b0)
-double algdiv(double a, double b);    // ln(Gamma(b)/Gamma(a + b)), b >= 8
-double bcorr(double a0, double b0);   // del(a0) + del(b0) - del(a0 + b0), a0, b0 >= 8
-double gsumln(double a, double b);    // ln Gamma(a + b), 1 <= a, b <= 2
-double alnrel(double a);              // ln(1 + a)
-double esum(int mu, double x);        // exp(mu + x)
+// For a0 < 1 < b0 < 8: the two factors of the reduction of b0 by
+// Gamma(b0) = (b0 - 1) Gamma(b0 - 1) in TOMS 708 (bpser, brcomp), such that
+// x^a0 y^b0 / Beta(a0, b0) = a0 exp(z - u) k / t with z = a0 ln x + b0 ln y.
+void smallShapeFactors(double a0, double b0, double* u, double* k, double* t);
+double algdiv(double a, double b);   // ln(Gamma(b)/Gamma(a + b)), b >= 8
+double bcorr(double a0, double b0);  // del(a0) + del(b0) - del(a0 + b0), a0, b0 >= 8
+double gsumln(double a, double b);   // ln Gamma(a + b), 1 <= a, b <= 2
+double alnrel(double a);             // ln(1 + a)
+double esum(int mu, double x);       // exp(mu + x)
 
 }  // namespace qel
 

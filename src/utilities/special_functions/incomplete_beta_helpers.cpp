@@ -4,6 +4,7 @@
 // exp(mu + x) without intermediate overflow (esum).
 #include <algorithm>
 #include <cmath>
+#include <limits>
 
 #include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/special_functions/transcendental.h"
@@ -95,24 +96,78 @@ double prefactor(double a, double b, double x, double y, Exp expo) {
     const double c = (1.0 + gam1(a)) * (1.0 + gam1(b)) / gammaOfSumFactor(a, b);
     return value * (a0 * c) / (1.0 + a0 / b0);
   }
-  // 1 < b0 < 8: reduce b0 into (0, 1] by Gamma(b0) = (b0 - 1) Gamma(b0 - 1).
-  double u = gamln1(a0);
-  const int n = static_cast<int>(b0 - 1.0);
-  if (n >= 1) {
-    double c = 1.0;
-    for (int i = 1; i <= n; ++i) {
-      b0 -= 1.0;
-      c *= b0 / (a0 + b0);
-    }
-    u += std::log(c);
-  }
-  z -= u;
-  b0 -= 1.0;
-  const double t = gammaOfSumFactor(a0, b0);
-  return a0 * expo(z) * (1.0 + gam1(b0)) / t;
+  // 1 < b0 < 8.
+  double u, k, t;
+  smallShapeFactors(a0, b0, &u, &k, &t);
+  return a0 * expo(z - u) * k / t;
 }
 
+// The last shapes and value of a function of the two shapes, per thread.
+// The distribution functions call the ratio over and over at the same shapes
+// (array forms, grids, quantile searches), and one call can need ln Beta(a, b)
+// twice (the bup and bpser pieces of BRATIO); the lookup replaces the
+// log-gamma work by two comparisons. NaN keys match nothing.
+struct ShapeMemo {
+  double a = std::numeric_limits<double>::quiet_NaN();
+  double b = std::numeric_limits<double>::quiet_NaN();
+  double value = 0.0;
+};
+// initial-exec: an offset from the thread pointer, no __tls_get_addr call.
+thread_local ShapeMemo lastLnBeta __attribute__((tls_model("initial-exec")));
+thread_local ShapeMemo lastBcorr __attribute__((tls_model("initial-exec")));
+
+// Both functions are symmetric in the shapes: either order matches.
+template <class F>
+double memoised(ShapeMemo& memo, double a, double b, F f) {
+  if ((a == memo.a && b == memo.b) || (a == memo.b && b == memo.a)) return memo.value;
+  const double value = f(a, b);
+  memo.a = a;
+  memo.b = b;
+  memo.value = value;
+  return value;
+}
+
+double lnBetaDirect(double a0, double b0);
+double bcorrDirect(double a0, double b0);
+
+// The factors of smallShapeFactors for the last shapes of each thread.
+struct FactorMemo {
+  double a0 = std::numeric_limits<double>::quiet_NaN();
+  double b0 = std::numeric_limits<double>::quiet_NaN();
+  double u = 0.0;
+  double k = 0.0;
+  double t = 0.0;
+};
+thread_local FactorMemo lastSmallShape __attribute__((tls_model("initial-exec")));
+
 }  // namespace
+
+void smallShapeFactors(double a0, double b0, double* u, double* k, double* t) {
+  FactorMemo& memo = lastSmallShape;
+  if (!(a0 == memo.a0 && b0 == memo.b0)) {
+    // Gamma(b0) = (b0 - 1) Gamma(b0 - 1) down to b0 in (0, 1].
+    double lnFactor = gamln1(a0);
+    double b = b0;
+    const int n = static_cast<int>(b - 1.0);
+    if (n >= 1) {
+      double c = 1.0;
+      for (int i = 1; i <= n; ++i) {
+        b -= 1.0;
+        c *= b / (a0 + b);
+      }
+      lnFactor += std::log(c);
+    }
+    b -= 1.0;
+    memo.u = lnFactor;
+    memo.k = 1.0 + gam1(b);
+    memo.t = gammaOfSumFactor(a0, b);
+    memo.a0 = a0;
+    memo.b0 = b0;
+  }
+  *u = memo.u;
+  *k = memo.k;
+  *t = memo.t;
+}
 
 double brcomp(double a, double b, double x, double y) {
   return prefactor(a, b, x, y, [](double z) { return std::exp(z); });
@@ -123,6 +178,16 @@ double brcmp1(int mu, double a, double b, double x, double y) {
 }
 
 double betaln(double a0, double b0) {
+  return memoised(lastLnBeta, a0, b0, lnBetaDirect);
+}
+
+double bcorr(double a0, double b0) {
+  return memoised(lastBcorr, a0, b0, bcorrDirect);
+}
+
+namespace {
+
+double lnBetaDirect(double a0, double b0) {
   const double e = .918938533204673e+00;  // ln(2 pi)/2
   double a = std::min(a0, b0);
   double b = std::max(a0, b0);
@@ -174,6 +239,23 @@ double betaln(double a0, double b0) {
   return w + std::log(z) + (gamln(a) + (gamln(b) - gsumln(a, b)));
 }
 
+double bcorrDirect(double a0, double b0) {
+  const double a = std::min(a0, b0);
+  const double b = std::max(a0, b0);
+  const double h = a / b;
+  const double w = stirlingDifference(h / (1.0 + h), 1.0 / (1.0 + h), b);
+  const double t = (1.0 / a) * (1.0 / a);
+  const double del =
+      (((((kStirling[5] * t + kStirling[4]) * t + kStirling[3]) * t + kStirling[2]) * t +
+        kStirling[1]) *
+           t +
+       kStirling[0]) /
+      a;
+  return del + w;
+}
+
+}  // namespace
+
 double algdiv(double a, double b) {
   // c = a/(a + b) and x = b/(a + b), each formed from the smaller ratio.
   double c, x, d;
@@ -193,21 +275,6 @@ double algdiv(double a, double b) {
   const double v = a * (std::log(b) - 1.0);
   if (u > v) return (w - v) - u;
   return (w - u) - v;
-}
-
-double bcorr(double a0, double b0) {
-  const double a = std::min(a0, b0);
-  const double b = std::max(a0, b0);
-  const double h = a / b;
-  const double w = stirlingDifference(h / (1.0 + h), 1.0 / (1.0 + h), b);
-  const double t = (1.0 / a) * (1.0 / a);
-  const double del =
-      (((((kStirling[5] * t + kStirling[4]) * t + kStirling[3]) * t + kStirling[2]) * t +
-        kStirling[1]) *
-           t +
-       kStirling[0]) /
-      a;
-  return del + w;
 }
 
 double gsumln(double a, double b) {
