@@ -15,6 +15,7 @@
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
@@ -235,6 +236,17 @@ double mBetaInvCdf(double p, double a, double b) {
   if (!mPositiveShapes(a, b)) return mGetMissingValueCode();
   if (p == 0.0) return 0.0;
   if (p == 1.0) return 1.0;
+  if ((std::islessequal(a, smallshape::kTinyShape) ||
+       std::islessequal(b, smallshape::kTinyShape)) &&
+      p > 0.0 && p < 1.0) {
+    // Both tails by the series of small_shape_tails.h, through mBetaCdf.
+    const TailPair tails = [a, b](double x, double* lower, double* upper) {
+      *lower = mBetaCdf(x, a, b, false);
+      *upper = mBetaCdf(x, a, b, true);
+      return !mIsNumericMissing(*lower) && !mIsNumericMissing(*upper);
+    };
+    return smallshape::quantile(tails, p, TailSupport::Unit, 0.5);
+  }
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_beta_lower_quant(p, a, b, &q) : elv_beta_upper_quant(1.0 - p, a, b, &q);
@@ -335,6 +347,14 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
   // are 0 to double precision.
   double lowest = 0.0, above = 0.0;
   if (mFCdf(DBL_MIN, df1, df2, noncentrality, &lowest, &above) && p <= lowest) return 0.0;
+  if (noncentrality == 0.0 && (std::islessequal(df1, 2.0 * smallshape::kTinyShape) ||
+                               std::islessequal(df2, 2.0 * smallshape::kTinyShape))) {
+    // A tiny df: the tails of mFCdf, which keep the mass of the order of it.
+    const TailPair tails = [df1, df2](double x, double* lower, double* upper) {
+      return mFCdf(x, df1, df2, 0.0, lower, upper);
+    };
+    return smallshape::quantile(tails, p, TailSupport::Positive, 1.0);
+  }
   if (noncentrality == 0.0) {
     // P(F <= x) = I_w(df1/2, df2/2), w = df1 x/(df2 + df1 x), and
     // P(F > x) = I_y(df2/2, df1/2), y = 1 - w: the tails of the central law

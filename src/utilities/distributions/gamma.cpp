@@ -16,6 +16,7 @@
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/standardize.h"
 #include "utilities/distributions/tail_quantile.h"
@@ -137,6 +138,21 @@ double scaledQuantile(double q, double scale, double threshold) {
   return v + threshold;
 }
 
+// The standard gamma quantile at a tiny shape, 0 < p < 1, on the series
+// tails of small_shape_tails.h (the ELV routines start from tails that have
+// lost the mass of the order of the shape).
+double smallShapeGammaQuantile(double p, double shape) {
+  const TailPair tails = [shape](double x, double* lower, double* upper) {
+    return x >= DBL_MIN && x <= DBL_MAX &&
+           smallshape::gammaTails(shape, x, std::log(x), lower, upper);
+  };
+  return smallshape::quantile(tails, p, TailSupport::Positive, 1.0);
+}
+
+bool tinyGammaShape(double shape, double p) {
+  return std::islessequal(shape, smallshape::kTinyShape) && shape >= DBL_MIN && p > 0.0 && p < 1.0;
+}
+
 }  // namespace
 
 // --- Function objects ------------------------------------------------------
@@ -205,6 +221,10 @@ double mGammaCdf(double x, double shape, double scale, double threshold, bool up
 // this value as it stands.
 double mGammaInvCdf(double p, double shape, double scale, double threshold) {
   double q = 0.0;
+  if (tinyGammaShape(shape, p)) {
+    q = smallShapeGammaQuantile(p, shape);
+    return mIsNumericMissing(q) || q == 0.0 ? q : scaledQuantile(q, scale, threshold);
+  }
   if (p != 0.0) {
     q = gammaQuantileFromElv(p, shape);
     if (mIsNumericMissing(q)) return q;
@@ -278,6 +298,10 @@ double mChiSqInvCdf(double p, double df, double noncentrality) {
   }
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
+  if (noncentrality == 0.0 && tinyGammaShape(df / 2.0, p)) {
+    const double half = smallShapeGammaQuantile(p, df / 2.0);
+    return mIsNumericMissing(half) ? half : scaledQuantile(half, 2.0, 0.0);
+  }
   if (noncentrality == 0.0) return centralChiSqQuantile(p, df);
   // The smaller tail, solved in logarithms from the mean.
   const TailPair tails = [df, noncentrality](double x, double* lower, double* upper) {

@@ -17,6 +17,7 @@
 #include "utilities/distributions/noncentral_t.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/precision.h"
@@ -37,6 +38,15 @@ constexpr int kElvDomainStatus = 3;
 // The central t quantile by the ELV routine for the nearer tail.
 double centralTQuantile(double p, double df) {
   if (!mPositiveShapes(df)) return mGetMissingValueCode();
+  if (std::islessequal(df, smallshape::kTinyShape) && p > 0.0 && p < 1.0) {
+    // A tiny df: |t| beyond the double range for all p but those within
+    // about df of 1/2; the law is symmetric about 0.
+    if (p == 0.5) return 0.0;
+    const TailPair tails = [df](double x, double* lower, double* upper) {
+      return mTCdf(x, df, 0.0, lower, upper);
+    };
+    return smallshape::quantile(tails, p, TailSupport::RealLine, p < 0.5 ? -1.0 : 1.0);
+  }
   double q = 0.0;
   const ElvStatus status =
       p <= 0.5 ? elv_t_lower_quant(p, df, &q) : elv_t_upper_quant(1.0 - p, df, &q);
