@@ -105,12 +105,24 @@ bool bracket(const Equation& eq, TailSupport s, double start, double firstStep, 
 }
 
 // Next trial point in (a, b) from the secant in the right coordinate.
+// The point a fraction w of the way from a to b, for ends of one sign, formed
+// from their ratio: near 1e-300 their difference would be subnormal, which
+// the armed floating-point state reads as 0.
+double between(double a, double b, double w) {
+  return a * (1.0 + w * (b / a - 1.0));
+}
+
+// Whether a and b are of one sign and within a relative distance r.
+bool within(double a, double b, double r) {
+  if (!((a > 0.0 && b > 0.0) || (a < 0.0 && b < 0.0))) return false;
+  return std::fabs(a) <= std::fabs(b) ? std::fabs(b) / std::fabs(a) - 1.0 < r
+                                      : std::fabs(a) / std::fabs(b) - 1.0 < r;
+}
+
 double trialPoint(const Point& a, const Point& b, double ga, double gb, TailSupport s) {
   const bool finite = std::isfinite(ga) && std::isfinite(gb);
   const double w = finite ? ga / (ga - gb) : 0.5;
-  const bool narrow = (a.x > 0.0) == (b.x > 0.0) &&
-                      std::fabs(b.x - a.x) < 0.25 * std::fmin(std::fabs(a.x), std::fabs(b.x));
-  if (narrow && s != TailSupport::Unit) return a.x + w * (b.x - a.x);
+  if (within(a.x, b.x, 0.25) && s != TailSupport::Unit) return between(a.x, b.x, w);
   if (s == TailSupport::Unit && std::fabs(b.x - a.x) < 0.25 * std::fmin(a.x, 1.0 - b.x)) {
     return a.x + w * (b.x - a.x);
   }
@@ -125,7 +137,8 @@ double narrow(const Equation& eq, TailSupport s, Point a, Point b) {
     if (a.g == 0.0) return a.x;
     if (b.g == 0.0) return b.x;
     double x = trialPoint(a, b, ga, gb, s);
-    if (!(x > a.x && x < b.x)) x = a.x + 0.5 * (b.x - a.x);
+    if (!(x > a.x && x < b.x))
+      x = within(a.x, b.x, 1.0) ? between(a.x, b.x, 0.5) : a.x + 0.5 * (b.x - a.x);
     if (!(x > a.x && x < b.x)) break;  // adjacent doubles
     const Point m{x, eq(x)};
     if (std::isnan(m.g)) return mGetMissingValueCode();
@@ -140,7 +153,13 @@ double narrow(const Equation& eq, TailSupport s, Point a, Point b) {
       if (side == 1) ga *= 0.5;
       side = 1;
     }
-    if (b.x - a.x <= 2e-16 * std::fmax(std::fabs(a.x), std::fabs(b.x))) break;
+    // Ends of one sign stop on their ratio (their difference may be
+    // subnormal), ends around 0 on their distance.
+    const bool oneSign = (a.x > 0.0) == (b.x > 0.0);
+    if (oneSign ? within(a.x, b.x, 2e-16)
+                : b.x - a.x <= 2e-16 * std::fmax(std::fabs(a.x), std::fabs(b.x))) {
+      break;
+    }
   }
   return std::fabs(a.g) <= std::fabs(b.g) ? a.x : b.x;
 }
