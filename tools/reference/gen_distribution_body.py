@@ -103,7 +103,8 @@ def binomial_sum(n, p, k, step):
 
 def binomial_rows():
     out = []
-    for n, p in ((20, 0.3), (200, 0.3), (1000, 0.01), (5000, 0.5), (100000, 0.2)):
+    for n, p in ((20, 0.3), (200, 0.3), (1000, 0.01), (5000, 0.5), (100000, 0.2),
+                 (300000, 0.5), (1000000, 0.37)):
         mean, sd = n * p, math.sqrt(n * p * (1 - p))
         ks = sorted({int(mean + z * sd) for z in Z if 0 <= mean + z * sd < n})
         for k in ks:
