@@ -6,8 +6,8 @@
 // mathematics library (Rmath) side by side. Quantiles of p below 1e-12 or
 // above 1 - 1e-12 are reported as a function of their own. Run by
 // bench/run_accuracy_report.sh, which writes bench/accuracy.md.
-#include <qel/distributions.h>
 #include <Rmath.h>
+#include <qel/distributions.h>
 
 #include <boost/math/distributions.hpp>
 #include <cmath>
@@ -60,7 +60,8 @@ double boostDiscrete(const D& d, const std::string& f, double x, double origin =
   });
 }
 
-using RoundUp = bm::policies::policy<bm::policies::discrete_quantile<bm::policies::integer_round_up>>;
+using RoundUp =
+    bm::policies::policy<bm::policies::discrete_quantile<bm::policies::integer_round_up>>;
 
 // R's answer: density, lower or upper tail (upper of a discrete law from k),
 // quantile; NaN where R has no such family.
@@ -198,21 +199,20 @@ std::map<std::string, std::pair<Eval, Eval>> families() {
                   [](const std::string& f, double x, P p) {
                     return boostContinuous(bm::laplace_distribution<>(p[0], p[1]), f, x);
                   }};
-  t["gamma"] = {
-      qel3([](double x, P p) { return qel::GammaPdf(x, p[0], p[1], p[2]); },
-           [](double x, P p, bool u) { return qel::GammaCdf(x, p[0], p[1], p[2], u); },
-           [](double x, P p) { return qel::GammaInvCdf(x, p[0], p[1], p[2]); }),
-      [](const std::string& f, double x, P p) {
-        return boostContinuous(bm::gamma_distribution<>(p[0], p[1]), f, x, p[2]);
-      }};
+  t["gamma"] = {qel3([](double x, P p) { return qel::GammaPdf(x, p[0], p[1], p[2]); },
+                     [](double x, P p, bool u) { return qel::GammaCdf(x, p[0], p[1], p[2], u); },
+                     [](double x, P p) { return qel::GammaInvCdf(x, p[0], p[1], p[2]); }),
+                [](const std::string& f, double x, P p) {
+                  return boostContinuous(bm::gamma_distribution<>(p[0], p[1]), f, x, p[2]);
+                }};
   t["chisq"] = {qel3([](double x, P p) { return qel::ChiSqPdf(x, p[0]); },
                      [](double x, P p, bool u) { return qel::ChiSqCdf(x, p[0], p[1], u); },
                      [](double x, P p) { return qel::ChiSqInvCdf(x, p[0], p[1]); }),
                 [](const std::string& f, double x, P p) {
                   if (p[1] == 0.0 || f == "pdf")
                     return boostContinuous(bm::chi_squared_distribution<>(p[0]), f, x);
-                  return boostContinuous(bm::non_central_chi_squared_distribution<>(p[0], p[1]),
-                                         f, x);
+                  return boostContinuous(bm::non_central_chi_squared_distribution<>(p[0], p[1]), f,
+                                         x);
                 }};
   t["beta"] = {qel3([](double x, P p) { return qel::BetaPdf(x, p[0], p[1]); },
                     [](double x, P p, bool u) { return qel::BetaCdf(x, p[0], p[1], u); },
@@ -254,8 +254,8 @@ std::map<std::string, std::pair<Eval, Eval>> families() {
            [](double x, P p) { return qel::NegBinomialInvCdf(x, p[0], p[1]); }),
       // Boost counts the failures before the r-th success.
       [](const std::string& f, double x, P p) {
-        return boostDiscrete(bm::negative_binomial_distribution<double, RoundUp>(p[1], p[0]), f,
-                             x, p[1]);
+        return boostDiscrete(bm::negative_binomial_distribution<double, RoundUp>(p[1], p[0]), f, x,
+                             p[1]);
       }};
   t["hypergeometric"] = {
       qel3(
@@ -320,9 +320,9 @@ int main(int argc, char** argv) {
   std::map<std::string, Three> results;
   std::map<std::string, Eval> rTable;
   for (const auto& f : table) rTable[f.first] = rmath(f.first);
-  for (const char* name : {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
-                           "distribution_precision_nct.csv", "noncentral_t_grid.csv",
-                           "distribution_body.csv"}) {
+  for (const char* name :
+       {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
+        "distribution_precision_nct.csv", "noncentral_t_grid.csv", "distribution_body.csv"}) {
     // The noncentral t grid has rows function,x,df,delta,expected.
     const bool tGrid = std::string(name) == "noncentral_t_grid.csv";
     std::ifstream in(dir + "/" + name);
@@ -342,10 +342,9 @@ int main(int argc, char** argv) {
       // Truths below 1e-280 are left out (the goal holds above).
       if (expected != 0.0 && std::fabs(expected) < 1e-280) continue;
       const P p = &v[1];
-      // Far tails: a tail probability below 1e-6, or a quantile of such a p.
-      const bool isTail = (function == "lower" || function == "upper")
-                              ? expected < 1e-6
-                              : (function == "inv" && (x < 1e-6 || x > 1 - 1e-6));
+      // Far tails: a tail probability or density below 1e-6, or a quantile of
+      // such a p.
+      const bool isTail = function == "inv" ? x < 1e-6 || x > 1 - 1e-6 : expected < 1e-6;
       double mine;
       try {
         mine = it->second.first(function, x, p);
@@ -356,8 +355,8 @@ int main(int argc, char** argv) {
       const double theirs = it->second.second(function, x, p);
       const double rs = rTable[family](function, x, p);
       const bool beyond = function == "inv" && (x < 1e-12 || x > 1 - 1e-12);
-      const bool noncentral = (family == "t" && p[1] != 0.0) || (family == "chisq" && p[1] != 0.0) ||
-                              (family == "f" && p[2] != 0.0);
+      const bool noncentral = (family == "t" && p[1] != 0.0) ||
+                              (family == "chisq" && p[1] != 0.0) || (family == "f" && p[2] != 0.0);
       std::string key = family + (noncentral ? " (noncentral)" : "") + " | " + function +
                         (beyond ? " (p beyond 1e-12)" : "");
       auto& r = results[key];
@@ -371,9 +370,10 @@ int main(int argc, char** argv) {
       r.r.add(relativeError(rs, expected), isTail);
     }
   }
-  std::printf("| family | function | points | libqel body | libqel far tails | R body | R far tails | "
-              "Boost body | Boost far tails | no answer (libqel / R / Boost) |\n"
-              "|---|---|---|---|---|---|---|---|---|---|\n");
+  std::printf(
+      "| family | function | points | libqel body | libqel far tails | R body | R far tails | "
+      "Boost body | Boost far tails | no answer (libqel / R / Boost) |\n"
+      "|---|---|---|---|---|---|---|---|---|---|\n");
   for (const auto& r : results) {
     const Three& w = r.second;
     std::printf("| %s | %d | %s | %s | %s | %s | %s | %s | %d / %d / %d |\n", r.first.c_str(),

@@ -6,6 +6,9 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 cmake -S . -B build-bench -DCMAKE_BUILD_TYPE=Release -DQEL_BUILD_TESTS=OFF -DQEL_BUILD_BENCHMARKS=ON >/dev/null
 cmake --build build-bench -j2 --target accuracy_report >/dev/null
+# Sections written by hand after the generated table (from the first "## "
+# heading on) are carried over.
+notes=$(sed -n '/^## /,$p' bench/accuracy.md 2>/dev/null || true)
 {
   echo "# Accuracy against mpmath: libqel, R and Boost.Math"
   echo
@@ -18,7 +21,7 @@ cmake --build build-bench -j2 --target accuracy_report >/dev/null
   echo "binomial and hypergeometric laws, quantiles of gamma and beta shapes down to 0.02)."
   echo "True values below 1e-280 are left out."
   echo "Largest relative error per family and function; far tails are tail"
-  echo "probabilities below 1e-6 and quantiles of probabilities below 1e-6 or above"
+  echo "probabilities and densities below 1e-6 and quantiles of probabilities below 1e-6 or above"
   echo "1 - 1e-6; quantiles of p below 1e-12 or above 1 - 1e-12 are listed apart."
   echo "libqel through its exported functions (armed frame), R 4.2 through its"
   echo "standalone mathematics library (r-mathlib), Boost.Math 1.74 with its default"
@@ -30,5 +33,9 @@ cmake --build build-bench -j2 --target accuracy_report >/dev/null
   echo
   # Rmath prints its precision warnings on the same stream: keep the table.
   build-bench/bench/accuracy_report tests/data | grep '^|'
+  if [ -n "$notes" ]; then
+    echo
+    echo "$notes"
+  fi
 } > bench/accuracy.md
 echo "wrote bench/accuracy.md"

@@ -181,16 +181,59 @@ double mHalfNormalPdf(double x, double scale, double location) {
   return 2.0 * mNormalPdf(x, location, scale);
 }
 
-// Lower tail 2 Phi(z) - 1; the upper tail is its complement. A missing Phi
-// is carried through the same arithmetic.
+// Lower tail 2 Phi(z) - 1 = erf(z / sqrt 2), upper tail 2 Phi(-z) =
+// erfc(z / sqrt 2). At full precision each tail is formed on its own: the
+// upper tail is the normal's upper tail doubled (exact), the lower tail the C
+// library's erf (within an ulp; the TOMS 708 erf is 6 ulp off below 0.5)
+// below z = 1 and the complement of the upper tail above, where
+// 2 Phi(-z) < 0.32 leaves 1 - 2 Phi(-z) its digits. The written complement
+// 1 - (2 Phi(z) - 1) loses them: 1.5e-10 relative at z = 5. A missing Phi is
+// carried through the written arithmetic.
 double mHalfNormalCdf(double x, double scale, double location, bool upperTail) {
+  if (elv::elvPrecision() == elv::ElvPrecision::Full && !mIsNumericMissing(x) && x > location) {
+    const double z = mStandardize(x, location, scale);
+    if (!std::isnan(z)) {
+      const double upper = 2.0 * elv::normalUpperTail(z);
+      if (upperTail) return upper;
+      return z < 1.0 ? std::erf(z * M_SQRT1_2) : 1.0 - upper;
+    }
+  }
   double lower = 0.0;
   if (x >= location) lower = 2.0 * mNormalCdf(x, location, scale, false) - 1.0;
   return upperTail ? 1.0 - lower : lower;
 }
 
+namespace {
+
+// z with erf(z / sqrt 2) = p, 0 < p < 0.5: Newton steps on the C library's erf from
+// the normal quantile of (1 + p)/2, whose rounding leaves about 1e-16/p
+// relative error in the start; each step squares it. At p near DBL_MIN the
+// start is 0 and the first step lands on the linear term p sqrt(pi/2).
+double halfNormalSmallQuantile(double p) {
+  const double start = standardNormalQuantile((1.0 + p) / 2.0);
+  if (mIsNumericMissing(start)) return start;
+  double z = start;
+  const double slope = 0.79788456080286535588;  // sqrt(2/pi)
+  for (int step = 0; step < 4; ++step) {
+    const double correction = (std::erf(z * M_SQRT1_2) - p) / (slope * std::exp(-0.5 * z * z));
+    z -= correction;
+    if (std::fabs(correction) <= 1e-17 * z) break;
+  }
+  return z;
+}
+
+}  // namespace
+
+// At full precision the quantile keeps p's digits: p >= 0.5 from the normal
+// quantile of (1 - p)/2 (exact arguments), below it by halfNormalSmallQuantile;
+// the written (1 + p)/2 rounds away a small p's digits (8e-11 at p = 1e-6).
 double mHalfNormalInvCdf(double p, double scale, double location) {
-  const double z = standardNormalQuantile((1.0 + p) / 2.0);
+  double z;
+  if (elv::elvPrecision() == elv::ElvPrecision::Full && p > 0.0 && p < 1.0) {
+    z = p >= 0.5 ? -standardNormalQuantile((1.0 - p) / 2.0) : halfNormalSmallQuantile(p);
+  } else {
+    z = standardNormalQuantile((1.0 + p) / 2.0);
+  }
   if (mIsNumericMissing(z)) return z;
   try {
     return location + scale * z;
