@@ -147,6 +147,22 @@ Eval rmath(const std::string& family) {
     return disc([](double k, P p) { return dhyper(k, p[1], p[0] - p[1], p[2], 0); },
                 [](double k, P p, int l) { return phyper(k, p[1], p[0] - p[1], p[2], l, 0); },
                 [](double x, P p) { return qhyper(x, p[1], p[0] - p[1], p[2], 1, 0); });
+  if (family == "geometric")  // R counts the failures before the first success
+    return disc([](double k, P p) { return dgeom(k - 1.0, p[0], 0); },
+                [](double k, P p, int l) { return pgeom(k - 1.0, p[0], l, 0); },
+                [](double x, P p) { return qgeom(x, p[0], 1, 0) + 1.0; });
+  if (family == "cauchy")
+    return cont([](double x, P p) { return dcauchy(x, p[0], p[1], 0); },
+                [](double x, P p, int l) { return pcauchy(x, p[0], p[1], l, 0); },
+                [](double x, P p, int) { return qcauchy(x, p[0], p[1], 1, 0); });
+  if (family == "logistic")
+    return cont([](double x, P p) { return dlogis(x, p[0], p[1], 0); },
+                [](double x, P p, int l) { return plogis(x, p[0], p[1], l, 0); },
+                [](double x, P p, int) { return qlogis(x, p[0], p[1], 1, 0); });
+  if (family == "uniform")
+    return cont([](double x, P p) { return dunif(x, p[0], p[1], 0); },
+                [](double x, P p, int l) { return punif(x, p[0], p[1], l, 0); },
+                [](double x, P p, int) { return qunif(x, p[0], p[1], 1, 0); });
   return [](const std::string&, double, P) { return NAN; };
 }
 
@@ -277,6 +293,58 @@ std::map<std::string, std::pair<Eval, Eval>> families() {
                                  static_cast<unsigned>(p[0])),
                              f, x);
       }};
+  auto none = [](const std::string&, double, P) { return NAN; };
+  t["geometric"] = {qel3([](double x, P p) { return qel::GeometricPdf(x, p[0]); },
+                         [](double x, P p, bool u) { return qel::GeometricCdf(x, p[0], u); },
+                         [](double x, P p) { return qel::GeometricInvCdf(x, p[0]); }),
+                    [](const std::string& f, double x, P p) {
+                      return boostDiscrete(bm::geometric_distribution<double, RoundUp>(p[0]), f, x,
+                                           1.0);
+                    }};
+  t["halfnormal"] = {
+      qel3([](double x, P p) { return qel::HalfNormalPdf(x, p[0], p[1]); },
+           [](double x, P p, bool u) { return qel::HalfNormalCdf(x, p[0], p[1], u); },
+           [](double x, P p) { return qel::HalfNormalInvCdf(x, p[0], p[1]); }),
+      none};
+  t["sev"] = {
+      qel3([](double x, P p) { return qel::SmallestExtremeValuePdf(x, p[0], p[1]); },
+           [](double x, P p, bool u) { return qel::SmallestExtremeValueCdf(x, p[0], p[1], u); },
+           [](double x, P p) { return qel::SmallestExtremeValueInvCdf(x, p[0], p[1]); }),
+      none};
+  t["lambda"] = {qel3([](double x, P p) { return qel::LambdaPdf(x, p[0], p[1], p[2]); },
+                      [](double x, P p, bool u) { return qel::LambdaCdf(x, p[0], p[1], p[2], u); },
+                      [](double x, P p) { return qel::LambdaInvCdf(x, p[0], p[1], p[2]); }),
+                 none};
+  t["cauchy"] = {qel3([](double x, P p) { return qel::CauchyPdf(x, p[0], p[1]); },
+                      [](double x, P p, bool u) { return qel::CauchyCdf(x, p[0], p[1], u); },
+                      [](double x, P p) { return qel::CauchyInvCdf(x, p[0], p[1]); }),
+                 [](const std::string& f, double x, P p) {
+                   return boostContinuous(bm::cauchy_distribution<>(p[0], p[1]), f, x);
+                 }};
+  t["logistic"] = {qel3([](double x, P p) { return qel::LogisticPdf(x, p[0], p[1]); },
+                        [](double x, P p, bool u) { return qel::LogisticCdf(x, p[0], p[1], u); },
+                        [](double x, P p) { return qel::LogisticInvCdf(x, p[0], p[1]); }),
+                   [](const std::string& f, double x, P p) {
+                     return boostContinuous(bm::logistic_distribution<>(p[0], p[1]), f, x);
+                   }};
+  t["loglogistic"] = {
+      qel3([](double x, P p) { return qel::LogLogisticPdf(x, p[0], p[1], p[2]); },
+           [](double x, P p, bool u) { return qel::LogLogisticCdf(x, p[0], p[1], p[2], u); },
+           [](double x, P p) { return qel::LogLogisticInvCdf(x, p[0], p[1], p[2]); }),
+      none};
+  t["triangular"] = {
+      qel3([](double x, P p) { return qel::TriangularPdf(x, p[0], p[1], p[2]); },
+           [](double x, P p, bool u) { return qel::TriangularCdf(x, p[0], p[1], p[2], u); },
+           [](double x, P p) { return qel::TriangularInvCdf(x, p[0], p[1], p[2]); }),
+      [](const std::string& f, double x, P p) {
+        return boostContinuous(bm::triangular_distribution<>(p[0], p[1], p[2]), f, x);
+      }};
+  t["uniform"] = {qel3([](double x, P p) { return qel::UniformPdf(x, p[0], p[1]); },
+                       [](double x, P p, bool u) { return qel::UniformCdf(x, p[0], p[1], u); },
+                       [](double x, P p) { return qel::UniformInvCdf(x, p[0], p[1]); }),
+                  [](const std::string& f, double x, P p) {
+                    return boostContinuous(bm::uniform_distribution<>(p[0], p[1]), f, x);
+                  }};
   return t;
 }
 
@@ -320,9 +388,9 @@ int main(int argc, char** argv) {
   std::map<std::string, Three> results;
   std::map<std::string, Eval> rTable;
   for (const auto& f : table) rTable[f.first] = rmath(f.first);
-  for (const char* name :
-       {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
-        "distribution_precision_nct.csv", "noncentral_t_grid.csv", "distribution_body.csv"}) {
+  for (const char* name : {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
+                           "distribution_precision_nct.csv", "noncentral_t_grid.csv",
+                           "distribution_body.csv", "closed_form.csv"}) {
     // The noncentral t grid has rows function,x,df,delta,expected.
     const bool tGrid = std::string(name) == "noncentral_t_grid.csv";
     std::ifstream in(dir + "/" + name);
@@ -336,6 +404,8 @@ int main(int argc, char** argv) {
       std::vector<double> v;
       while (std::getline(s, field, ',')) v.push_back(std::strtod(field.c_str(), nullptr));
       if (tGrid && v.size() == 4) v = {v[0], v[1], v[2], 0.0, 0.0, v[3]};
+      // The closed-form grid has three parameters.
+      if (v.size() == 5) v = {v[0], v[1], v[2], v[3], 0.0, v[4]};
       const auto it = table.find(family);
       if (it == table.end() || v.size() < 6) continue;
       const double x = v[0], expected = v[5];
