@@ -16,6 +16,7 @@
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/series_quantile.h"
 #include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/standardize.h"
@@ -225,6 +226,9 @@ double mGammaInvCdf(double p, double shape, double scale, double threshold) {
     q = smallShapeGammaQuantile(p, shape);
     return mIsNumericMissing(q) || q == 0.0 ? q : scaledQuantile(q, scale, threshold);
   }
+  if (seriesquantile::gammaQuantile(p, shape, &q)) {
+    return q == 0.0 ? q : scaledQuantile(q, scale, threshold);
+  }
   if (p != 0.0) {
     q = gammaQuantileFromElv(p, shape);
     if (mIsNumericMissing(q)) return q;
@@ -301,6 +305,10 @@ double mChiSqInvCdf(double p, double df, double noncentrality) {
   if (noncentrality == 0.0 && tinyGammaShape(df / 2.0, p)) {
     const double half = smallShapeGammaQuantile(p, df / 2.0);
     return mIsNumericMissing(half) ? half : scaledQuantile(half, 2.0, 0.0);
+  }
+  double half = 0.0;
+  if (noncentrality == 0.0 && seriesquantile::gammaQuantile(p, df / 2.0, &half)) {
+    return 2.0 * half;
   }
   if (noncentrality == 0.0) return centralChiSqQuantile(p, df);
   // The smaller tail, solved in logarithms from the mean.
