@@ -79,7 +79,14 @@ double gammaQuantileFromElv(double p, double shape) {
     return !ElvFailed(elv_gamma_df(x, shape, lower, upper, &density));
   };
   if (!farBeyondElvRange(p)) {
-    return mPolishedQuantile(tails, p, TailSupport::Positive, gammaElvQuantile(p, shape));
+    const double q = gammaElvQuantile(p, shape);
+    // The routine's Newton iteration may stop short of its tolerance
+    // (status 4: at shape 0.05 for the quantile 1.0); at full precision
+    // the tail search answers instead of the missing value.
+    if (!mIsNumericMissing(q) || elv::elvPrecision() != elv::ElvPrecision::Full) {
+      return mPolishedQuantile(tails, p, TailSupport::Positive, q);
+    }
+    return mTailQuantile(tails, p, TailSupport::Positive, shape);
   }
   double start = gammaElvQuantile(clampToElvRange(p), shape);
   if (mIsNumericMissing(start) || !(start > 0.0)) start = shape;

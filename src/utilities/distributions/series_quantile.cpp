@@ -23,20 +23,28 @@ namespace seriesquantile {
 
 namespace {
 
-// Shapes up to this use the series (above it the quantile's magnification
-// of a tail's error, 1/a, is small enough for the general route), and x up
-// to kLargestArgument and b x up to kLargestBX: there the terms of S fall
-// from the first one on, so S carries no cancellation worse than its size.
+// Shapes up to kLargestShape use the series: up to 1 the old route, Newton
+// on tails in double precision, misses 1e-14 by up to a factor 10 where x
+// is tiny (measured against mpmath). The region is x <= 1/2, where the
+// gamma series alternates with a sum within a factor 1.3 of the sum of its
+// terms' sizes, and for the beta law b x <= 10 (the form of betaSeries has
+// no cancellation; the bound keeps its number of terms small). Where the
+// slope d ln P/d ln x falls below kSmallestSlope a (p near 1 at a large
+// b x) the lower tail is ill-conditioned and the general route, on the
+// upper tail, keeps more digits; 1 + a S is kept above 1/2 so that
+// ln(1 + a S) keeps the relative accuracy of S.
 constexpr double kSmallestShape = 1e-5;
 constexpr double kLargestShape = 1.0;
 constexpr double kLargestArgument = 0.5;
-constexpr double kLargestBX = 1.0;
+constexpr double kLargestBX = 10.0;
 constexpr double kLargestB = 1e15;
 // Terms below this, relative to the leading 1 of 1 + a S, no longer count
 // (ln x takes S to about 1e-17 absolute).
 constexpr double kTermStop = 1e-19;
 constexpr int kMaxTerms = 200;
 constexpr int kMaxSteps = 20;
+constexpr double kLastStep = 1e-13;
+constexpr double kSmallestSlope = 0.2;
 constexpr double kLnSmallestNormal = -708.39641853226408;
 
 struct SeriesLaw {
@@ -44,12 +52,14 @@ struct SeriesLaw {
   bool beta;
 };
 
-// S(x) and x S'(x); false when the series does not settle.
-bool series(const SeriesLaw& law, double x, double* s, double* xds) {
+// S(x) and x S'(x) of the gamma law; false when the series does not
+// settle. The terms alternate, but for x <= 1/2 their sum is within a factor
+// 1.3 of the sum of their sizes.
+bool gammaSeries(double a, double x, double* s, double* xds) {
   double t = 1.0, sum = 0.0, dsum = 0.0;
   for (int n = 1; n <= kMaxTerms; ++n) {
-    t *= (law.beta ? n - law.b : -1.0) * x / n;  // (1-b)_n x^n / n! or (-x)^n / n!
-    const double term = t / (law.a + n);
+    t *= -x / n;  // (-x)^n / n!
+    const double term = t / (a + n);
     sum += term;
     dsum += n * term;
     if (std::fabs(term) * n <= kTermStop) {
@@ -59,6 +69,41 @@ bool series(const SeriesLaw& law, double x, double* s, double* xds) {
     }
   }
   return false;
+}
+
+// S(x) and x S'(x) of the beta law. The terms (1-b)_n x^n/n! of S would
+// alternate and grow to e^(b x) for b > 1; instead
+//   1 + a S = (1-x)^b F(a+b, 1; a+1; x)                       (DLMF 8.17.8)
+// and, coefficient by coefficient against the binomial series
+// (1-x)^-b = sum_n g_n x^n, g_n = (b)_n/n!, F's coefficients
+// (a+b)_n/(a+1)_n are g_n + a e_n with e_0 = 0 and
+//   e_n = e_(n-1) (a+b+n-1)/(a+n) + g_(n-1) (1-b)/(n (a+n)),
+// so that S = (1-x)^b E(x), E = sum e_n x^n, whose terms all have the sign
+// of 1 - b: no cancellation for any b x.
+bool betaSeries(double a, double b, double x, double* s, double* xds) {
+  const double scale = std::exp(b * std::log1p(-x));  // (1-x)^b
+  // en = e_n x^n and gn = g_n x^n, carried with their powers of x: g_n
+  // alone would overflow for a huge b, g_n x^n stays below e^(b x).
+  double en = 0.0, gn = 1.0, sum = 0.0, dsum = 0.0, last = 0.0;
+  for (int n = 1; n <= kMaxTerms; ++n) {
+    en = x * (en * (a + b + (n - 1)) / (a + n) + gn * (1.0 - b) / (n * (a + n)));
+    gn *= x * (b + (n - 1)) / n;
+    sum += en;
+    dsum += n * en;
+    const double term = std::fabs(en);
+    if (term <= last && term * scale * n <= kTermStop) {
+      *s = scale * sum;
+      // x d/dx (1-x)^b = -b x/(1-x) (1-x)^b.
+      *xds = scale * (dsum - b * x / (1.0 - x) * sum);
+      return true;
+    }
+    last = term;
+  }
+  return false;
+}
+
+bool series(const SeriesLaw& law, double x, double* s, double* xds) {
+  return law.beta ? betaSeries(law.a, law.b, x, s, xds) : gammaSeries(law.a, x, s, xds);
 }
 
 bool inRegion(const SeriesLaw& law, double x) {
@@ -79,11 +124,17 @@ bool solve(const SeriesLaw& law, double p, double lnNorm, double* x) {
     if (u < kLnSmallestNormal - 1.0) break;  // x e^-1 below DBL_MIN: S is 0 to double precision
     const double xi = std::exp(u);
     double s = 0.0, xds = 0.0;
-    if (!inRegion(law, xi) || !series(law, xi, &s, &xds) || !(a * s > -0.75)) return false;
+    if (!inRegion(law, xi) || !series(law, xi, &s, &xds) || !(a * s > -0.5)) return false;
     // h(c) = c + ln(1 + a S(x))/a with x = e^(C + c); h'(c) = 1 + x S'(x)/(1 + a S).
-    const double change = (c + std::log1p(a * s) / a) / (1.0 + xds / (1.0 + a * s));
+    // The slope h' is d ln P/d ln x divided by a.
+    const double slope = 1.0 + xds / (1.0 + a * s);
+    if (!(slope >= kSmallestSlope)) return false;
+    const double change = (c + std::log1p(a * s) / a) / slope;
     c -= change;
-    if (std::fabs(change) <= 1e-17) break;
+    // Newton converges quadratically: after a step of 1e-13 the error is
+    // far below the rounding noise of c (a few units of 1e-16 |c|), which
+    // a smaller bound could wait for in vain.
+    if (std::fabs(change) <= kLastStep) break;
   }
   const DoubleDouble lnX = ddAdd(big, c);
   if (lnX.hi < kLnSmallestNormal) {

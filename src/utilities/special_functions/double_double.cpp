@@ -37,9 +37,9 @@ DoubleDouble ddExp(DoubleDouble a, int* exponent) {
 
 // y = ln p (double) is within an ulp or so of the truth; Newton's step for
 // e^y = p is y + (p e^-y - 1) = y + (p - e^y)/e^y, whose own error is of
-// the order of the step squared, 1e-32. e^y = s 2^k with s near 1, so that
-// p 2^-k (exact: a change of exponent) and s differ by about 1e-16 s and
-// their difference is exact.
+// the order of the step squared, 1e-32, beside the 1e-20 of ddExp.
+// e^y = s 2^k with s near 1, so that p 2^-k (exact: a change of exponent)
+// and s differ by about 1e-16 s and their difference is exact.
 DoubleDouble ddLog(double p) {
   const double y = std::log(p);
   int k = 0;
