@@ -322,7 +322,7 @@ int main(int argc, char** argv) {
   for (const auto& f : table) rTable[f.first] = rmath(f.first);
   for (const char* name : {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
                            "distribution_precision_nct.csv", "noncentral_t_grid.csv",
-                           "distribution_body.csv"}) {
+                           "distribution_body.csv", "series_region_quantiles.csv"}) {
     // The noncentral t grid has rows function,x,df,delta,expected.
     const bool tGrid = std::string(name) == "noncentral_t_grid.csv";
     std::ifstream in(dir + "/" + name);

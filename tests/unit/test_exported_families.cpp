@@ -137,9 +137,7 @@ TEST(ExportedFamilies, MatchHighPrecisionReferenceValues) {
 
 // Where 1e-14 in the body and 1e-12 in the far tails (tail, density or p
 // below 1e-6) is not met yet, about three times the largest error measured
-// now: a bound that may only shrink. Quantiles of gamma and beta laws of
-// shape 0.01 to 0.05, where the quantile magnifies a tail's rounding error by
-// 1/shape; and TOMS 708 at large binomial counts.
+// now: a bound that may only shrink. TOMS 708 at large binomial counts.
 const std::map<std::string, double> kShortfalls = {
     {"binomial upper", 4e-14},
 };
