@@ -35,6 +35,8 @@ CHISQ_DF = (0.02, 0.05, 0.1)
 EDGE_X = (1e-250, 1e-30, 0.1, 0.45, 0.5, 0.55)
 EDGE_GAMMA = (0.3, 0.7, 1.0)
 EDGE_BETA = ((0.3, 2.5), (0.7, 1000.0), (1.0, 0.3))
+# Small b beside a small a: ln(a B(a, b)) is near a/b, far above a.
+SMALL_B = ((0.003, 0.02), (0.05, 0.001), (0.3, 0.001))
 
 
 def root_in_log(f, x0, top):
@@ -87,6 +89,11 @@ def main():
     for df in CHISQ_DF:
         for p in PS:
             rows.append(["chisq", "inv", p, df, 0.0, 0.0, 0.0, 2 * gamma_quantile(df / 2, p)])
+    for a, b in SMALL_B:
+        # Only p whose quantile lies clear of 1 (the rest of the mass sits
+        # next to 1, beyond the bisection's bracket).
+        for p in (p for p in PS if (d(p) * d(a) * mpmath.beta(d(a), d(b))) ** (1 / d(a)) < 0.4):
+            rows.append(["beta", "inv", p, a, b, 0.0, 0.0, beta_quantile(a, b, p)])
     for a in EDGE_GAMMA:
         for x in EDGE_X:
             p = float(mpmath.gammainc(d(a), 0, d(x), regularized=True))

@@ -112,7 +112,7 @@ bool inRegion(const SeriesLaw& law, double x) {
 
 // x with ln P = ln p, where ln N is the logarithm of the normalising factor
 // (accurate in absolute terms to a few units of 1e-16 a).
-bool solve(const SeriesLaw& law, double p, double lnNorm, double* x) {
+bool solve(const SeriesLaw& law, double p, DoubleDouble lnNorm, double* x) {
   const double a = law.a;
   const DoubleDouble big = ddDiv(ddAdd(ddLog(p), lnNorm), DoubleDouble{a, 0.0});
   // |c| stays below about 1 in the region.
@@ -154,21 +154,41 @@ bool admissible(double p, double a) {
          std::isless(p, 1.0);
 }
 
+// ln(1 + a/b) in double-double for 0 < a <= 1, 1e-5 < b < 1: the double
+// y = ln(1 + a/b) corrected by one Newton step on e^y = q, q = (a + b)/b:
+// q e^-y = 1 + t with t about 1e-16, and ln(1 + t) = t to 1e-32.
+DoubleDouble lnOnePlusRatio(double a, double b) {
+  const DoubleDouble q = ddDiv(ddTwoSum(a, b), DoubleDouble{b, 0.0});
+  const double y = std::log1p(a / b);  // at most ln(1 + 1e5)
+  int k = 0;
+  const DoubleDouble e = ddExp(DoubleDouble{-y, 0.0}, &k);
+  const DoubleDouble product = ddMul(q, e);  // q e^-y 2^-k
+  const DoubleDouble t =
+      ddAdd(DoubleDouble{std::ldexp(product.hi, k), std::ldexp(product.lo, k)}, -1.0);
+  return ddAdd(DoubleDouble{y, 0.0}, t.hi);
+}
+
 // ln(Gamma(b)/Gamma(a + b)) for 0 < a <= 1, 1e-5 < b: TOMS 708's algdiv from
 // b >= 8 on, below by Gamma(b + 1) = b Gamma(b), each step adding
-// ln(1 + a/b), so that the result is accurate in absolute terms to a few
-// units of 1e-16 times itself (of the order of a ln b).
-double lnGammaRatio(double a, double b) {
+// ln(1 + a/b). Every step from b >= 1 on is at most a, so its rounding is a
+// few units of 1e-16 a; the first one, near a/b for b < 1, is carried in
+// double-double, as the quantile divides ln N by a.
+DoubleDouble lnGammaRatio(double a, double b) {
+  DoubleDouble first = {0.0, 0.0};
+  if (b < 1.0) {
+    first = lnOnePlusRatio(a, b);
+    b += 1.0;
+  }
   double sum = 0.0;
   for (; b < 8.0; b += 1.0) sum += alnrel(a / b);
-  return sum + algdiv(a, b);
+  return ddAdd(first, sum + algdiv(a, b));
 }
 
 }  // namespace
 
 bool gammaQuantile(double p, double a, double* x) {
   if (!admissible(p, a)) return false;
-  return solve(SeriesLaw{a, 0.0, false}, p, gamln1(a), x);
+  return solve(SeriesLaw{a, 0.0, false}, p, DoubleDouble{gamln1(a), 0.0}, x);
 }
 
 bool betaQuantile(double p, double a, double b, double* x) {
@@ -176,7 +196,7 @@ bool betaQuantile(double p, double a, double b, double* x) {
     return false;
   }
   // ln(a B(a, b)) = ln Gamma(1 + a) + ln(Gamma(b)/Gamma(a + b)).
-  return solve(SeriesLaw{a, b, true}, p, gamln1(a) + lnGammaRatio(a, b), x);
+  return solve(SeriesLaw{a, b, true}, p, ddAdd(lnGammaRatio(a, b), gamln1(a)), x);
 }
 
 }  // namespace seriesquantile
