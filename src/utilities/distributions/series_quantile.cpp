@@ -23,11 +23,11 @@ namespace seriesquantile {
 
 namespace {
 
-// Shapes up to kLargestShape use the series: up to 1 the old route, Newton
-// on tails in double precision, misses 1e-14 by up to a factor 10 where x
-// is tiny (measured against mpmath). The region is x <= 1/2, where the
-// gamma series alternates with a sum within a factor 1.3 of the sum of its
-// terms' sizes, and for the beta law b x <= 10 (the form of betaSeries has
+// Shapes up to kLargestShape use the series: below 1 the general route,
+// Newton on tails in double precision, misses 1e-14 by up to a factor 10
+// where x is tiny (measured against mpmath). The region is x <= 1/2, where
+// the gamma series alternates with a sum within a factor 2 of the sum of
+// its terms' sizes, and for the beta law b x <= 10 (the form of betaSeries has
 // no cancellation; the bound keeps its number of terms small). Where the
 // slope d ln P/d ln x falls below kSmallestSlope a (p near 1 at a large
 // b x) the lower tail is ill-conditioned and the general route, on the
@@ -54,7 +54,7 @@ struct SeriesLaw {
 
 // S(x) and x S'(x) of the gamma law; false when the series does not
 // settle. The terms alternate, but for x <= 1/2 their sum is within a factor
-// 1.3 of the sum of their sizes.
+// 2 of the sum of their sizes.
 bool gammaSeries(double a, double x, double* s, double* xds) {
   double t = 1.0, sum = 0.0, dsum = 0.0;
   for (int n = 1; n <= kMaxTerms; ++n) {
