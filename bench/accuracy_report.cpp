@@ -388,9 +388,10 @@ int main(int argc, char** argv) {
   std::map<std::string, Three> results;
   std::map<std::string, Eval> rTable;
   for (const auto& f : table) rTable[f.first] = rmath(f.first);
-  for (const char* name : {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
-                           "distribution_precision_nct.csv", "noncentral_t_grid.csv",
-                           "distribution_body.csv", "closed_form.csv"}) {
+  for (const char* name :
+       {"kernels.csv", "kernels_beta_t.csv", "distribution_precision.csv",
+        "distribution_precision_nct.csv", "noncentral_t_grid.csv", "distribution_body.csv",
+        "series_region_quantiles.csv", "closed_form.csv"}) {
     // The noncentral t grid has rows function,x,df,delta,expected.
     const bool tGrid = std::string(name) == "noncentral_t_grid.csv";
     std::ifstream in(dir + "/" + name);

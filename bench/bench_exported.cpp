@@ -97,4 +97,26 @@ QEL_BENCH_FAMILY(Logistic, -30, 30, qel::LogisticCdf(x, 0, 1, true), qel::Logist
                  qel::LogisticCdf(o, x, n, 0, 1, true),
                  (boost::math::logistic_distribution<double, DoublePolicy>(0, 1)))
 
+// Quantiles at a small shape, where the lower tail rises like x^0.05 and
+// most quantiles of the grid lie below 1e-3 (the power-series region).
+void QelGammaSmallShapeInvCdf(benchmark::State& s) {
+  perCall(s, grid(1e-6, 1 - 1e-6, kPoints),
+          [](double p) { return qel::GammaInvCdf(p, 0.05, 1, 0); });
+}
+void BoostGammaSmallShapeQuantile(benchmark::State& s) {
+  const boost::math::gamma_distribution<double, DoublePolicy> d(0.05, 1);
+  perCall(s, grid(1e-6, 1 - 1e-6, kPoints), [&](double p) { return quantile(d, p); });
+}
+void QelBetaSmallShapeInvCdf(benchmark::State& s) {
+  perCall(s, grid(1e-6, 1 - 1e-6, kPoints), [](double p) { return qel::BetaInvCdf(p, 0.05, 4); });
+}
+void BoostBetaSmallShapeQuantile(benchmark::State& s) {
+  const boost::math::beta_distribution<double, DoublePolicy> d(0.05, 4);
+  perCall(s, grid(1e-6, 1 - 1e-6, kPoints), [&](double p) { return quantile(d, p); });
+}
+BENCHMARK(QelGammaSmallShapeInvCdf);
+BENCHMARK(BoostGammaSmallShapeQuantile);
+BENCHMARK(QelBetaSmallShapeInvCdf);
+BENCHMARK(BoostBetaSmallShapeQuantile);
+
 }  // namespace

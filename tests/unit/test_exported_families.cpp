@@ -135,19 +135,10 @@ TEST(ExportedFamilies, MatchHighPrecisionReferenceValues) {
   EXPECT_GE(functions.size(), 80u);  // every family in all four functions
 }
 
-// Where 1e-14 in the body and 1e-12 in the far tails (tail, density or p
-// below 1e-6) is not met yet, about three times the largest error measured
-// now: a bound that may only shrink. Quantiles of gamma and beta laws of
-// shape 0.01 to 0.05, where the quantile magnifies a tail's rounding error by
-// 1/shape.
-const std::map<std::string, double> kShortfalls = {
-    {"gamma inv", 1.2e-13},
-    {"beta inv", 4e-14},
-};
-
 TEST(ExportedFamilies, DoublePrecisionFromBodyToFarTails) {
   auto rows = qeltest::loadReferenceData("distribution_precision.csv", 2);
-  for (const char* more : {"distribution_precision_nct.csv", "distribution_body.csv"}) {
+  for (const char* more :
+       {"distribution_precision_nct.csv", "distribution_body.csv", "series_region_quantiles.csv"}) {
     for (auto& row : qeltest::loadReferenceData(more, 2)) rows.push_back(row);
   }
   for (const auto& row : rows) {
@@ -156,10 +147,7 @@ TEST(ExportedFamilies, DoublePrecisionFromBodyToFarTails) {
     const double x = row.numbers[0], expected = row.numbers[5];
     if (expected != 0.0 && std::fabs(expected) < 1e-280) continue;
     const bool far = f == "inv" ? x < 1e-6 || x > 1.0 - 1e-6 : std::fabs(expected) < 1e-6;
-    double tolerance = far ? 1e-12 : 1e-14;
-    const bool noncentralT = family == "t" && row.numbers[2] != 0.0;
-    const auto known = kShortfalls.find(family + (noncentralT ? " noncentral " : " ") + f);
-    if (known != kShortfalls.end()) tolerance = std::max(tolerance, known->second);
+    const double tolerance = far ? 1e-12 : 1e-14;
     const double actual = evaluate(family, f, x, &row.numbers[1]);
     EXPECT_LE(qeltest::relativeError(actual, expected), tolerance)
         << family << " " << f << " line " << row.line << ": " << actual << " vs " << expected;

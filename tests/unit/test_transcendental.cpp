@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "reference_data.h"
+#include "utilities/special_functions/double_double.h"
 #include "utilities/special_functions/incomplete_beta.h"
 #include "utilities/special_functions/transcendental.h"
 
@@ -287,3 +288,16 @@ TEST(IncompleteGammaDerivatives, FailuresAndDegenerateArguments) {
 }
 
 }  // namespace
+
+// ln p in double-double from p = 2^-1022 to 1 - 2^-53, against mpmath's
+// logarithm split into its nearest double and the rest.
+TEST(DoubleDoubleLog, MatchesHighPrecisionLogarithm) {
+  const auto rows = qeltest::loadReferenceData("double_double_log.csv", 0);
+  for (const auto& row : rows) {
+    const qel::DoubleDouble r = qel::ddLog(row.numbers[0]);
+    EXPECT_EQ(r.hi, row.numbers[1]) << row.numbers[0];
+    EXPECT_LE(std::fabs((r.hi - row.numbers[1]) + (r.lo - row.numbers[2])), 5e-20)
+        << row.numbers[0];
+  }
+  EXPECT_GE(rows.size(), 13u);
+}

@@ -61,9 +61,11 @@ case("gamma", "pdf", 1, (2, 1, 1), 0)
 case("chisq", "upper", 0, (3, 0), 1)
 case("chisq", "pdf", -1, (3,), 0)
 # Quantiles at the ends; a gamma quantile of 0 is 0 without the threshold,
-# also where the ELV routine reports it as underflowed.
+# also where it lies below the smallest normal double (e^-2303 here); one
+# of 5.6e-301 is a normal double and keeps the threshold.
 case("gamma", "inv", 0, (2, 3, 5), 0)
-case("gamma", "inv", 0.001, (0.01, 1, 7), 0)
+case("gamma", "inv", 1e-10, (0.01, 1, 7), 0)
+case("gamma", "inv", 0.001, (0.01, 1, 7), 7)
 case("chisq", "inv", 0, (4, 0), 0)
 case("chisq", "inv", 1, (4, 0), MISSING)
 case("chisq", "inv", 1, (4, 2), MISSING)

@@ -15,6 +15,7 @@
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/series_quantile.h"
 #include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
@@ -248,6 +249,7 @@ double mBetaInvCdf(double p, double a, double b) {
     return smallshape::quantile(tails, p, TailSupport::Unit, 0.5);
   }
   double q = 0.0;
+  if (seriesquantile::betaQuantile(p, a, b, &q)) return q;
   const ElvStatus status =
       p <= 0.5 ? elv_beta_lower_quant(p, a, b, &q) : elv_beta_upper_quant(1.0 - p, a, b, &q);
   // TOMS 708's tails where it answers: for small shapes the quantile

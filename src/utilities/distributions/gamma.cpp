@@ -16,6 +16,7 @@
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/distributions/series_quantile.h"
 #include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/standardize.h"
@@ -78,7 +79,14 @@ double gammaQuantileFromElv(double p, double shape) {
     return !ElvFailed(elv_gamma_df(x, shape, lower, upper, &density));
   };
   if (!farBeyondElvRange(p)) {
-    return mPolishedQuantile(tails, p, TailSupport::Positive, gammaElvQuantile(p, shape));
+    const double q = gammaElvQuantile(p, shape);
+    // The routine's Newton iteration may stop short of its tolerance
+    // (status 4: at shape 0.05 for the quantile 1.0); at full precision
+    // the tail search answers instead of the missing value.
+    if (!mIsNumericMissing(q) || elv::elvPrecision() != elv::ElvPrecision::Full) {
+      return mPolishedQuantile(tails, p, TailSupport::Positive, q);
+    }
+    return mTailQuantile(tails, p, TailSupport::Positive, shape);
   }
   double start = gammaElvQuantile(clampToElvRange(p), shape);
   if (mIsNumericMissing(start) || !(start > 0.0)) start = shape;
@@ -225,6 +233,9 @@ double mGammaInvCdf(double p, double shape, double scale, double threshold) {
     q = smallShapeGammaQuantile(p, shape);
     return mIsNumericMissing(q) || q == 0.0 ? q : scaledQuantile(q, scale, threshold);
   }
+  if (seriesquantile::gammaQuantile(p, shape, &q)) {
+    return q == 0.0 ? q : scaledQuantile(q, scale, threshold);
+  }
   if (p != 0.0) {
     q = gammaQuantileFromElv(p, shape);
     if (mIsNumericMissing(q)) return q;
@@ -301,6 +312,10 @@ double mChiSqInvCdf(double p, double df, double noncentrality) {
   if (noncentrality == 0.0 && tinyGammaShape(df / 2.0, p)) {
     const double half = smallShapeGammaQuantile(p, df / 2.0);
     return mIsNumericMissing(half) ? half : scaledQuantile(half, 2.0, 0.0);
+  }
+  double half = 0.0;
+  if (noncentrality == 0.0 && seriesquantile::gammaQuantile(p, df / 2.0, &half)) {
+    return 2.0 * half;
   }
   if (noncentrality == 0.0) return centralChiSqQuantile(p, df);
   // The smaller tail, solved in logarithms from the mean.

@@ -6,6 +6,8 @@
 // the rest of the series, at most r^2/2 < 6e-5, needs only double precision.
 #include "utilities/special_functions/double_double.h"
 
+#include <cmath>
+
 namespace qel {
 namespace {
 
@@ -31,6 +33,19 @@ DoubleDouble ddExp(DoubleDouble a, int* exponent) {
   const int j = n & 31;
   *exponent = (n - j) / 32;
   return ddMul(kExp2Table[j], er);
+}
+
+// y = ln p (double) is within an ulp or so of the truth; Newton's step for
+// e^y = p is y + (p e^-y - 1) = y + (p - e^y)/e^y, whose own error is of
+// the order of the step squared, 1e-32, beside the 1e-20 of ddExp.
+// e^y = s 2^k with s near 1, so that p 2^-k (exact: a change of exponent)
+// and s differ by about 1e-16 s and their difference is exact.
+DoubleDouble ddLog(double p) {
+  const double y = std::log(p);
+  int k = 0;
+  const DoubleDouble e = ddExp({y, 0.0}, &k);
+  const DoubleDouble gap = ddAdd(DoubleDouble{std::ldexp(p, -k), 0.0}, DoubleDouble{-e.hi, -e.lo});
+  return ddAdd(DoubleDouble{y, 0.0}, gap.hi / e.hi);
 }
 
 }  // namespace qel

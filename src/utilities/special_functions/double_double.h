@@ -68,6 +68,10 @@ inline DoubleDouble ddDiv(DoubleDouble a, DoubleDouble b) {
 // floating-point state treats subnormal operands as zero.
 DoubleDouble ddExp(DoubleDouble a, int* exponent);
 
+// ln p for 2^-1022 <= p <= 1 to about 1e-20 absolute: the double logarithm
+// corrected by one Newton step on e^y = p, with e^y from ddExp.
+DoubleDouble ddLog(double p);
+
 }  // namespace qel
 
 #endif
