@@ -3,6 +3,7 @@
 // With z = (x - location) / scale and e = exp(-z), the lower tail is
 // 1 / (1 + e) and the upper tail e / (1 + e): both are ratios without
 // cancellation, so each tail keeps its relative accuracy on its own.
+#include <cfloat>
 #include <cmath>
 #include <stdexcept>
 
@@ -11,6 +12,7 @@
 #include "utilities/MathUtilities.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/standardize.h"
+#include "utilities/special_functions/double_double.h"
 
 namespace qel {
 
@@ -59,8 +61,60 @@ double logDistance(double x, double threshold, double* half) {
   return mLog(*half, true) + 0.69314718055994530942;
 }
 
+namespace {
+
+const DoubleDouble kLn2 = {0.69314718055994530942, 2.3190468138462996e-17};
+
+// ln v for a normal positive v to about 1e-20 absolute: v = m 2^k with m in
+// [1/2, 1), ln m by ddLog.
+DoubleDouble logOf(double v) {
+  int k = 0;
+  const double m = std::frexp(v, &k);
+  return ddAdd(ddLog(m), ddMul(kLn2, static_cast<double>(k)));
+}
+
+// e^a for a double-double -745 < a.hi < 709, rounded to a double.
+double expOf(DoubleDouble a) {
+  int e = 0;
+  if (a.hi <= 0.0) {
+    const DoubleDouble s = ddExp(a, &e);
+    return std::ldexp(s.hi + s.lo, e);
+  }
+  const DoubleDouble r = ddDiv({1.0, 0.0}, ddExp({-a.hi, -a.lo}, &e));
+  return std::ldexp(r.hi + r.lo, -e);
+}
+
+// The density e^-|z| / (scale d (1 + e^-|z|)^2), d = x - threshold and
+// z = (ln d - location) / scale, as the exponential of its logarithm carried
+// in double-double. Rounding ln d to a double costs |ln d| / scale units in
+// the last place (9e-14 at d = 1e-300); here ln d, z and the sum stay exact
+// to about 1e-20. False where the operands leave the safe range (scale
+// outside [1e-3, 1e3], a location beyond 1e6, a subnormal or infinite
+// half-distance, a density beyond the double range): the plain form answers.
+bool logLogisticDensity(double x, double location, double scale, double threshold,
+                        double* density) {
+  if (!(scale >= 1e-3 && scale <= 1e3 && std::fabs(location) <= 1e6)) return false;
+  const DoubleDouble half = ddTwoSum(0.5 * x, -0.5 * threshold);
+  if (!(half.hi >= DBL_MIN && half.hi <= DBL_MAX)) return false;
+  const DoubleDouble logD = ddAdd(ddAdd(logOf(half.hi), half.lo / half.hi), kLn2);
+  const DoubleDouble z = ddDiv(ddAdd(logD, -location), {scale, 0.0});
+  const DoubleDouble minusAbsZ = z.hi > 0.0 ? DoubleDouble{-z.hi, -z.lo} : z;
+  const double tail = minusAbsZ.hi > -745.0 ? std::exp(minusAbsZ.hi) : 0.0;
+  DoubleDouble logDensity = ddAdd(minusAbsZ, DoubleDouble{-logD.hi, -logD.lo});
+  const DoubleDouble logScale = logOf(scale);
+  logDensity = ddAdd(logDensity, DoubleDouble{-logScale.hi, -logScale.lo});
+  logDensity = ddAdd(logDensity, -2.0 * std::log1p(tail));
+  if (logDensity.hi >= 709.0) return false;
+  *density = logDensity.hi <= -745.0 ? 0.0 : expOf(logDensity);
+  return true;
+}
+
+}  // namespace
+
 double mLogLogisticPdf(double x, double location, double scale, double threshold) {
   if (x <= threshold) return 0.0;
+  double precise = 0.0;
+  if (logLogisticDensity(x, location, scale, threshold, &precise)) return precise;
   double half = 0.0;
   const double u = logDistance(x, threshold, &half);
   const double density = mLogisticPdf(u, location, scale);
