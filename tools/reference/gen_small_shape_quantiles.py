@@ -158,6 +158,12 @@ def rows():
                 add("beta", p, other, s, lambda: beta_quantile(other, s, p))
                 add("f", p, s, other, lambda: f_q(s, other, p))
                 add("f", p, other, s, lambda: f_q(other, s, p))
+    # b of 1e-4 puts most of the mass within 1e-16 of 1, where the quantile
+    # rounds to 1.
+    for s in [1e-4, 3e-4]:
+        for other in [1e-3, 0.2, 5.0, 100.0]:
+            for p in [1e-10, 0.3, 0.9]:
+                add("beta", p, other, s, lambda: beta_quantile(other, s, p))
     return out
 
 

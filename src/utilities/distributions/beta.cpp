@@ -237,16 +237,18 @@ double mBetaInvCdf(double p, double a, double b) {
   if (!mPositiveShapes(a, b)) return mGetMissingValueCode();
   if (p == 0.0) return 0.0;
   if (p == 1.0) return 1.0;
+  // Both tails through mBetaCdf (the series of small_shape_tails.h at tiny
+  // shapes); the search settles the ends first: 0 below DBL_MIN, 1 above the
+  // largest double below 1.
+  const TailPair cdfTails = [a, b](double x, double* lower, double* upper) {
+    *lower = mBetaCdf(x, a, b, false);
+    *upper = mBetaCdf(x, a, b, true);
+    return !mIsNumericMissing(*lower) && !mIsNumericMissing(*upper);
+  };
   if ((std::islessequal(a, smallshape::kTinyShape) ||
        std::islessequal(b, smallshape::kTinyShape)) &&
       p > 0.0 && p < 1.0) {
-    // Both tails by the series of small_shape_tails.h, through mBetaCdf.
-    const TailPair tails = [a, b](double x, double* lower, double* upper) {
-      *lower = mBetaCdf(x, a, b, false);
-      *upper = mBetaCdf(x, a, b, true);
-      return !mIsNumericMissing(*lower) && !mIsNumericMissing(*upper);
-    };
-    return smallshape::quantile(tails, p, TailSupport::Unit, 0.5);
+    return smallshape::quantile(cdfTails, p, TailSupport::Unit, 0.5);
   }
   double q = 0.0;
   if (seriesquantile::betaQuantile(p, a, b, &q)) return q;
@@ -261,7 +263,11 @@ double mBetaInvCdf(double p, double a, double b) {
   };
   if (!ElvFailed(status)) return mPolishedQuantile(tails, p, TailSupport::Unit, q);
   // Beyond the routines' range of tails: the smaller tail in logarithms.
-  return mTailQuantile(tails, p, TailSupport::Unit, a / (a + b));
+  const double x = mTailQuantile(tails, p, TailSupport::Unit, a / (a + b));
+  if (!mIsNumericMissing(x) || !(p > 0.0 && p < 1.0)) return x;
+  // A quantile that rounds to an end (b = 1e-4 puts the mass of p = 0.3
+  // within 1e-16 of 1) has no bracket inside (0, 1): the end search answers.
+  return smallshape::quantile(cdfTails, p, TailSupport::Unit, 0.5);
 }
 
 // --- F ---------------------------------------------------------------------
