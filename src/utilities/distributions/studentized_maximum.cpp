@@ -126,42 +126,62 @@ CmMaximumInner::CmMaximumInner(const std::vector<double>& distinct,
   }
 }
 
-// phi(y) along y_i = y_0 + i s without an exponential at most points:
+// The normal tails Q(|y|) at the points y = (w -+ d_j z)/c_j of one
+// z-lattice point, one lane per point, held in arrays. phi along the
+// lattice, y_i = y_0 + i s, needs no exponential at most points:
 // phi(y + s) = phi(y) r, r = exp(-y s - s^2/2), and r itself is multiplied
-// by exp(-s^2) per step. Restarted from exp every 8 steps (the rounding
-// stays below 2e-15 relative) and wherever phi is below 1e-250.
-class DensityWalk {
+// by exp(-s^2) per step. Restarted from exp every 16 steps (the rounding
+// stays below 4e-14 relative) and wherever phi is below 1e-250.
+class TailLanes {
  public:
-  DensityWalk(double y, double s) : mS(s), mDecay(std::exp(-s * s)) { restart(y); }
-  double value() const { return mPhi; }
-  // Moves to y (the previous point plus s).
-  void advance(double y) {
-    if (++mSteps >= 8 || mPhi < 1e-250) {
-      restart(y);
-      return;
-    }
-    mPhi *= mRatio;
-    mRatio *= mDecay;
+  explicit TailLanes(size_t count) : mSize(count), mData(kArrays * count, 0.0) {}
+  // Lane j: y = base + slope z, the lattice step moving y by step.
+  void set(size_t j, double base, double slope, double step) {
+    at(kBase)[j] = base;
+    at(kSlope)[j] = slope;
+    at(kStep)[j] = step;
+    at(kDecay)[j] = std::exp(-step * step);
   }
+  // Moves every lane to z, the previous point plus the step (the first call
+  // starts there), and evaluates the tails.
+  void moveTo(double z) {
+    double *y = at(kY), *p = at(kPhi), *r = at(kRatio);
+    const double *base = at(kBase), *slope = at(kSlope), *decay = at(kDecay);
+    const bool restartAll = mSteps == 0 || mSteps >= 16;
+    for (size_t l = 0; l < mSize; ++l) {
+      y[l] = base[l] + slope[l] * z;
+      p[l] *= r[l];
+      r[l] *= decay[l];
+      if (restartAll || p[l] < 1e-250) restart(l);
+    }
+    mSteps = restartAll ? 1 : mSteps + 1;
+    double* q = at(kTail);
+    for (size_t l = 0; l < mSize; ++l)
+      q[l] = studentized::upperNormalFromDensity(std::fabs(y[l]), p[l]);
+  }
+  const double* y() const { return &mData[kY * mSize]; }
+  // Q(|y|) of each lane.
+  const double* tail() const { return &mData[kTail * mSize]; }
 
  private:
-  void restart(double y) {
-    mPhi = studentized::phi(y);
-    mRatio = safeExp(-y * mS - 0.5 * mS * mS);
-    mSteps = 0;
+  enum { kBase, kSlope, kStep, kDecay, kY, kPhi, kRatio, kTail, kArrays };
+  double* at(int array) { return &mData[array * mSize]; }
+  void restart(size_t l) {
+    const double y = at(kY)[l], s = at(kStep)[l];
+    const double p = studentized::phi(y);
+    at(kPhi)[l] = p;
+    at(kRatio)[l] = p > 0.0 ? safeExp(-y * s - 0.5 * s * s) : 0.0;
   }
-  double mS, mDecay, mPhi = 0.0, mRatio = 0.0;
+  size_t mSize;
+  std::vector<double> mData;
   int mSteps = 0;
 };
 
-double CmMaximumInner::logProduct(double z, double w, double cut,
-                                  std::vector<DensityWalk>& walks) const {
-  using studentized::upperNormalFromDensity;
+double CmMaximumInner::logProduct(double cut, const TailLanes& lanes) const {
   // The factors F = 1 - q with q < 1e-4 enter the log-sum by their series;
   // the others are multiplied (one logarithm per point), folded into the
   // sum before the product could underflow.
   double sum = 0.0, product = 1.0;
-  bool vanishes = false;
   auto multiply = [&](double F, double m) {
     // (F > 0; a small one is taken alone, so that the product stays normal.)
     if (F < 1e-30) {
@@ -174,13 +194,12 @@ double CmMaximumInner::logProduct(double z, double w, double cut,
     }
   };
   const size_t stride = mModulus ? 2 : 1;
+  const double *y = lanes.y(), *tail = lanes.tail();
   for (size_t j = 0; j < mFactors.size(); ++j) {
     const Factor& f = mFactors[j];
-    const double a = (w - f.d * z) * f.invC;
-    // Q(a), or Phi(a) for a < 0, from phi(a).
-    const double pa = walks[stride * j].value();
-    const double smallA = a >= 0.0 ? upperNormalFromDensity(a, pa) : upperNormalFromDensity(-a, pa);
-    if (vanishes) continue;
+    const double a = y[stride * j];
+    // Q(a), or Phi(a) for a < 0.
+    const double smallA = tail[stride * j];
     double q = 0.0, F = 1.0;
     if (!mModulus) {
       if (a > cut) continue;
@@ -188,34 +207,33 @@ double CmMaximumInner::logProduct(double z, double w, double cut,
         q = smallA;
       } else {
         F = smallA;
-        if (!(F > 0.0)) vanishes = true;
+        if (!(F > 0.0)) return 1.0;
         q = 1.0;
       }
     } else {
-      // F = Phi(a) - Phi(b), b = (-w - d z)/c <= a.
-      const double b = a - 2.0 * w * f.invC;
+      // F = Phi(a) - Phi(b), b = (-w - d z)/c <= a; Q(|b|) from the lane
+      // of -b.
+      const double b = -y[stride * j + 1], smallB = tail[stride * j + 1];
       const double qa = a > cut ? 0.0 : a >= 0.0 ? smallA : 1.0 - smallA;
       // Q(-b) / Q(a) <= exp(-(b^2 - a^2)/2) = exp(-2 w d z / c^2) (z, d >= 0):
       // below 1e-17 it does not change q.
-      const double gap = 2.0 * w * f.d * z * f.invC * f.invC;
-      const double pb = walks[stride * j + 1].value();
+      const double gap = 0.5 * (b - a) * (b + a);
       const double qb = -b > cut || (gap > 40.0 && qa > 0.0) ? 0.0
-                        : -b >= 0.0                          ? upperNormalFromDensity(-b, pb)
-                                                             : 1.0 - upperNormalFromDensity(b, pb);
+                        : -b >= 0.0                          ? smallB
+                                                             : 1.0 - smallB;
       q = qa + qb;
       if (q > 0.5) {
-        F = b >= 0.0 ? upperNormalFromDensity(b, pb) - qa : a <= 0.0 ? smallA - qb : 1.0 - q;
-        if (!(F > 0.0)) vanishes = true;
+        F = b >= 0.0 ? smallB - qa : a <= 0.0 ? smallA - qb : 1.0 - q;
+        if (!(F > 0.0)) return 1.0;
       }
     }
-    if (vanishes || q == 0.0) continue;
+    if (q == 0.0) continue;
     if (q < 1e-4) {
       sum += f.m * log1mSmall(q);
     } else {
       multiply(q > 0.5 ? F : 1.0 - q, f.m);
     }
   }
-  if (vanishes) return 1.0;
   return product == 1.0 ? sum : sum + std::log(product);
 }
 
@@ -241,49 +259,45 @@ double CmMaximumInner::zIntegral(double w) const {
   // Q(|w|) of the answer: Q(cut) / Q(|w|) <= exp(-(cut^2 - w^2)/2) (cut/|w|
   // bounded), and the 1 added absorbs the ratio of the prefactors.
   const double cut = std::sqrt(w * w + 2.0 * std::log(1e17 * mK)) + 1.0;
-  // The lattice is walked upwards from z0: phi at the a and -b of each
-  // factor follows from its last value.
-  std::vector<DensityWalk> walks;
-  bool started = false;
+  // The lattice is walked upwards: lane 2j (or j) holds a_j, lane 2j + 1 of
+  // the modulus -b_j.
+  const size_t stride = mModulus ? 2 : 1;
+  TailLanes lanes(stride * mFactors.size());
+  for (size_t j = 0; j < mFactors.size(); ++j) {
+    const Factor& g = mFactors[j];
+    const double slope = g.d * g.invC;
+    lanes.set(stride * j, w * g.invC, -slope, -slope * h);
+    if (mModulus) lanes.set(stride * j + 1, w * g.invC, slope, slope * h);
+  }
+  // Whether 1 - prod_j F_j^m_j is 1 to double precision at the last point.
+  bool saturated = false;
   auto f = [&](double z) {
-    if (!started) {
-      walks.reserve(2 * mFactors.size());
-      for (const Factor& g : mFactors) {
-        walks.emplace_back((w - g.d * z) * g.invC, -g.d * h * g.invC);
-        if (mModulus) walks.emplace_back((w + g.d * z) * g.invC, g.d * h * g.invC);
-      }
-      started = true;
-    } else {
-      for (size_t j = 0; j < mFactors.size(); ++j) {
-        const Factor& g = mFactors[j];
-        const size_t stride = mModulus ? 2 : 1;
-        walks[stride * j].advance((w - g.d * z) * g.invC);
-        if (mModulus) walks[stride * j + 1].advance((w + g.d * z) * g.invC);
-      }
-    }
+    lanes.moveTo(z);
     const double density = studentized::phi(z);
     if (density == 0.0) return 0.0;
-    const double s = logProduct(z, w, cut, walks);
+    const double s = logProduct(cut, lanes);
+    saturated = s > 0.0 || s < -39.2;  // prod_j F_j^m_j < 1e-17
     return s > 0.0 ? density : -density * std::expm1(s);
   };
-  double lo, hi;
   if (mModulus) {
     // Even in z: the trapezoidal rule on the whole line from z >= 0.
     // Beyond z the integrand is below phi(z), and Q(z) is below 1e-16 of
     // the lower bound 2 Q(w) of the answer at the z given.
-    hi = std::min(peakHi + kReach, std::sqrt(w * w + 2.0 * std::log(1e16)) + 1.0);
+    const double hi = std::min(peakHi + kReach, std::sqrt(w * w + 2.0 * std::log(1e16)) + 1.0);
     double sum = 0.5 * f(0.0);
     const int last = static_cast<int>(std::ceil(hi / h));
     for (int i = 1; i <= last; ++i) {
       const double z = i * h;
-      sum += f(z);
+      // Each factor decreases in z >= 0 (the mass of |d z + c E| < w), so
+      // once their product is below 1e-17 the integrand is phi(z) onwards.
+      const double density = studentized::phi(z);
+      sum += saturated ? density : f(z);
       // The integrand is below phi, so the rest is below Q(z) <= phi(z)/z.
-      if (z >= 1.0 && studentized::phi(z) <= 1e-16 * z * h * sum) break;
+      if (z >= 1.0 && density <= 1e-16 * z * h * sum) break;
     }
     return 2.0 * h * sum;
   }
-  lo = peakLo - kReach;
-  hi = peakHi + kReach;
+  double lo = peakLo - kReach, hi = peakHi + kReach;
   if (w < 0.0) lo = std::min(lo, -kReach), hi = std::max(hi, kReach);
   double sum = 0.0;
   const int firstIndex = static_cast<int>(std::floor(lo / h)),
