@@ -172,6 +172,16 @@ class TailLanes {
   double* at(int array) { return &mData[array * mSize]; }
   void restart(size_t l) {
     const double y = at(kY)[l], s = at(kStep)[l];
+    // A lane at the point of the previous one but walking the other way (a
+    // and -b of the modulus at z = 0) shares its phi, and the two ratios
+    // multiply to exp(-s^2).
+    const double *p0 = at(kPhi), *r0 = at(kRatio);
+    if (l > 0 && y == at(kY)[l - 1] && s == -at(kStep)[l - 1] && p0[l - 1] > 0.0 &&
+        r0[l - 1] > 1e-300) {
+      at(kPhi)[l] = p0[l - 1];
+      at(kRatio)[l] = at(kDecay)[l] / r0[l - 1];
+      return;
+    }
     const double p = studentized::phi(y);
     at(kPhi)[l] = p;
     at(kRatio)[l] = p > 0.0 ? safeExp(-y * s - 0.5 * s * s) : 0.0;
