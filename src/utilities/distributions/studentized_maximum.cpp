@@ -126,8 +126,8 @@ CmMaximumInner::CmMaximumInner(const std::vector<double>& distinct,
   }
 }
 
-// The normal tails Q(|y|) at the points y = (w -+ d_j z)/c_j of one
-// z-lattice point, one lane per point, held in arrays. phi along the
+// The points y = (w -+ d_j z)/c_j of one z-lattice point and phi(y), one
+// lane per point, held in arrays. phi along the
 // lattice, y_i = y_0 + i s, needs no exponential at most points:
 // phi(y + s) = phi(y) r, r = exp(-y s - s^2/2), and r itself is multiplied
 // by exp(-s^2) per step. Restarted from exp every 32 steps (the rounding,
@@ -136,7 +136,7 @@ CmMaximumInner::CmMaximumInner(const std::vector<double>& distinct,
 // walks phi(z) itself.
 class TailLanes {
  public:
-  explicit TailLanes(size_t count) : mTails(count), mSize(count + 1), mData(kArrays * mSize, 0.0) {}
+  explicit TailLanes(size_t count) : mSize(count + 1), mData(kArrays * mSize, 0.0) {}
   // Lane j: y = base + slope z, the lattice step moving y by step.
   void set(size_t j, double base, double slope, double step) {
     at(kBase)[j] = base;
@@ -145,7 +145,7 @@ class TailLanes {
     at(kDecay)[j] = std::exp(-step * step);
   }
   // Moves every lane to z, the previous point plus the step (the first call
-  // starts there), and evaluates the tails.
+  // starts there).
   void moveTo(double z) {
     double *y = at(kY), *p = at(kPhi), *r = at(kRatio);
     const double *base = at(kBase), *slope = at(kSlope), *decay = at(kDecay);
@@ -157,18 +157,16 @@ class TailLanes {
       if (restartAll || p[l] < 1e-250) restart(l);
     }
     mSteps = restartAll ? 1 : mSteps + 1;
-    double* q = at(kTail);
-    for (size_t l = 0; l < mTails; ++l)
-      q[l] = studentized::upperNormalFromDensity(std::fabs(y[l]), p[l]);
   }
-  // phi at the lane's point.
-  double density(size_t l) const { return mData[kPhi * mSize + l]; }
   const double* y() const { return &mData[kY * mSize]; }
-  // Q(|y|) of each lane.
-  const double* tail() const { return &mData[kTail * mSize]; }
+  const double* density() const { return &mData[kPhi * mSize]; }
+  // Q(|y|) of lane l.
+  double tail(size_t l) const {
+    return studentized::upperNormalFromDensity(std::fabs(y()[l]), density()[l]);
+  }
 
  private:
-  enum { kBase, kSlope, kStep, kDecay, kY, kPhi, kRatio, kTail, kArrays };
+  enum { kBase, kSlope, kStep, kDecay, kY, kPhi, kRatio, kArrays };
   double* at(int array) { return &mData[array * mSize]; }
   void restart(size_t l) {
     const double y = at(kY)[l], s = at(kStep)[l];
@@ -186,7 +184,7 @@ class TailLanes {
     at(kPhi)[l] = p;
     at(kRatio)[l] = p > 0.0 ? safeExp(-y * s - 0.5 * s * s) : 0.0;
   }
-  size_t mTails, mSize;
+  size_t mSize;
   std::vector<double> mData;
   int mSteps = 0;
 };
@@ -208,12 +206,13 @@ double CmMaximumInner::logProduct(double cut, const TailLanes& lanes) const {
     }
   };
   const size_t stride = mModulus ? 2 : 1;
-  const double *y = lanes.y(), *tail = lanes.tail();
+  // Each tail is evaluated only where it is used.
+  const double* y = lanes.y();
   for (size_t j = 0; j < mFactors.size(); ++j) {
     const Factor& f = mFactors[j];
     const double a = y[stride * j];
     // Q(a), or Phi(a) for a < 0.
-    const double smallA = tail[stride * j];
+    const double smallA = a > cut ? 0.0 : lanes.tail(stride * j);
     double q = 0.0, F = 1.0;
     if (!mModulus) {
       if (a > cut) continue;
@@ -227,14 +226,14 @@ double CmMaximumInner::logProduct(double cut, const TailLanes& lanes) const {
     } else {
       // F = Phi(a) - Phi(b), b = (-w - d z)/c <= a; Q(|b|) from the lane
       // of -b.
-      const double b = -y[stride * j + 1], smallB = tail[stride * j + 1];
+      const double b = -y[stride * j + 1];
       const double qa = a > cut ? 0.0 : a >= 0.0 ? smallA : 1.0 - smallA;
       // Q(-b) / Q(a) <= exp(-(b^2 - a^2)/2) = exp(-2 w d z / c^2) (z, d >= 0):
       // below 1e-17 it does not change q.
       const double gap = 0.5 * (b - a) * (b + a);
-      const double qb = -b > cut || (gap > 40.0 && qa > 0.0) ? 0.0
-                        : -b >= 0.0                          ? smallB
-                                                             : 1.0 - smallB;
+      const bool dropB = -b > cut || (gap > 40.0 && qa > 0.0);
+      const double smallB = dropB ? 0.0 : lanes.tail(stride * j + 1);
+      const double qb = dropB ? 0.0 : -b >= 0.0 ? smallB : 1.0 - smallB;
       q = qa + qb;
       if (q > 0.5) {
         F = b >= 0.0 ? smallB - qa : a <= 0.0 ? smallA - qb : 1.0 - q;
@@ -290,7 +289,7 @@ double CmMaximumInner::zIntegral(double w) const {
   double saturation = 0.0;
   auto f = [&](double z) {
     lanes.moveTo(z);
-    const double density = lanes.density(zLane);
+    const double density = lanes.density()[zLane];
     if (density == 0.0) return 0.0;
     const double s = logProduct(cut, lanes);
     saturated = s > 0.0 || s < saturation;
@@ -311,13 +310,13 @@ double CmMaximumInner::zIntegral(double w) const {
     double sum = 0.5 * f(0.0);
     const int last = static_cast<int>(std::ceil(hi / h));
     // phi(z) along the lattice: the lane's value, then its recurrence.
-    double density = lanes.density(zLane), ratio = std::exp(-0.5 * h * h);
+    double density = lanes.density()[zLane], ratio = std::exp(-0.5 * h * h);
     const double decay = std::exp(-h * h);
     for (int i = 1; i <= last; ++i) {
       const double z = i * h;
       if (!saturated) {
         sum += f(z);
-        density = lanes.density(zLane);
+        density = lanes.density()[zLane];
         if (saturated) ratio = safeExp(-z * h - 0.5 * h * h);
       } else {
         density *= ratio;
