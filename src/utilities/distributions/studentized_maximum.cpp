@@ -189,7 +189,7 @@ class TailLanes {
   int mSteps = 0;
 };
 
-double CmMaximumInner::logProduct(double cut, const TailLanes& lanes) const {
+double CmMaximumInner::logProduct(double cut, const TailLanes& lanes, double* rest) const {
   // The factors F = 1 - q with q < 1e-4 enter the log-sum by their series;
   // the others are multiplied (one logarithm per point), folded into the
   // sum before the product could underflow.
@@ -247,7 +247,8 @@ double CmMaximumInner::logProduct(double cut, const TailLanes& lanes) const {
       multiply(q > 0.5 ? F : 1.0 - q, f.m);
     }
   }
-  return product == 1.0 ? sum : sum + std::log(product);
+  *rest = product;
+  return sum;
 }
 
 double CmMaximumInner::zIntegral(double w) const {
@@ -283,17 +284,22 @@ double CmMaximumInner::zIntegral(double w) const {
     lanes.set(stride * j, w * g.invC, -slope, -slope * h);
     if (mModulus) lanes.set(stride * j + 1, w * g.invC, slope, slope * h);
   }
-  // Whether the product prod_j F_j^m_j at the last point is below
+  // Whether the product P = prod_j F_j^m_j at the last point is below
   // saturation (it is 0 where it vanishes).
   bool saturated = false;
-  double saturation = 0.0;
+  double saturation = 0.0, logSaturation = -1e300;
   auto f = [&](double z) {
     lanes.moveTo(z);
     const double density = lanes.density()[zLane];
     if (density == 0.0) return 0.0;
-    const double s = logProduct(cut, lanes);
-    saturated = s > 0.0 || s < saturation;
-    return s > 0.0 ? density : -density * std::expm1(s);
+    double p = 1.0;
+    const double s = logProduct(cut, lanes, &p);
+    // P = p e^s <= min(p, e^s).
+    saturated = s > 0.0 || p < saturation || s < logSaturation;
+    if (s > 0.0) return density;
+    // 1 - p e^s = (1 - p) + p (1 - e^s), both parts free of cancellation
+    // (the factors in p are below 1 - 1e-4).
+    return density * ((1.0 - p) + (s == 0.0 ? 0.0 : -p * std::expm1(s)));
   };
   if (mModulus) {
     // Even in z: the trapezoidal rule on the whole line from z >= 0.
@@ -306,7 +312,8 @@ double CmMaximumInner::zIntegral(double w) const {
     // rest of the lattice, taken as phi(z), is off by at most
     // P_k h sum_(i >= k) phi(z_i) <= P_k 0.6, under 4e-13 of the lower bound
     // 2 Q(w) of the answer.
-    saturation = std::log(std::max(1e-17, 1e-12 * upperNormal(w)));
+    saturation = std::max(1e-17, 1e-12 * upperNormal(w));
+    logSaturation = std::log(saturation);
     double sum = 0.5 * f(0.0);
     const int last = static_cast<int>(std::ceil(hi / h));
     // phi(z) along the lattice: the lane's value, then its recurrence.
