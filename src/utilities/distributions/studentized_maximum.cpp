@@ -3,20 +3,19 @@
 //
 // Inner integral, for w = x s:
 //   U(w) = int phi(z) (1 - prod_j F_j(z)^m_j) dz,
-// the product formed as -expm1(sum_j m_j log F_j) with each log F_j taken from
-// the smaller normal tail, so that a far upper tail keeps its relative
-// accuracy. The integrand is a sum of pieces phi(z) (1 - F_j): piece j is
-// P(Z in dz, Y_j > w) and lies, relative to P(Y_j > w) <= U(w), within 8 of
-// the point l_j w up to exp(-32) (given Y_j > w, Z is l_j Y_j + c_j E with
-// Y_j - w below a half-normal). So the z-range is the hull of the l_j w
-// widened by 8 (by symmetry only z >= 0 for the modulus, whose factors are
-// even in z and in l_j). The integrand is entire and decays like phi, so
-// the trapezoidal rule on a lattice over that range converges geometrically
-// in 1/h^2 (Trefethen and Weideman, SIAM Review 56 (2014) 385), with the
-// step set by the narrowest factor. The normal tails come from the rational
-// erfc of ACM TOMS 708 times phi, and phi at the points a_j, -b_j follows
-// from its last value along the lattice, so a point costs a few
-// multiplications and one logarithm for all factors.
+// 1 - prod_j F_j formed from the smaller normal tail of each factor: those
+// below 1e-4 by the series of log(1 - q) and expm1, so that a far upper
+// tail keeps its relative accuracy, the others by their product. The integrand is a sum of pieces
+// phi(z) (1 - F_j): piece j is P(Z in dz, Y_j > w) and lies, relative to P(Y_j > w) <= U(w), within
+// 8 of the point l_j w up to exp(-32) (given Y_j > w, Z is l_j Y_j + c_j E with Y_j - w below a
+// half-normal). So the z-range is the hull of the l_j w widened by 8 (by symmetry only z >= 0 for
+// the modulus, whose factors are even in z and in l_j). The integrand is entire and decays like
+// phi, so the trapezoidal rule on a lattice over that range converges geometrically in 1/h^2
+// (Trefethen and Weideman, SIAM Review 56 (2014) 385), with the step set by the narrowest factor.
+// The normal tails come from the rational erfc of ACM TOMS 708 times phi, and phi at the points
+// a_j, -b_j follows from its last value along the lattice, so a point costs a few multiplications
+// per factor and one expm1. Where the product decreases along the lattice, its end once the product
+// is negligible is phi alone.
 //
 // Outer integral over t = log s for df < 4 (for df >= 4 the trapezoidal
 // sum of trapezoidTail below), where the density of s is
@@ -127,8 +126,8 @@ CmMaximumInner::CmMaximumInner(const std::vector<double>& distinct,
 }
 
 // The points y = (w -+ d_j z)/c_j of one z-lattice point and phi(y), one
-// lane per point, held in arrays. phi along the
-// lattice, y_i = y_0 + i s, needs no exponential at most points:
+// lane per point, held in arrays. phi along the lattice, y_i = y_0 + i s,
+// needs no exponential at most points:
 // phi(y + s) = phi(y) r, r = exp(-y s - s^2/2), and r itself is multiplied
 // by exp(-s^2) per step. Restarted from exp every 32 steps (the rounding,
 // about n^2/2 units in the last place after n steps, stays below 2e-13
@@ -191,8 +190,8 @@ class TailLanes {
 
 double CmMaximumInner::logProduct(double cut, const TailLanes& lanes, double* rest) const {
   // The factors F = 1 - q with q < 1e-4 enter the log-sum by their series;
-  // the others are multiplied (one logarithm per point), folded into the
-  // sum before the product could underflow.
+  // the others are multiplied into rest, folded into the sum before the
+  // product could underflow.
   double sum = 0.0, product = 1.0;
   auto multiply = [&](double F, double m) {
     // (F > 0; a small one is taken alone, so that the product stays normal.)
