@@ -634,9 +634,9 @@ namespace {
 // spread of the maximum of k variables; the step is 0.65 of the narrower
 // (error below exp(-2 pi^2 / 0.65^2 / 2), about 1e-20), and at most 0.14 for
 // the strip. The walk starts at that peak and goes out until the terms fall
-// below 1e-11 of the sum: beyond, they fall about geometrically (g by
+// below 1e-12 of the sum: beyond, they fall about geometrically (g by
 // e^(-df h (1 - e^(2t))) per step on the left, faster on the right), so the
-// rest left out stays near 1e-11 of the answer (1.7e-11 measured against a
+// rest left out stays near 1e-12 of the answer (1.6e-12 measured against a
 // cut at 1e-13 on the mpmath cases).
 double trapezoidTail(const CmMaximumInner& inner, double x, double df) {
   const LogChi g(df);
@@ -662,7 +662,7 @@ double trapezoidTail(const CmMaximumInner& inner, double x, double df) {
       // g underflows past its mode (on either side it does so for good), or
       // U vanishes to the right.
       if (f == 0.0 && (g(t) < -745.0 || dir == 1)) break;
-      if (f <= 1e-11 * sum && f <= previous) break;
+      if (f <= 1e-12 * sum && f <= previous) break;
       previous = f;
     }
   }
