@@ -65,6 +65,19 @@ TEST(StudentizedMaximum, UpperTailMatchesMpmath) {
   }
 }
 
+// Ten distinct lambdas 0.1 .. 0.9 (tools/reference/gen_studentized_maximum_ten.py)
+// from the centre to far upper tails, where the z-lattice ends early.
+TEST(StudentizedMaximum, TenDistinctLambdasMatchMpmath) {
+  const std::vector<double> ten{0.1, 0.2, 0.3, 0.4, 0.5, 0.6, 0.7, 0.8, 0.85, 0.9};
+  const auto rows = qeltest::loadReferenceData("studentized_maximum_ten_mp.csv", 1);
+  ASSERT_EQ(rows.size(), 5u);
+  for (const auto& row : rows) {
+    const double p = pValue(row.text[0] == "mod", row.numbers[1], row.numbers[0], ten);
+    EXPECT_LE(std::fabs(p - row.numbers[2]), 1e-9) << row.line;
+    EXPECT_LE(relativeError(p, row.numbers[2]), 1e-7) << row.line;
+  }
+}
+
 // The order of the lambdas does not matter; for the modulus neither does
 // their sign.
 TEST(StudentizedMaximum, LambdaOrderAndSign) {

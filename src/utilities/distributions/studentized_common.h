@@ -58,11 +58,13 @@ inline double upperNormalFromDensity(double y, double phiY) {
   }
   double scaled = 0.0;
   if (u <= 4.0) {
-    double top = 0.0, bot = 0.0;
-    for (int i = 0; i < 8; ++i) {
-      top = top * u + p[i];
-      bot = bot * u + q[i];
-    }
+    // Estrin's scheme: a third of Horner's chain of dependent operations,
+    // so that the tails of neighbouring arguments overlap in the pipeline.
+    const double u2 = u * u, u4 = u2 * u2;
+    const double top = ((p[0] * u + p[1]) * u2 + (p[2] * u + p[3])) * u4 +
+                       ((p[4] * u + p[5]) * u2 + (p[6] * u + p[7]));
+    const double bot = ((q[0] * u + q[1]) * u2 + (q[2] * u + q[3])) * u4 +
+                       ((q[4] * u + q[5]) * u2 + (q[6] * u + q[7]));
     scaled = top / bot;
   } else {
     const double t = 1.0 / (u * u);

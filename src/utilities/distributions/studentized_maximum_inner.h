@@ -9,7 +9,7 @@
 
 namespace qel {
 
-class DensityWalk;
+class TailLanes;
 
 // P(max Y_i > w) or P(max |Y_i| > w) for consolidated lambdas.
 class CmMaximumInner : public CbStudentizedInner {
@@ -28,10 +28,10 @@ class CmMaximumInner : public CbStudentizedInner {
     // count
     double d, c, invC, m;
   };
-  // sum_j m_j log F_j(z), or 1 when some F_j is 0; normal tails beyond
-  // cut are taken as 0.
-  // phi at a and -b of each factor, walked along the z-lattice.
-  double logProduct(double z, double w, double cut, std::vector<DensityWalk>& walks) const;
+  // prod_j F_j(z)^m_j at the point z of the lanes as e^sum rest: returns
+  // sum (1 when some F_j is 0) and sets rest; normal tails beyond cut are
+  // taken as 0.
+  double logProduct(double cut, const TailLanes& lanes, double* rest) const;
   // int phi(z) (1 - prod_j F_j(z)^m_j) dz over the lambdas other than 0.
   double zIntegral(double w) const;
 
