@@ -44,7 +44,7 @@ double largestExtremeValueQuantile(double minusLogP, double location, double sca
 double mExponentialPdf(double x, double scale, double threshold) {
   try {
     if (x < threshold) return 0.0;
-    return mExponential(-mStandardize(x, threshold, scale), true) / scale;
+    return mExpOverScale(-mStandardize(x, threshold, scale), scale);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -75,7 +75,11 @@ double mExponentialInvCdf(double p, double scale, double threshold) {
 
 double mLargestExtremeValuePdf(double x, double location, double scale) {
   try {
-    const double e = mExponential(-mStandardize(x, location, scale), true);
+    // e exp(-e) / scale; where e or exp(-e) would be a denormal, as the one
+    // exponential exp(-z - e) (see mExpOverScale).
+    const double z = mStandardize(x, location, scale);
+    const double e = mExponential(-z, true);
+    if (-z < -700.0 || e > 700.0) return mExpOverScale(-z - e, scale);
     return e * mExponential(-e, true) / scale;
   } catch (const std::runtime_error&) {
     return 0.0;
@@ -159,7 +163,7 @@ double mWeibullInvCdf(double p, double shape, double scale, double threshold) {
 
 double mLaplacePdf(double x, double location, double scale) {
   try {
-    return mExponential(-std::fabs(mStandardize(x, location, scale)), true) / (2.0 * scale);
+    return 0.5 * mExpOverScale(-std::fabs(mStandardize(x, location, scale)), scale);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }

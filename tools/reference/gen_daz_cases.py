@@ -1,0 +1,139 @@
+#!/usr/bin/env python3
+"""Reference values at points where the armed floating-point state (denormal
+operands read as zero) once broke an exported distribution function: arguments
+and locations near DBL_MIN, scales down to 1e-308, densities whose exponential
+factor is a denormal while the density is not, and log-location laws whose
+distance to the threshold is a denormal. The points came from a differential
+sweep (tools/daz_sweep.cpp); the values are mpmath's at 50 digits, from the
+exact doubles of the arguments.
+
+Writes tests/data/daz_cases.csv with rows
+    family,function,x,param1,param2,param3,param4,expected
+(the layout of distribution_precision.csv).
+Run: /usr/bin/python3 tools/reference/gen_daz_cases.py
+"""
+import os
+
+import mpmath
+from mpmath import mpf
+
+mpmath.mp.dps = 50
+
+
+def normal_pdf(x, m, s):
+    z = (x - m) / s
+    return mpmath.exp(-z * z / 2) / (s * mpmath.sqrt(2 * mpmath.pi))
+
+
+def normal_lower(x, m, s):
+    return mpmath.ncdf((x - m) / s)
+
+
+def laplace_pdf(x, m, s):
+    return mpmath.exp(-abs(x - m) / s) / (2 * s)
+
+
+def exponential_pdf(x, s, t):
+    return mpmath.exp(-(x - t) / s) / s
+
+
+def logistic_pdf(x, m, s):
+    e = mpmath.exp(-abs((x - m) / s))
+    return e / (s * (1 + e) ** 2)
+
+
+def lev_pdf(x, m, s):
+    e = mpmath.exp(-(x - m) / s)
+    return e * mpmath.exp(-e) / s
+
+
+def sev_pdf(x, m, s):
+    return lev_pdf(-x, -m, s)
+
+
+def cauchy_pdf(x, m, s):
+    z = (x - m) / s
+    return 1 / (mpmath.pi * s * (1 + z * z))
+
+
+def lognormal_pdf(x, m, s, t):
+    return normal_pdf(mpmath.log(x - t), m, s) / (x - t)
+
+
+def lognormal_lower(x, m, s, t):
+    return normal_lower(mpmath.log(x - t), m, s)
+
+
+def loglogistic_pdf(x, m, s, t):
+    return logistic_pdf(mpmath.log(x - t), m, s) / (x - t)
+
+
+def loglogistic_lower(x, m, s, t):
+    return 1 / (1 + mpmath.exp(-(mpmath.log(x - t) - m) / s))
+
+
+def halfnormal_inv(p, s, m):
+    return m + s * mpmath.sqrt(2) * mpmath.erfinv(p)
+
+
+# family, function, evaluator, x, parameters
+CASES = [
+    # x halved to a denormal before the subtraction of the location
+    ("Normal", "lower", normal_lower, 4.3379514771866341e-308, (0.0, 1.096993796349262e-298)),
+    ("Normal", "lower", normal_lower, -3.6665897874029096e-308,
+     (1.120413989552019e-304, 2.9569791300634717e-302)),
+    ("Normal", "upper", lambda x, m, s: 1 - normal_lower(x, m, s), 4.0e-308, (0.0, 3.0e-305)),
+    # x - location a denormal, scale near DBL_MIN
+    ("Normal", "lower", normal_lower, 4.0e-308, (3.9e-308, 2.3e-308)),
+    ("SmallestExtremeValue", "pdf", sev_pdf, -1.1376181283518934e-294,
+     (-1.1376181283163249e-294, 5.0143706688366846e-308)),
+    # exp(-t) a denormal, divided by a small scale
+    ("Laplace", "pdf", laplace_pdf, -9.014199963962544e-304, (0.0, 1.2721752854561339e-306)),
+    ("Laplace", "pdf", laplace_pdf, -2.2233965745892945e-300, (0.0, 1.9740314602501568e-303)),
+    ("Exponential", "pdf", exponential_pdf, 4.5144877482144056e-298, (3.8889831614813891e-301, 0.0)),
+    ("Logistic", "pdf", logistic_pdf, -1.2843551086717529e-302, (0.0, 1.8120887574329824e-305)),
+    ("Logistic", "pdf", logistic_pdf, 7.3034999774010437e-304, (0.0, 6.3154274149650539e-307)),
+    ("LargestExtremeValue", "pdf", lev_pdf, -4.9282638262636077e-302, (0.0, 7.5077001858134852e-303)),
+    ("LargestExtremeValue", "pdf", lev_pdf, 4.6265555358582555e-303, (0.0, 3.9965980290138579e-306)),
+    ("Normal", "pdf", normal_pdf, -6.750306385268893e-299,
+     (-6.7502808319370141e-299, 6.7867230831814037e-306)),
+    ("Normal", "pdf", normal_pdf, -6.9553140162554145e-123, (0.0, 1.8471440186719331e-124)),
+    ("HalfNormal", "pdf", lambda x, s, m: 2 * normal_pdf(x, m, s), 3.85e-299, (1.0e-300, 0.0)),
+    ("Cauchy", "pdf", cauchy_pdf, 1.0, (0.0, 1.5964408626741079e-156)),
+    ("Cauchy", "pdf", cauchy_pdf, -1.0526400784889074e-149,
+     (-1.544588230990011e-306, 2.7095703631517262e-308)),
+    # log-location laws: the density's exponential a denormal, or x - threshold
+    ("LogNormal", "pdf", lognormal_pdf, 2.4810362888284172e-209, (0.0, 12.768567959951023, 4.026860469853848e-300)),
+    ("LogNormal", "lower", lognormal_lower, 3.0e-308, (-709.0, 3.0, 2.9e-308)),
+    ("LogNormal", "pdf", lognormal_pdf, 3.0e-308, (-709.0, 3.0, 2.9e-308)),
+    ("LogLogistic", "pdf", loglogistic_pdf, 1.0245245727225631e-296,
+     (-6.4484979766699855e+294, 1.1990247826772936e+293, 0.0)),
+    ("LogLogistic", "pdf", loglogistic_pdf, 1.4820997406370666e-134,
+     (0.0, 0.43285941602240696, -1.679309491436181e-299)),
+    ("LogLogistic", "pdf", loglogistic_pdf, 3.0e-308, (-709.0, 3.0, 2.9e-308)),
+    ("LogLogistic", "lower", loglogistic_lower, 2.6953166358980291e-308,
+     (-7.0063660239102738e-301, 174.73521805331941, 0.0)),
+    ("LogLogistic", "lower", loglogistic_lower, 3.0e-308, (-709.0, 3.0, 2.9e-308)),
+    # half-normal quantile of p near DBL_MIN
+    ("HalfNormal", "inv", halfnormal_inv, 2.3807828932272925e-308,
+     (1.6047995271775233e+288, 3.1101496755184713e-292)),
+    ("HalfNormal", "inv", halfnormal_inv, 3.0e-300, (1.0, 0.0)),
+    ("HalfNormal", "inv", halfnormal_inv, 9.9e-9, (1.0, 0.0)),
+]
+
+
+def main():
+    out = os.path.join(os.path.dirname(__file__), "..", "..", "tests", "data", "daz_cases.csv")
+    with open(out, "w") as f:
+        f.write("# family,function,x,param1,param2,param3,param4,expected\n")
+        f.write("# generated by tools/reference/gen_daz_cases.py with mpmath %s\n"
+                % mpmath.__version__)
+        for family, function, evaluate, x, params in CASES:
+            value = evaluate(mpf(x), *[mpf(p) for p in params])
+            padded = list(params) + [0.0] * (4 - len(params))
+            f.write("%s,%s,%r,%s,%s\n" % (family, function, x, ",".join(repr(p) for p in padded),
+                                          mpmath.nstr(value, 20, min_fixed=0, max_fixed=0)))
+
+
+if __name__ == "__main__":
+    main()
