@@ -64,6 +64,7 @@ const std::map<std::string, Exported>& exported() {
       QEL_TEST_FAMILY(Logistic, p[0], p[1]),
       QEL_TEST_FAMILY(LogLogistic, p[0], p[1], p[2]),
       QEL_TEST_FAMILY(Cauchy, p[0], p[1]),
+      QEL_TEST_FAMILY(Triangular, p[0], p[1], p[2]),
       QEL_TEST_FAMILY(Gamma, p[0], p[1], p[2]),
       QEL_TEST_FAMILY(Beta, p[0], p[1]),
       QEL_TEST_FAMILY(Lambda, p[0], p[1], p[2]),

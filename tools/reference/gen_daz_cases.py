@@ -76,6 +76,36 @@ def halfnormal_inv(p, s, m):
     return m + s * mpmath.sqrt(2) * mpmath.erfinv(p)
 
 
+def weibull_lower(x, k, s, t):
+    return -mpmath.expm1(-((x - t) / s) ** k)
+
+
+def weibull_upper(x, k, s, t):
+    return mpmath.exp(-((x - t) / s) ** k)
+
+
+def weibull_pdf(x, k, s, t):
+    z = (x - t) / s
+    return k / s * z ** (k - 1) * mpmath.exp(-z ** k)
+
+
+def triangular_pdf(x, a, c, b):
+    return 2 * (x - a) / ((b - a) * (c - a)) if x <= c else 2 * (b - x) / ((b - a) * (b - c))
+
+
+def triangular_lower(x, a, c, b):
+    return (x - a) ** 2 / ((b - a) * (c - a)) if x <= c else 1 - (b - x) ** 2 / ((b - a) * (b - c))
+
+
+def gamma_pdf(x, a, s, t):
+    z = (x - t) / s
+    return z ** (a - 1) * mpmath.exp(-z) / (mpmath.gamma(a) * s)
+
+
+def gamma_lower(x, a, s, t):
+    return mpmath.gammainc(a, 0, (x - t) / s, regularized=True)
+
+
 # family, function, evaluator, x, parameters
 CASES = [
     # x halved to a denormal before the subtraction of the location
@@ -114,6 +144,29 @@ CASES = [
     ("LogLogistic", "lower", loglogistic_lower, 2.6953166358980291e-308,
      (-7.0063660239102738e-301, 174.73521805331941, 0.0)),
     ("LogLogistic", "lower", loglogistic_lower, 3.0e-308, (-709.0, 3.0, 2.9e-308)),
+    # power laws at a standardized argument below DBL_MIN, or whose factors are
+    ("Weibull", "lower", weibull_lower, 2.9558562842256503e-308,
+     (0.025839829030722281, 1342986005.0040157, 0.0)),
+    ("Weibull", "upper", weibull_upper, 1e-300, (0.01, 1e10, 0.0)),
+    ("Weibull", "upper", weibull_upper, 3e-308, (0.01, 1.0, 2.9e-308)),
+    ("Weibull", "pdf", weibull_pdf, 1.0, (2.8903478539817369e-20, 5.5147281529406885e-304, 0.0)),
+    ("Weibull", "pdf", weibull_pdf, 1.0, (8.2313743433513721e-10, 1.5196236299203994e-305, 0.0)),
+    ("Weibull", "pdf", weibull_pdf, 1e-300, (0.01, 1e10, 0.0)),
+    ("Gamma", "lower", gamma_lower, 0.0, (4.2720075134275361e-09, 1.513105514636204e+293,
+                                         -8.1012355155176444e-18)),
+    ("Gamma", "lower", gamma_lower, 3e-308, (0.01, 1.0, 2.9e-308)),
+    ("Gamma", "pdf", gamma_pdf, 7.240621110612097e-302, (47.241981546893363, 6.8828880326286284e-307,
+                                                         7.2406211102104068e-302)),
+    ("Gamma", "pdf", gamma_pdf, 4.0481675119277009e-308, (6.7336322488588599e-294,
+                                                         6.9469279971557361e-292, 2.2764572926738004e-308)),
+    ("Gamma", "pdf", gamma_pdf, 3e-308, (0.5, 1.0, 0.0)),
+    # triangles whose distances are denormals
+    ("Triangular", "pdf", triangular_pdf, -4.4018151276262953e-303,
+     (-4.401815127626904e-303, 0.0, 1.1493354733635594e-20)),
+    ("Triangular", "lower", triangular_lower, -3.4363915345574147e-308,
+     (-4.6284063013592482e-308, 0.0, 1e-300)),
+    ("Triangular", "upper", lambda x, a, c, b: 1 - triangular_lower(x, a, c, b),
+     6.0599557837086769e-305, (0.0, 1.7479912708957472e-306, 6.0602293716655037e-305)),
     # half-normal quantile of p near DBL_MIN
     ("HalfNormal", "inv", halfnormal_inv, 2.3807828932272925e-308,
      (1.6047995271775233e+288, 3.1101496755184713e-292)),

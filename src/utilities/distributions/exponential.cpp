@@ -128,12 +128,38 @@ double mSmallestExtremeValueInvCdf(double p, double location, double scale) {
 
 // --- Weibull ---------------------------------------------------------------
 
+namespace {
+
+// log z for z = (x - threshold) / scale below DBL_MIN: z itself is a
+// denormal or 0, which the armed state reads as zero, while z^shape may be
+// of order one for a small shape. |log z| > 708 exceeds the rounding of the
+// two logarithms (up to 1416 ulp of 1) by 708 to 1.
+double logTinyStandardized(double x, double threshold, double scale) {
+  return mLogOfDifference(x, threshold) - mLog(scale, true);
+}
+
+}  // namespace
+
+// shape z^(shape - 1) exp(-z^shape) / scale; where that product or a factor
+// of it is below DBL_MIN (a denormal, read as zero by the armed state) while
+// the density need not be, it is formed as shape z^shape exp(-z^shape) /
+// (x - threshold) in one exponential.
 double mWeibullPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
   try {
     const double z = mStandardize(x, threshold, scale);
-    const double zShape = mRaiseToPower(z, shape, true);
-    return shape * mExponential(-zShape, true) * mRaiseToPower(z, shape - 1.0, true) / scale;
+    if (!(z < DBL_MIN)) {
+      const double zShape = mRaiseToPower(z, shape, true);
+      const double density =
+          shape * mExponential(-zShape, true) * mRaiseToPower(z, shape - 1.0, true) / scale;
+      if (!(density < DBL_MIN)) return density;
+    }
+    const double logZShape =
+        shape * (z < DBL_MIN ? logTinyStandardized(x, threshold, scale) : mLog(z, true));
+    if (logZShape > 700.0) return 0.0;
+    return mExponential(mLog(shape, true) + logZShape - mExponential(logZShape, true) -
+                            mLogOfDifference(x, threshold),
+                        true);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -143,7 +169,10 @@ double mWeibullCdf(double x, double shape, double scale, double threshold, bool 
   if (x <= threshold) return upperTail ? 1.0 : 0.0;
   try {
     const double z = mStandardize(x, threshold, scale);
-    return mExponentialCdf(mRaiseToPower(z, shape, true), 1.0, 0.0, upperTail);
+    const double zShape = z < DBL_MIN
+                              ? mExponential(shape * logTinyStandardized(x, threshold, scale), true)
+                              : mRaiseToPower(z, shape, true);
+    return mExponentialCdf(zShape, 1.0, 0.0, upperTail);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
