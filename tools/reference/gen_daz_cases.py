@@ -106,6 +106,34 @@ def gamma_lower(x, a, s, t):
     return mpmath.gammainc(a, 0, (x - t) / s, regularized=True)
 
 
+def lambda_q(p, lam):
+    return (p ** lam - (1 - p) ** lam) / lam
+
+
+def lambda_lower(x, lam, m, s):
+    z = (x - m) / s
+    return mpmath.findroot(lambda p: lambda_q(p, lam) - z, (mpf("0.01"), mpf("0.99")),
+                           solver="anderson")
+
+
+def lambda_pdf(x, lam, m, s):
+    # The lower tail by bisection on ln p (p near DBL_MIN), then 1 / (s Q'(p)).
+    z = (x - m) / s
+    lo, hi = mpf(-800), mpf(0)
+    for _ in range(400):
+        mid = (lo + hi) / 2
+        if lambda_q(mpmath.exp(mid), lam) < z:
+            lo = mid
+        else:
+            hi = mid
+    p = mpmath.exp(lo)
+    return 1 / (s * (p ** (lam - 1) + (1 - p) ** (lam - 1)))
+
+
+def lambda_inv(p, lam, m, s):
+    return m + s * lambda_q(p, lam)
+
+
 # family, function, evaluator, x, parameters
 CASES = [
     # x halved to a denormal before the subtraction of the location
@@ -167,6 +195,16 @@ CASES = [
      (-4.6284063013592482e-308, 0.0, 1e-300)),
     ("Triangular", "upper", lambda x, a, c, b: 1 - triangular_lower(x, a, c, b),
      6.0599557837086769e-305, (0.0, 1.7479912708957472e-306, 6.0602293716655037e-305)),
+    # Tukey's lambda near the logistic limit (cancellation of the two powers)
+    ("Lambda", "lower", lambda_lower, 1e-20, (-5.7e-10, 0.0, 1.0)),
+    ("Lambda", "lower", lambda_lower, 0.3, (-5.7e-10, 0.0, 1.0)),
+    ("Lambda", "lower", lambda_lower, -2.0, (3e-7, 0.0, 1.0)),
+    ("Lambda", "inv", lambda_inv, 0.7, (-5.7e-10, 0.0, 1.0)),
+    ("Lambda", "pdf", lambda_pdf, -3.0235063223401205e-303,
+     (5.9455461767232063e-05, 0.0, 4.3597161913404916e-306)),
+    ("Lambda", "pdf", lambda_pdf, -7.9824253787397542e-293,
+     (5.9091569057107785e-05, -3.2517227586458728e-293, 6.829449207653109e-296)),
+    ("Lambda", "inv", lambda_inv, 0.5000001, (2e-5, 0.0, 1.0)),
     # half-normal quantile of p near DBL_MIN
     ("HalfNormal", "inv", halfnormal_inv, 2.3807828932272925e-308,
      (1.6047995271775233e+288, 3.1101496755184713e-292)),
