@@ -188,6 +188,9 @@ CASES = [
     ("Gamma", "pdf", gamma_pdf, 4.0481675119277009e-308, (6.7336322488588599e-294,
                                                          6.9469279971557361e-292, 2.2764572926738004e-308)),
     ("Gamma", "pdf", gamma_pdf, 3e-308, (0.5, 1.0, 0.0)),
+    ("ChiSq", "pdf", lambda x, df: gamma_pdf(x, df / 2, 2, 0), 2.712169407751571e-308,
+     (2.2250738585072014e-308,)),
+    ("ChiSq", "pdf", lambda x, df: gamma_pdf(x, df / 2, 2, 0), 0.5, (3.5007499691819397e-308,)),
     # triangles whose distances are denormals
     ("Triangular", "pdf", triangular_pdf, -4.4018151276262953e-303,
      (-4.401815127626904e-303, 0.0, 1.1493354733635594e-20)),

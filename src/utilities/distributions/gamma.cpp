@@ -261,6 +261,10 @@ double mGammaInvCdfByRootFinder(double p, double shape, double start) {
 
 double mChiSqPdf(double x, double df) {
   if (x <= 0.0) return 0.0;
+  // Below df = 2 DBL_MIN the shape df/2 is a denormal, zero to the armed
+  // state. There 1/Gamma(a) = a (1 + O(a)), x^a = 2^a = 1 to within |a ln x|
+  // < 1e-305: the density is (df/2) exp(-x/2) / x.
+  if (df < 2.0 * DBL_MIN) return 0.5 * (df / x) * mExponential(-0.5 * x, false);
   try {
     return saddle::gammaDensity(x, df / 2.0, 2.0);
   } catch (const std::runtime_error&) {
