@@ -74,9 +74,14 @@ double newtonPolished(CmLambdaTransform& f, double p, double lambda, double a, d
       // in the armed state, so p kept a 1e-308 search's error: densities
       // 3.5% off at scale 4e-306): the step is taken in ln p, with slope
       // p Q'(p) = p^lambda + p (1 - p)^(lambda - 1).
+      // Checked exponentials: p^lambda may pass DBL_MAX (a large negative
+      // lambda), and a step beyond 50 in ln p ends the polish.
       const double u = std::log(p);
-      const double slope = std::exp(lambda * u) + p * mRaiseToPower(1.0 - p, lambda - 1.0, true);
-      next = std::exp(u - residual / slope);
+      const double slope =
+          mExponential(lambda * u, false) + p * mRaiseToPower(1.0 - p, lambda - 1.0, true);
+      const double step = residual / slope;
+      if (!(std::fabs(step) < 50.0)) break;
+      next = std::exp(u - step);
     } else {
       const double slope =
           mRaiseToPower(p, lambda - 1.0, true) + mRaiseToPower(1.0 - p, lambda - 1.0, true);
@@ -135,8 +140,10 @@ double mLambdaPdf(double x, double lambda, double location, double scale) {
     const double right = mRaiseToPower(1.0 - p, lambda - 1.0, false);
     if (left >= DBL_MAX / 4.0 || right >= DBL_MAX / 4.0) return 0.0;
     // One division by the product where the scale is below 1: 1 / (left +
-    // right) alone may be a denormal (read as zero in the armed state).
-    result = scale < 1.0 ? 1.0 / ((left + right) * scale) : 1.0 / (left + right) / scale;
+    // right) alone may be a denormal (read as zero in the armed state); the
+    // product itself must stay normal.
+    const double sum = left + right;
+    result = scale < 1.0 && sum * scale >= DBL_MIN ? 1.0 / (sum * scale) : 1.0 / sum / scale;
   } catch (const std::runtime_error&) {
   } catch (const std::invalid_argument&) {
   }
