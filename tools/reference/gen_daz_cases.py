@@ -198,6 +198,14 @@ CASES = [
      (-4.6284063013592482e-308, 0.0, 1e-300)),
     ("Triangular", "upper", lambda x, a, c, b: 1 - triangular_lower(x, a, c, b),
      6.0599557837086769e-305, (0.0, 1.7479912708957472e-306, 6.0602293716655037e-305)),
+    # Weibull quantile at a shape near DBL_MIN: the power 1/shape times ln of
+    # the exponential quantile is beyond the double range, the power is 0
+    ("Weibull", "inv", lambda p, k, s, t: t + s * (-mpmath.log1p(-p)) ** (1 / k),
+     5.3920304067076338e-308, (7.8545665011295746e-307, 3.896954887840462e-306, 3.7616079586972858e-301)),
+    ("Weibull", "inv", lambda p, k, s, t: t + s * (-mpmath.log1p(-p)) ** (1 / k),
+     0.5, (3.490743200181776e-307, 6.3941386039783052e-301, 7.1297464610297577e-18)),
+    ("Weibull", "inv", lambda p, k, s, t: t + s * (-mpmath.log1p(-p)) ** (1 / k),
+     1.0068950532784466e-306, (0.99373150737884608, 1.3616274618262274e+293, 0.0)),
     # Tukey's lambda near the logistic limit (cancellation of the two powers)
     ("Lambda", "lower", lambda_lower, 1e-20, (-5.7e-10, 0.0, 1.0)),
     ("Lambda", "lower", lambda_lower, 0.3, (-5.7e-10, 0.0, 1.0)),

@@ -182,7 +182,15 @@ double mWeibullInvCdf(double p, double shape, double scale, double threshold) {
   if (p == 0.0) return threshold;
   if (p == 1.0) return mGetMissingValueCode();
   try {
-    return threshold + scale * mRaiseToPower(minusLogComplement(p), 1.0 / shape, true);
+    const double w = minusLogComplement(p);
+    const double power = mRaiseToPower(w, 1.0 / shape, true);
+    // A standard quantile below DBL_MIN is a denormal, zero to the armed
+    // state, although times a large scale it may be normal: the scale joins
+    // the power's exponent.
+    if (power < DBL_MIN && w >= DBL_MIN && scale > 1.0) {
+      return threshold + mExponential(mLog(scale, true) + mLog(w, true) / shape, true);
+    }
+    return threshold + scale * power;
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
