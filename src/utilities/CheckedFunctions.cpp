@@ -61,6 +61,18 @@ double mLog10(double x, bool throwOnError) {
   throw std::runtime_error(kFloatOverflow);
 }
 
+namespace {
+
+// True when power * ln(base), base > 0, is beyond the double range (a power
+// near DBL_MAX, such as 1/shape of a Weibull shape of 1e-306): forming it
+// would trap in the armed state although the power is then 0 or beyond
+// DBL_MAX, as the sign of the product says.
+bool powerLogOverflows(double base, double power) {
+  return std::fabs(power) > 1.0 && std::fabs(std::log(base)) > DBL_MAX / std::fabs(power);
+}
+
+}  // namespace
+
 double mRaiseToPower(double base, double power, bool throwOnError) {
   if (base == 0.0) {
     if (power > 0.0) return 0.0;
@@ -68,6 +80,9 @@ double mRaiseToPower(double base, double power, bool throwOnError) {
     throw std::invalid_argument("zero raised to a negative power");
   }
   if (base > 0.0) {
+    if (powerLogOverflows(base, power)) {
+      return (power > 0.0) == (base > 1.0) ? mHandleOverflow(throwOnError) : 0.0;
+    }
     const double t = power * std::log(base);
     if (t < -MAX_EXPONENT) return 0.0;
     if (t > MAX_EXPONENT) return mHandleOverflow(throwOnError);
@@ -76,6 +91,11 @@ double mRaiseToPower(double base, double power, bool throwOnError) {
   const double n = mNearestInteger(power);
   if (!mEqualWithinFuzz(power, n, 0.0)) {
     throw std::invalid_argument("negative number raised to a noninteger power");
+  }
+  if (powerLogOverflows(-base, power)) {
+    if ((power > 0.0) != (-base > 1.0)) return 0.0;
+    const double big = mHandleOverflow(throwOnError);
+    return std::fmod(n, 2.0) != 0.0 ? -big : big;
   }
   const double t = power * std::log(-base);
   if (t < -MAX_EXPONENT) return 0.0;

@@ -22,8 +22,10 @@ double mCauchyPdf(double x, double location, double scale) {
   // Divided by the scale last: pi times a scale near DBL_MAX overflows.
   if (std::fabs(z) <= 1.0) return 1.0 / (pi * (1.0 + z * z)) / scale;
   // 1/(1 + z^2) = w^2/(1 + w^2) with w = 1/z: no overflow of z^2.
+  // w / scale = 1 / (z scale) is at most 1 / DBL_MIN; dividing w * w by the
+  // scale would make a denormal of w * w (zero in the armed state) first.
   const double w = 1.0 / z;
-  return w * w / (pi * (1.0 + w * w)) / scale;
+  return w * (w / scale) / (pi * (1.0 + w * w));
 }
 
 namespace {

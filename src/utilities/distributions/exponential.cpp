@@ -44,7 +44,7 @@ double largestExtremeValueQuantile(double minusLogP, double location, double sca
 double mExponentialPdf(double x, double scale, double threshold) {
   try {
     if (x < threshold) return 0.0;
-    return mExponential(-mStandardize(x, threshold, scale), true) / scale;
+    return mExpOverScale(-mStandardize(x, threshold, scale), scale);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -75,7 +75,11 @@ double mExponentialInvCdf(double p, double scale, double threshold) {
 
 double mLargestExtremeValuePdf(double x, double location, double scale) {
   try {
-    const double e = mExponential(-mStandardize(x, location, scale), true);
+    // e exp(-e) / scale; where e or exp(-e) would be a denormal, as the one
+    // exponential exp(-z - e) (see mExpOverScale).
+    const double z = mStandardize(x, location, scale);
+    const double e = mExponential(-z, true);
+    if (-z < -700.0 || e > 700.0) return mExpOverScale(-z - e, scale);
     return e * mExponential(-e, true) / scale;
   } catch (const std::runtime_error&) {
     return 0.0;
@@ -124,12 +128,38 @@ double mSmallestExtremeValueInvCdf(double p, double location, double scale) {
 
 // --- Weibull ---------------------------------------------------------------
 
+namespace {
+
+// log z for z = (x - threshold) / scale below DBL_MIN: z itself is a
+// denormal or 0, which the armed state reads as zero, while z^shape may be
+// of order one for a small shape. |log z| > 708 exceeds the rounding of the
+// two logarithms (up to 1416 ulp of 1) by 708 to 1.
+double logTinyStandardized(double x, double threshold, double scale) {
+  return mLogOfDifference(x, threshold) - mLog(scale, true);
+}
+
+}  // namespace
+
+// shape z^(shape - 1) exp(-z^shape) / scale; where that product or a factor
+// of it is below DBL_MIN (a denormal, read as zero by the armed state) while
+// the density need not be, it is formed as shape z^shape exp(-z^shape) /
+// (x - threshold) in one exponential.
 double mWeibullPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
   try {
     const double z = mStandardize(x, threshold, scale);
-    const double zShape = mRaiseToPower(z, shape, true);
-    return shape * mExponential(-zShape, true) * mRaiseToPower(z, shape - 1.0, true) / scale;
+    if (!(z < DBL_MIN)) {
+      const double zShape = mRaiseToPower(z, shape, true);
+      const double density =
+          shape * mExponential(-zShape, true) * mRaiseToPower(z, shape - 1.0, true) / scale;
+      if (!(density < DBL_MIN)) return density;
+    }
+    const double logZShape =
+        shape * (z < DBL_MIN ? logTinyStandardized(x, threshold, scale) : mLog(z, true));
+    if (logZShape > 700.0) return 0.0;
+    return mExponential(mLog(shape, true) + logZShape - mExponential(logZShape, true) -
+                            mLogOfDifference(x, threshold),
+                        true);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -139,7 +169,10 @@ double mWeibullCdf(double x, double shape, double scale, double threshold, bool 
   if (x <= threshold) return upperTail ? 1.0 : 0.0;
   try {
     const double z = mStandardize(x, threshold, scale);
-    return mExponentialCdf(mRaiseToPower(z, shape, true), 1.0, 0.0, upperTail);
+    const double zShape = z < DBL_MIN
+                              ? mExponential(shape * logTinyStandardized(x, threshold, scale), true)
+                              : mRaiseToPower(z, shape, true);
+    return mExponentialCdf(zShape, 1.0, 0.0, upperTail);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -149,7 +182,15 @@ double mWeibullInvCdf(double p, double shape, double scale, double threshold) {
   if (p == 0.0) return threshold;
   if (p == 1.0) return mGetMissingValueCode();
   try {
-    return threshold + scale * mRaiseToPower(minusLogComplement(p), 1.0 / shape, true);
+    const double w = minusLogComplement(p);
+    const double power = mRaiseToPower(w, 1.0 / shape, true);
+    // A standard quantile below DBL_MIN is a denormal, zero to the armed
+    // state, although times a large scale it may be normal: the scale joins
+    // the power's exponent.
+    if (power < DBL_MIN && w >= DBL_MIN && scale > 1.0) {
+      return threshold + mExponential(mLog(scale, true) + mLog(w, true) / shape, true);
+    }
+    return threshold + scale * power;
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -159,7 +200,7 @@ double mWeibullInvCdf(double p, double shape, double scale, double threshold) {
 
 double mLaplacePdf(double x, double location, double scale) {
   try {
-    return mExponential(-std::fabs(mStandardize(x, location, scale)), true) / (2.0 * scale);
+    return 0.5 * mExpOverScale(-std::fabs(mStandardize(x, location, scale)), scale);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }

@@ -119,16 +119,17 @@ double centralChiSqQuantile(double p, double df) {
   return searchUpwardFromZero(f, q);
 }
 
-// Both tails at a tiny shape or a tiny standardized argument z = x/scale,
-// whose logarithm is taken from x and the scale where z itself falls below
-// the normal range (the armed state reads such a z as 0).
-bool smallShapeGammaTails(double shape, double z, double x, double scale, bool fromOrigin,
+// Both tails at a tiny shape or a tiny standardized argument z = (x -
+// threshold)/scale, whose logarithm is taken from x, the threshold and the
+// scale where z itself falls below the normal range (the armed state reads
+// such a z as 0).
+bool smallShapeGammaTails(double shape, double z, double x, double scale, double threshold,
                           double* lower, double* upper) {
   double lz;
   if (z >= DBL_MIN) {
     lz = std::log(z);
-  } else if (fromOrigin && x >= DBL_MIN && scale >= DBL_MIN && std::isfinite(scale)) {
-    lz = std::log(x) - std::log(scale);
+  } else if (x > threshold && scale >= DBL_MIN && std::isfinite(scale)) {
+    lz = mLogOfDifference(x, threshold) - std::log(scale);
   } else {
     return false;
   }
@@ -199,11 +200,24 @@ double CmChiSqCdf::operator()(double x) {
 double mGammaPdf(double x, double shape, double scale, double threshold) {
   if (x <= threshold) return 0.0;
   // Loader's saddle-point form keeps the density's digits for large shapes;
-  // a distance x - threshold beyond DBL_MAX leaves a density of 0.
-  const double half = 0.5 * x - 0.5 * threshold;
-  if (half > 0.5 * DBL_MAX) return 0.0;
+  // a distance x - threshold beyond DBL_MAX leaves a density of 0. The
+  // distance is halved only where it could overflow: half of an x near
+  // DBL_MIN is a denormal, which the armed state reads as zero.
+  double distance = x - threshold;
+  if (std::fabs(x) > 0.5 * DBL_MAX || std::fabs(threshold) > 0.5 * DBL_MAX) {
+    const double half = 0.5 * x - 0.5 * threshold;
+    if (half > 0.5 * DBL_MAX) return 0.0;
+    distance = 2.0 * half;
+  }
   try {
-    return saddle::gammaDensity(2.0 * half, shape, scale);
+    // A distance below DBL_MIN (read as zero) goes in with the scale, both
+    // times 2^106; the density per unit of the smaller scale is 2^106 times
+    // as large.
+    if (distance < DBL_MIN && scale < 1e250) {
+      return saddle::gammaDensity(x * 0x1p106 - threshold * 0x1p106, shape, scale * 0x1p106) *
+             0x1p106;
+    }
+    return saddle::gammaDensity(distance, shape, scale);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   } catch (const std::invalid_argument&) {
@@ -217,7 +231,7 @@ double mGammaCdf(double x, double shape, double scale, double threshold, bool up
   const double z = mStandardize(x, threshold, scale);
   if ((std::islessequal(shape, smallshape::kTinyShape) ||
        std::isless(z, smallshape::kTinyArgument)) &&
-      smallShapeGammaTails(shape, z, x, scale, threshold == 0.0, &lower, &upper)) {
+      smallShapeGammaTails(shape, z, x, scale, threshold, &lower, &upper)) {
     return upperTail ? upper : lower;
   }
   if (gammaratio::fastTails(shape, z, &lower, &upper)) return upperTail ? upper : lower;
@@ -258,6 +272,10 @@ double mGammaInvCdfByRootFinder(double p, double shape, double start) {
 
 double mChiSqPdf(double x, double df) {
   if (x <= 0.0) return 0.0;
+  // Below df = 2 DBL_MIN the shape df/2 is a denormal, zero to the armed
+  // state. There 1/Gamma(a) = a (1 + O(a)), x^a = 2^a = 1 to within |a ln x|
+  // < 1e-305: the density is (df/2) exp(-x/2) / x.
+  if (df < 2.0 * DBL_MIN) return 0.5 * (df / x) * mExponential(-0.5 * x, false);
   try {
     return saddle::gammaDensity(x, df / 2.0, 2.0);
   } catch (const std::runtime_error&) {
@@ -279,7 +297,7 @@ bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double*
   }
   if (noncentrality == 0.0 &&
       (std::islessequal(df, 2.0 * smallshape::kTinyShape) || x < 2.0 * smallshape::kTinyArgument) &&
-      smallShapeGammaTails(df < 2.0 * DBL_MIN ? df : df / 2.0, x / 2.0, x, 2.0, true, lower,
+      smallShapeGammaTails(df < 2.0 * DBL_MIN ? df : df / 2.0, x / 2.0, x, 2.0, 0.0, lower,
                            upper)) {
     if (df < 2.0 * DBL_MIN) {
       // df/2 below the normal range (read as 0 when armed), taken doubled:

@@ -18,9 +18,12 @@ namespace qel {
 
 double mLogisticPdf(double x, double location, double scale) {
   try {
-    const double e = mExponential(-mStandardize(x, location, scale), true);
-    if (e == 0.0) return 0.0;
-    return 1.0 / (1.0 / e + 2.0 + e) / scale;
+    // The density is even in z: e = exp(-|z|) <= 1 cannot overflow, and
+    // where e is a denormal (1 + e)^2 = 1 leaves e / scale (mExpOverScale).
+    const double t = -std::fabs(mStandardize(x, location, scale));
+    if (t < -700.0) return mExpOverScale(t, scale);
+    const double e = mExponential(t, true);
+    return e / ((1.0 + e) * (1.0 + e)) / scale;
   } catch (const std::runtime_error&) {
     // exp(-z) overflowed: x lies far below the location.
     return 0.0;
@@ -53,15 +56,19 @@ double mLogisticInvCdf(double p, double location, double scale) {
   }
 }
 
-// ln(x - threshold) from the halves, so that a distance beyond DBL_MAX
-// (x = DBL_MAX, threshold = -1e300) reaches no overflow; *half is half the
-// distance.
-double logDistance(double x, double threshold, double* half) {
-  *half = 0.5 * x - 0.5 * threshold;
-  return mLog(*half, true) + 0.69314718055994530942;
-}
-
 namespace {
+
+// density / (x - threshold) without an overflow of the distance (x = DBL_MAX,
+// threshold = -1e300: from the halves) and without a denormal one, which the
+// armed state reads as zero (from terms scaled by 2^106).
+double perDistance(double density, double x, double threshold) {
+  if (std::fabs(x) > DBL_MAX / 2.0 || std::fabs(threshold) > DBL_MAX / 2.0) {
+    return density / (0.5 * x - 0.5 * threshold) / 2.0;
+  }
+  const double distance = x - threshold;
+  if (distance < DBL_MIN) return density * 0x1p106 / (x * 0x1p106 - threshold * 0x1p106);
+  return density / distance;
+}
 
 const DoubleDouble kLn2 = {0.69314718055994530942, 2.3190468138462996e-17};
 
@@ -115,17 +122,27 @@ double mLogLogisticPdf(double x, double location, double scale, double threshold
   if (x <= threshold) return 0.0;
   double precise = 0.0;
   if (logLogisticDensity(x, location, scale, threshold, &precise)) return precise;
-  double half = 0.0;
-  const double u = logDistance(x, threshold, &half);
+  const double u = mLogOfDifference(x, threshold);
   const double density = mLogisticPdf(u, location, scale);
   if (mIsNumericMissing(density)) return density;
-  return density / half / 2.0;
+  // A logistic density below DBL_MIN is a denormal, read as zero by the
+  // armed state, although divided by a small distance it may be normal: the
+  // density e / (scale (1 + e)^2), e = exp(t), and 1 / (x - threshold) =
+  // exp(-u) join in one exponential (mExpOverScale).
+  if (density < DBL_MIN) {
+    const double t = -std::fabs(mStandardize(u, location, scale));
+    try {
+      return mExpOverScale(t - u - 2.0 * std::log1p(std::exp(t)), scale);
+    } catch (const std::runtime_error&) {
+      return mGetMissingValueCode();
+    }
+  }
+  return perDistance(density, x, threshold);
 }
 
 double mLogLogisticCdf(double x, double location, double scale, double threshold, bool upperTail) {
   if (x <= threshold) return upperTail ? 1.0 : 0.0;
-  double half = 0.0;
-  return mLogisticCdf(logDistance(x, threshold, &half), location, scale, upperTail);
+  return mLogisticCdf(mLogOfDifference(x, threshold), location, scale, upperTail);
 }
 
 // A quantile beyond the double range (exp of a logit times a scale of 1e6,

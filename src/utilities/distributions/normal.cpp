@@ -56,10 +56,22 @@ double CmStandardNormalCdf::operator()(double x) {
 
 // --- Normal ----------------------------------------------------------------
 
+namespace {
+
+// exp(t) / (sqrt(2 pi) scale) by mExpOverScale: the root joins the scale
+// (the quotient may be near DBL_MAX while exp(t) / scale is above it),
+// unless their product would overflow.
+double normalDensityOverScale(double t, double scale) {
+  const double root = std::sqrt(mGetPi() + mGetPi());
+  return scale < 1e300 ? mExpOverScale(t, root * scale) : mExpOverScale(t, scale) / root;
+}
+
+}  // namespace
+
 double mNormalPdf(double x, double mean, double sigma) {
   try {
     const double z = mStandardize(x, mean, sigma);
-    return mExponential(-z * z / 2.0, true) / (std::sqrt(mGetPi() + mGetPi()) * sigma);
+    return normalDensityOverScale(-z * z / 2.0, sigma);
   } catch (const std::runtime_error&) {
     return 0.0;
   }
@@ -146,8 +158,13 @@ double mNormalCritValue(double alpha, EAlternative alternative) {
 double mLogNormalPdf(double x, double location, double scale, double threshold) {
   if (x <= threshold) return 0.0;
   try {
-    const double u = mLog(x - threshold, true);
-    return mNormalPdf(u, location, scale) / (x - threshold);
+    // phi(z) / (scale (x - threshold)) with 1 / (x - threshold) = exp(-u)
+    // inside the one exponential: the normal density alone may be a denormal
+    // (read as zero in the armed state) where the quotient is not.
+    const double u = mLogOfDifference(x, threshold);
+    const double z = mStandardize(u, location, scale);
+    if (std::fabs(z) > 1e150) return 0.0;
+    return normalDensityOverScale(-z * z / 2.0 - u, scale);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -156,7 +173,7 @@ double mLogNormalPdf(double x, double location, double scale, double threshold) 
 double mLogNormalCdf(double x, double location, double scale, double threshold, bool upperTail) {
   if (x <= threshold) return upperTail ? 1.0 : 0.0;
   try {
-    return mNormalCdf(mLog(x - threshold, true), location, scale, upperTail);
+    return mNormalCdf(mLogOfDifference(x, threshold), location, scale, upperTail);
   } catch (const std::runtime_error&) {
     return mGetMissingValueCode();
   }
@@ -210,6 +227,10 @@ namespace {
 // relative error in the start; each step squares it. At p near DBL_MIN the
 // start is 0 and the first step lands on the linear term p sqrt(pi/2).
 double halfNormalSmallQuantile(double p) {
+  // Below p = 1e-8, erf(z / sqrt 2) = z sqrt(2/pi) (1 - z^2/6) leaves z =
+  // p sqrt(pi/2) to rounding; Newton there would form z / sqrt 2, a denormal
+  // near p = DBL_MIN that the armed state reads as zero (2x the quantile).
+  if (p < 1e-8) return p * 1.2533141373155002512;
   const double start = standardNormalQuantile((1.0 + p) / 2.0);
   if (mIsNumericMissing(start)) return start;
   double z = start;

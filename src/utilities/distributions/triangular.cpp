@@ -3,6 +3,7 @@
 // Products of two distances (up to 1e308 each) would overflow; every form
 // below divides a distance by a larger one first, so that wide triangles
 // answer as narrow ones do.
+#include <cfloat>
 #include <cmath>
 
 #include "utilities/CheckedFunctions.h"
@@ -11,11 +12,29 @@
 
 namespace qel {
 
+namespace {
+
+// (a - b) / (c - d) for a >= b, c > d. A difference below DBL_MIN is a
+// denormal, which the armed state reads as zero, although the ratio may be
+// of order one (x = -4.4018151276262953e-303 just above lower
+// -4.401815127626904e-303); small operands are then scaled by 2^106 first.
+double distanceRatio(double a, double b, double c, double d) {
+  const double numerator = a - b, denominator = c - d;
+  if ((numerator < DBL_MIN || denominator < DBL_MIN) &&
+      std::fmax(std::fmax(std::fabs(a), std::fabs(b)), std::fmax(std::fabs(c), std::fabs(d))) <
+          1e200) {
+    return (a * 0x1p106 - b * 0x1p106) / (c * 0x1p106 - d * 0x1p106);
+  }
+  return numerator / denominator;
+}
+
+}  // namespace
+
 double mTriangularPdf(double x, double lower, double mode, double upper) {
   if (x > upper || x < lower) return 0.0;
-  if (x > mode) return 2.0 * ((upper - x) / (upper - mode)) / (upper - lower);
+  if (x > mode) return 2.0 * distanceRatio(upper, x, upper, mode) / (upper - lower);
   if (x == mode) return 2.0 / (upper - lower);
-  return 2.0 * ((x - lower) / (mode - lower)) / (upper - lower);
+  return 2.0 * distanceRatio(x, lower, mode, lower) / (upper - lower);
 }
 
 // The tail on the far side of the mode is 1 - a^2/(b c) with a, b, c the
@@ -25,17 +44,14 @@ double mTriangularPdf(double x, double lower, double mode, double upper) {
 double mTriangularCdf(double x, double lower, double mode, double upper, bool upperTail) {
   if (x <= lower) return upperTail ? 1.0 : 0.0;
   if (x >= upper) return upperTail ? 0.0 : 1.0;
-  const double width = upper - lower;
   if (x <= mode) {
-    const double a = x - lower;
-    const double b = mode - lower;
-    if (!upperTail) return (a / width) * (a / b);
-    return (mode - x) / b + (a / b) * ((upper - x) / width);
+    const double aOverB = distanceRatio(x, lower, mode, lower);
+    if (!upperTail) return distanceRatio(x, lower, upper, lower) * aOverB;
+    return distanceRatio(mode, x, mode, lower) + aOverB * distanceRatio(upper, x, upper, lower);
   }
-  const double a = upper - x;
-  const double b = upper - mode;
-  if (upperTail) return (a / width) * (a / b);
-  return (x - mode) / b + (a / b) * ((x - lower) / width);
+  const double aOverB = distanceRatio(upper, x, upper, mode);
+  if (upperTail) return distanceRatio(upper, x, upper, lower) * aOverB;
+  return distanceRatio(x, mode, upper, mode) + aOverB * distanceRatio(x, lower, upper, lower);
 }
 
 namespace {
