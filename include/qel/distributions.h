@@ -21,6 +21,13 @@
 /// never returned. Exceptions: see the contract at RegisterLynSigfpeHandler
 /// in <qel/basic_types.h> (no catch here; a host recovers with catch and
 /// ResetFpuStates()).
+///
+/// Subnormal numbers (magnitude below DBL_MIN = 2.2e-308): the armed state
+/// reads a subnormal operand as zero, so a subnormal argument x or p counts as
+/// a zero of its sign (GammaCdf(1e-308, 1e-139, 1, 0, false) is the value at
+/// 0, namely 0), and a subnormal scale, sigma or df is outside the domain
+/// (NaN). Intermediate quantities are kept away from the subnormal range, so
+/// normal arguments get the full accuracy.
 #ifndef QEL_DISTRIBUTIONS_H
 #define QEL_DISTRIBUTIONS_H
 

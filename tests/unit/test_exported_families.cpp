@@ -161,7 +161,8 @@ TEST(ExportedFamilies, DoublePrecisionFromBodyToFarTails) {
 
 // Points where the armed state's reading of denormal operands as zero broke
 // an answer: arguments, locations and scales near DBL_MIN, and densities
-// whose exponential factor alone is a denormal.
+// whose exponential factor alone is a denormal; and hypergeometric laws of
+// one point, whose mass formula trapped.
 TEST(ExportedFamilies, DenormalIntermediatesKeepTheirValue) {
   const auto rows = qeltest::loadReferenceData("daz_cases.csv", 2);
   for (const auto& row : rows) {

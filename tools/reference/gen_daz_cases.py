@@ -135,6 +135,18 @@ def lambda_inv(p, lam, m, s):
 
 
 # family, function, evaluator, x, parameters
+def hyper_pmf(k, N, M, n):
+    return mpmath.binomial(M, k) * mpmath.binomial(N - M, n - k) / mpmath.binomial(N, n)
+
+
+def hyper_lower(k, N, M, n):
+    return sum(hyper_pmf(mpf(j), N, M, n) for j in range(0, int(k) + 1))
+
+
+def hyper_upper(k, N, M, n):
+    return sum(hyper_pmf(mpf(j), N, M, n) for j in range(int(k), int(min(M, n)) + 1))
+
+
 CASES = [
     # x halved to a denormal before the subtraction of the location
     ("Normal", "lower", normal_lower, 4.3379514771866341e-308, (0.0, 1.096993796349262e-298)),
@@ -221,6 +233,13 @@ CASES = [
      (1.6047995271775233e+288, 3.1101496755184713e-292)),
     ("HalfNormal", "inv", halfnormal_inv, 3.0e-300, (1.0, 0.0)),
     ("HalfNormal", "inv", halfnormal_inv, 9.9e-9, (1.0, 0.0)),
+    # supports of one point: an empty population, M = N, n = N (a trap
+    # inside the mass formula once made these NaN)
+    ("Hypergeometric", "pdf", hyper_pmf, 0.0, (0.0, 0.0, 0.0)),
+    ("Hypergeometric", "lower", hyper_lower, 0.0, (0.0, 0.0, 0.0)),
+    ("Hypergeometric", "upper", hyper_upper, 0.0, (0.0, 0.0, 0.0)),
+    ("Hypergeometric", "pdf", hyper_pmf, 2.0, (5.0, 5.0, 2.0)),
+    ("Hypergeometric", "upper", hyper_upper, 3.0, (7.0, 3.0, 7.0)),
 ]
 
 

@@ -102,6 +102,9 @@ double mHypergeometricPdf(double x, int N, int M, int n) {
   if (!discrete::massPoint(x, &k)) return 0.0;
   const Support s = supportOf(N, M, n);
   if (k < s.lo || k > s.hi) return 0.0;
+  // A support of one point (n = 0, M = 0, M = N, n = N, an empty population)
+  // carries all the mass.
+  if (s.lo == s.hi) return 1.0;
   try {
     return saddle::hypergeometricMass(k, N, M, n);
   } catch (const std::runtime_error&) {
@@ -117,6 +120,7 @@ double mHypergeometricCdf(double x, int N, int M, int n, bool upperTail) {
   const Support s = supportOf(N, M, n);
   if (k < s.lo) return upperTail ? 1.0 : 0.0;
   if (k > s.hi) return upperTail ? 0.0 : 1.0;
+  if (s.lo == s.hi) return 1.0;  // k is the one point of the support
   double fast;
   if (fastHypergeometricTail(k, N, M, n, s, upperTail, &fast)) return fast;
   double lower = 0.0, above = 0.0, mass = 0.0;
