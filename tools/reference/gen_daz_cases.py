@@ -135,6 +135,11 @@ def lambda_inv(p, lam, m, s):
 
 
 # family, function, evaluator, x, parameters
+def t_pdf(x, n, delta):
+    return (mpmath.gamma((n + 1) / 2) / (mpmath.sqrt(n * mpmath.pi) * mpmath.gamma(n / 2))
+            * (1 + x * x / n) ** (-(n + 1) / 2))
+
+
 def hyper_pmf(k, N, M, n):
     return mpmath.binomial(M, k) * mpmath.binomial(N - M, n - k) / mpmath.binomial(N, n)
 
@@ -233,6 +238,10 @@ CASES = [
      (1.6047995271775233e+288, 3.1101496755184713e-292)),
     ("HalfNormal", "inv", halfnormal_inv, 3.0e-300, (1.0, 0.0)),
     ("HalfNormal", "inv", halfnormal_inv, 9.9e-9, (1.0, 0.0)),
+    # central t density at a df whose half is subnormal
+    ("T", "pdf", t_pdf, 1.0, (3.0e-308, 0.0)),
+    ("T", "pdf", t_pdf, 1.0e-154, (3.0e-308, 0.0)),
+    ("T", "pdf", t_pdf, 0.0, (1.0e-300, 0.0)),
     # supports of one point: an empty population, M = N, n = N (a trap
     # inside the mass formula once made these NaN)
     ("Hypergeometric", "pdf", hyper_pmf, 0.0, (0.0, 0.0, 0.0)),
