@@ -237,14 +237,18 @@ double gammaDensity(double d, double shape, double scale) {
   if (!(d > 0.0)) return 0.0;
   const double ls = checkedLog(scale), lz = checkedLog(d) - ls;
   const double z = lz > 708.0 ? HUGE_VAL : lz < -708.0 ? 0.0 : d / scale;
-  const double k = shape < 1.0 ? shape : shape - 1.0;
+  // z^(shape-1) e^-z / Gamma(shape) as the Poisson mass at shape - 1, or, for
+  // a shape below 1 or beyond 2^53 (where shape - 1 rounds), as shape/z times
+  // the mass at shape.
+  const bool byShape = shape < 1.0 || shape >= 0x1p53;
+  const double k = byShape ? shape : shape - 1.0;
   double core = -z, lf = -ls, f = 1.0 / scale;
   if (k > 0.0) {
     core = -stirlerr(k) - deviance(k, z, lz);
     lf -= kLnSqrt2Pi + 0.5 * checkedLog(k);
     f = direct({k, scale}) ? f / std::sqrt(k2Pi * k) : 0.0;
   }
-  if (shape < 1.0) {
+  if (byShape) {
     lf += checkedLog(shape) - lz;
     f = direct({shape, z, scale}) ? f * (shape / z) : 0.0;
   }

@@ -1,0 +1,148 @@
+// Large-parameter helpers (see large_parameters.h).
+#include "utilities/distributions/large_parameters.h"
+
+#include <cfloat>
+#include <cmath>
+
+#include "utilities/distributions/gamma_ratio.h"
+#include "utilities/distributions/saddle_density.h"
+#include "utilities/elv/normal_precise.h"
+
+namespace qel {
+namespace large {
+
+double gammaQuantileStart(double p, double shape) {
+  if (!(p > 0.0 && p < 1.0) || !(shape > 0.0) || std::isinf(shape)) return NAN;
+  const double z = elv::normalQuantile(p);
+  const double c = (1.0 / 9.0) / shape;  // may be subnormal for a near DBL_MAX: read as 0
+  const double t = 1.0 - c + z * std::sqrt(c);
+  if (!(t > 0.0)) return NAN;  // z far below -3 sqrt(a): no cube-root start
+  const double t3 = t * t * t;
+  if (t3 > 1.0 && shape > DBL_MAX / t3) return NAN;
+  return shape * t3;
+}
+
+double logStep(double shape) {
+  // A step below a few units in the last place of ln x would leave x as it is.
+  return std::fmax(0.5 / std::sqrt(shape), 8.0 * DBL_EPSILON * std::fmax(1.0, std::log(shape)));
+}
+
+namespace {
+
+constexpr double kMaxTerms = 1e5;
+constexpr double kWeightWidth = 12.0;  // Poisson weights within 12 sd: the rest below e^-72
+
+// The smaller tail of the mixture: the lower one (which = 0) sums P(a+j, y)
+// from the last index down, the upper one sums Q(a+j, y) from the first up.
+bool smallerTail(double a, double y, double half, double j0, double j1, bool lowerSide,
+                 double* tail) {
+  double p = 0.0, q = 0.0;
+  const double start = lowerSide ? a + j1 : a + j0;
+  if (!gammaratio::tails(start, y, &p, &q)) return false;
+  double g = lowerSide ? p : q;                               // the gamma tail at the current index
+  double m = saddle::poissonMass(start, y);                   // y^(a+j) e^-y / Gamma(a+j+1)
+  double w = saddle::poissonMass(lowerSide ? j1 : j0, half);  // Poisson weight
+  double sum = 0.0;
+  for (double j = lowerSide ? j1 : j0; lowerSide ? j >= j0 : j <= j1; j += lowerSide ? -1 : 1) {
+    sum += w * g;
+    if (lowerSide) {
+      // P(a+j-1, y) = P(a+j, y) + m_{j-1}, m_{j-1} = m_j (a+j) / y.
+      if (j == j0) break;
+      m *= (a + j) / y;
+      g += m;
+      w *= j / half;
+    } else {
+      // Q(a+j+1, y) = Q(a+j, y) + m_j, m_{j+1} = m_j y / (a+j+1).
+      g += m;
+      m *= y / (a + j + 1.0);
+      w *= half / (j + 1.0);
+    }
+  }
+  *tail = sum;
+  return std::isfinite(sum);
+}
+
+}  // namespace
+
+bool noncentralChiSqTails(double x, double df, double ncp, double* lower, double* upper) {
+  if (!(x > 0.0) || !(df > 0.0) || !(ncp > 0.0) || std::isinf(x) || std::isinf(df)) return false;
+  const double a = 0.5 * df, y = 0.5 * x, half = 0.5 * ncp;
+  const double spread = kWeightWidth * std::sqrt(half) + 10.0;
+  const double j0 = std::fmax(0.0, std::floor(half - spread)), j1 = std::ceil(half + spread);
+  if (j1 - j0 > kMaxTerms) return false;
+  const bool lowerSide = y < a + half;
+  double tail = 0.0;
+  if (!smallerTail(a, y, half, j0, j1, lowerSide, &tail)) return false;
+  *lower = lowerSide ? tail : 0.5 + (0.5 - tail);
+  *upper = lowerSide ? 0.5 + (0.5 - tail) : tail;
+  return true;
+}
+
+namespace {
+
+// 1 when k reaches p, 0 when not, -1 when the tails fail.
+int reaches(const TailPair& tails, double p, double k) {
+  double lower = 0.0, above = 0.0;
+  if (!tails(k, &lower, &above) || std::isnan(lower) || std::isnan(above)) return -1;
+  return (p <= 0.5 ? lower >= p : above <= 1.0 - p) ? 1 : 0;
+}
+
+// The whole number between a and b (a < b), or a or b when there is none.
+double midpoint(double a, double b) {
+  return std::floor(a + 0.5 * (b - a));
+}
+
+}  // namespace
+
+double discreteQuantile(const TailPair& tails, double p, double lo, double start, double spread) {
+  if (!(p > 0.0 && p < 1.0) || !(start >= lo) || !std::isfinite(start)) return NAN;
+  double below = lo - 1.0, high = start;  // below never reaches p, high does
+  double step = std::fmax(spread, 1.0);
+  int r = reaches(tails, p, start);
+  if (r < 0) return NAN;
+  if (r == 1) {
+    while (high > lo) {
+      const double k = std::fmax(high - step, lo);
+      if (k == high) break;
+      r = reaches(tails, p, k);
+      if (r < 0) return NAN;
+      if (r == 0) {
+        below = k;
+        break;
+      }
+      high = k;
+      step += step;
+    }
+  } else {
+    below = start;
+    for (;;) {
+      if (step > DBL_MAX - high) return NAN;
+      const double k = high + step;
+      r = reaches(tails, p, k);
+      if (r < 0) return NAN;
+      if (r == 1) {
+        high = k;
+        break;
+      }
+      below = k;
+      high = k;
+      step += step;
+    }
+  }
+  for (;;) {
+    const double mid = midpoint(below, high);
+    if (!(mid > below && mid < high)) return high;  // neighbouring whole doubles
+    r = reaches(tails, p, mid);
+    if (r < 0) return NAN;
+    (r == 1 ? high : below) = mid;
+  }
+}
+
+double cornishFisherStart(double p, double mean, double sd, double skew, double lo) {
+  const double z = elv::normalQuantile(p);
+  const double k = std::floor(mean + sd * (z + (z * z - 1.0) * skew / 6.0));
+  return std::isfinite(k) ? std::fmax(k, lo) : mean;
+}
+
+}  // namespace large
+}  // namespace qel
