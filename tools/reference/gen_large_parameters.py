@@ -34,10 +34,14 @@ smaller tail); a discrete quantile is the smallest integer k with
 P(X <= k) >= p, written as the smallest double >= k (beyond 2^53 every
 double is an integer).
 
-Each row carries a condition number: |x f(x) / F(x)|, the relative change of
-the tail that a relative change of one rounding of x causes, written only
-where neighbouring doubles of x are more than a standard deviation apart
-(elsewhere 0): there the double inputs do not determine the tail to 1e-12.
+Each row carries a condition number. Tails: |x f(x) / F(x)|, the relative
+change of the tail that one rounding of x causes, written only where
+neighbouring doubles of x are more than a standard deviation apart (there
+the double inputs do not determine the tail to 1e-12) or where x is divided
+by a scale other than 1 (a rounding every method makes); elsewhere 0.
+Densities: |s| |mean| / sd + 1, s the standardised distance, the change of
+the density that a rounding of x, of the mean or of 1 - p causes (as the
+condition column of extreme_shapes.csv).
 
 Writes tests/data/large_parameters.csv with rows
     family,function,x,param1,param2,param3,expected,condition
@@ -373,7 +377,7 @@ def emit(family, function, x, params, value, cond=0):
         return
     if value != value:  # nan
         text = "nan"
-    elif value < mpf(10) ** -300:
+    elif abs(value) < mpf(10) ** -300:
         text = "0"
     else:
         text = mpmath.nstr(value, 20, strip_zeros=False, min_fixed=-1, max_fixed=-1)
@@ -391,11 +395,13 @@ def condition(x, log_pdf_at_x, tail, sd):
 
 
 def pdf_condition(x, mean, sd):
-    """|x d ln f / dx| ~ |x s / sd| where doubles around x are more than sd
-    apart, else 0."""
-    if ulp(x) <= float(sd):
-        return 0
-    return abs(mpf(x)) * (abs(mpf(x) - mpf(mean)) / mpf(sd) + 1) / mpf(sd)
+    """|s| |mean| / sd + 1, s = (x - mean) / sd: for a law close to the normal,
+    |x d ln f / dx| (and as much for the rounding of the mean or the
+    complement 1 - p a mass is measured from); the density changes by that
+    many times the relative error of its inputs, as in the condition column
+    of extreme_shapes.csv."""
+    s = abs(mpf(x) - mpf(mean)) / mpf(sd)
+    return s * abs(mpf(mean)) / mpf(sd) + 1
 
 
 def points(mean, sd, lo=-math.inf, hi=math.inf, integer=False):
@@ -420,10 +426,13 @@ def continuous(family, params, tails_at, log_pdf_at, mean, sd, lo=-math.inf, hi=
     for x in points(mean, sd, lo, hi):
         lp = log_pdf_at(d(x))
         lower, upper = tails_at(d(x))
+        # A scale other than 1: the rounding of x/scale is part of every
+        # method, so its condition counts whatever the spacing of doubles.
+        scaled = 0 if scale == 1.0 else 1e-300
         emit(family, "pdf", x * scale, params, mpmath.exp(lp - mpmath.log(scale)),
              pdf_condition(x, mean, sd))
-        emit(family, "lower", x * scale, params, lower, condition(x, lp, lower, sd))
-        emit(family, "upper", x * scale, params, upper, condition(x, lp, upper, sd))
+        emit(family, "lower", x * scale, params, lower, condition(x, lp, lower, sd * scaled))
+        emit(family, "upper", x * scale, params, upper, condition(x, lp, upper, sd * scaled))
     for p in PROBS:
         emit(family, "inv", p, params, quantile(tails_at, d(p), mean, sd, lo, hi) * scale)
 
@@ -500,15 +509,24 @@ def discrete_quantile(tails_at, p, mean, sd, lo):
     with a real shape), rounded up and checked on its integer neighbours."""
     if tails_at(mpf(lo + 1))[0] >= p:
         return mpf(lo + 1)
-    k = mpmath.ceil(quantile(tails_at, p, mean, sd, lo + 1, math.inf))
-    if k < 2**53:
-        while tails_at(k)[0] < p:
-            k += 1
-        while k - 1 > lo and tails_at(k - 1)[0] >= p:
-            k -= 1
-    v = float(k)
-    if mpf(v) < k:
-        v = math.nextafter(v, math.inf)
+    q = quantile(tails_at, p, mean, sd, lo + 1, math.inf)
+    with mp.workdps(hp_digits(mean)):
+        k = mpmath.ceil(q)
+        v = float(k)
+        if mpf(v) < k:
+            v = math.nextafter(v, math.inf)
+
+    # The root is known to sd 1e-38 only: step to the smallest whole double
+    # whose lower tail reaches p (steps of 1 below 2^53, of one double above).
+    def down(v):
+        return v - 1 if v < 2**53 else math.nextafter(v, -math.inf)
+
+    def up(v):
+        return v + 1 if v < 2**53 else math.nextafter(v, math.inf)
+    while tails_at(mpf(v))[0] < p:
+        v = up(v)
+    while down(v) > lo and tails_at(mpf(down(v)))[0] >= p:
+        v = down(v)
     return mpf(v)
 
 
@@ -619,7 +637,9 @@ def binomial_rows():
 
 
 def negbin_rows():
-    p = 0.5
+    # Not p = 1/2: there P(X <= 2r - 1) = 1/2 exactly (a fair binomial on
+    # 2r - 1 trials), a tie that a quadrature cannot decide.
+    p = 0.4
     for r in BIG:
         mean = d(r) / d(p)
         sd = mpmath.sqrt(d(r) * (1 - d(p))) / d(p)
@@ -659,7 +679,7 @@ def geometric_rows():
             emit("geometric", "inv", prob, (p,), mpf(max(v, 1.0)))
 
 
-def location_scale_rows():
+def location_rows():
     """Normal, logistic, Laplace, Cauchy and the extreme-value laws at a
     location of 1e300 with a scale of 1e290, and at a scale of 1e300."""
     for mu, sigma in ((1e300, 1e290), (0.0, 1e300), (-1e300, 1e299)):
@@ -702,9 +722,11 @@ def weibull_rows():
                     u = (d(x) / d(scale)) ** d(k)
                     lower, upper = -mpmath.expm1(-u), mpmath.exp(-u)
                     dens = d(k) / d(scale) * u / (d(x) / d(scale)) * mpmath.exp(-u)
-                emit("weibull", "pdf", x, (k, scale), dens)
-                emit("weibull", "lower", x, (k, scale), lower)
-                emit("weibull", "upper", x, (k, scale), upper)
+                # x / scale rounds unless the scale is 1: u moves by k eps.
+                c = 0 if scale == 1.0 else d(k) * (1 + u)
+                emit("weibull", "pdf", x, (k, scale), dens, abs(d(k) * (1 - u)) + 1 + c)
+                emit("weibull", "lower", x, (k, scale), lower, c)
+                emit("weibull", "upper", x, (k, scale), upper, c)
 
 
 def self_check():

@@ -18,6 +18,7 @@
 #include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/normal_precise.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
 
@@ -228,9 +229,38 @@ double mBetaCdf(double x, double a, double b, bool upperTail) {
   if (betaratio::fastTails(a, b, x, 0.5 + (0.5 - x), &lower, &upper)) {
     return upperTail ? upper : lower;
   }
-  if (ElvFailed(elv_beta_df(x, a, b, &lower, &upper, &density))) return mGetMissingValueCode();
+  if (ElvFailed(elv_beta_df(x, a, b, &lower, &upper, &density)) &&
+      !betaratio::anyTails(a, b, x, 0.5 + (0.5 - x), &lower, &upper)) {
+    return mGetMissingValueCode();
+  }
   return upperTail ? upper : lower;
 }
+
+namespace {
+
+// Both shapes beyond this and the ELV quantile routines refused: the search
+// below. (Their shapes end near 9.5e7.)
+constexpr double kLargeBetaShape = 1e6;
+
+// The beta quantile at large shapes, 0 < p < 1: the search on BRATIO's tails
+// (basym there, TOMS 708) from the Cornish-Fisher start m + sd (z + (z^2 - 1)
+// skew / 6), by first steps of a standard deviation in the logit.
+double largeShapeBetaQuantile(double p, double a, double b) {
+  const TailPair tails = [a, b](double x, double* lower, double* upper) {
+    return betaratio::anyTails(a, b, x, 0.5 + (0.5 - x), lower, upper);
+  };
+  const double n = a + b, m = a / n, y = b / n;
+  const double sd = std::sqrt(m * y / (n + 1.0));
+  const double skew = 2.0 * (y - m) / (n + 2.0) / sd;
+  const double z = elv::normalQuantile(p);
+  double start = m + sd * (z + (z * z - 1.0) * skew / 6.0);
+  if (!(start > 0.0 && start < 1.0)) start = m;
+  const double logit = std::fabs(std::log(m) - std::log1p(-m));
+  const double step = std::fmax(0.5 * sd / (m * y), 8.0 * DBL_EPSILON * std::fmax(1.0, logit));
+  return mTailQuantile(tails, p, TailSupport::Unit, start, step);
+}
+
+}  // namespace
 
 double mBetaInvCdf(double p, double a, double b) {
   if (!mPositiveShapes(a, b)) return mGetMissingValueCode();
@@ -258,6 +288,7 @@ double mBetaInvCdf(double p, double a, double b) {
     return !ElvFailed(elv_beta_df(x, a, b, lower, upper, &density));
   };
   if (!ElvFailed(status)) return mPolishedQuantile(tails, p, TailSupport::Unit, q);
+  if (std::isgreater(std::fmin(a, b), kLargeBetaShape)) return largeShapeBetaQuantile(p, a, b);
   // Beyond the routines' range of tails: the smaller tail in logarithms.
   return mTailQuantile(tails, p, TailSupport::Unit, a / (a + b));
 }

@@ -78,6 +78,26 @@ bool noncentralChiSqTails(double x, double df, double ncp, double* lower, double
   return true;
 }
 
+bool noncentralTTails(double x, double df, double delta, double* lower, double* upper) {
+  if (!(df > 0.0) || !std::isfinite(df) || !std::isfinite(x) || !std::isfinite(delta)) return false;
+  const double z = x - delta;
+  const double ax = 1.0 + std::fabs(x), az = 1.0 + std::fabs(z);
+  const double size = ax * ax * az * az;  // (1 + |x|)^2 (1 + |z|)^2, at most ~1e6 here
+  if (!(std::fabs(z) < 38.0) || !(size < 1e-8 * df)) return false;
+  const double density = std::exp(-0.5 * z * z) * 0.3989422804014327;  // phi(z)
+  const double correction = density * (x + x * x * z) / (4.0 * df);
+  // The smaller tail directly: Phi(-|z|) from the normal upper tail.
+  const double far = elv::normalUpperTail(std::fabs(z));
+  if (z < 0.0) {
+    *lower = far - correction;
+    *upper = 0.5 + (0.5 - *lower);
+  } else {
+    *upper = far + correction;
+    *lower = 0.5 + (0.5 - *upper);
+  }
+  return *lower >= 0.0 && *upper >= 0.0;
+}
+
 namespace {
 
 // 1 when k reaches p, 0 when not, -1 when the tails fail.

@@ -30,6 +30,16 @@ double logStep(double shape);
 // False when a tail fails or the mixture needs more than 10^5 terms.
 bool noncentralChiSqTails(double x, double df, double ncp, double* lower, double* upper);
 
+// Both tails of the noncentral t on df degrees of freedom with noncentrality
+// delta at x, for a df so large that the first-order term of the expansion
+// of E Phi(x W - delta), W = sqrt(chi2_df / df), in 1/df suffices:
+// P(T <= x) = Phi(z) - phi(z) (x + x^2 z) / (4 df) + O(df^-2), z = x - delta
+// (from E[W - 1] = -1/(4 df) + O(df^-2) and E[(W - 1)^2] = 1/(2 df) +
+// O(df^-2); Johnson, Kotz & Balakrishnan, ch. 31). False where the left-out
+// term, of the order (1 + |x|)^4 (1 + |z|)^4 / df^2 relative, could reach
+// 1e-16, or z lies beyond the normal tails' range.
+bool noncentralTTails(double x, double df, double delta, double* lower, double* upper);
+
 // The quantile of a discrete law on the integers from lo: the smallest
 // integer k with P(X <= k) >= p, 0 < p < 1, decided on the smaller tail
 // (tails(k) gives P(X <= k) and P(X > k)). Beyond 2^53, where every double

@@ -13,6 +13,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/beta_ratio.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/large_parameters.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/noncentral_t.h"
 #include "utilities/distributions/pvalue.h"
@@ -213,6 +214,9 @@ bool mTCdf(double x, double df, double noncentrality, double* lower, double* upp
     }
     if (noncentrality != 0.0 && elv::elvPrecision() == elv::ElvPrecision::Full &&
         nct::tails(x, df, noncentrality, lower, upper)) {
+      return true;
+    }
+    if (noncentrality != 0.0 && large::noncentralTTails(x, df, noncentrality, lower, upper)) {
       return true;
     }
     status = elv_t_ncdf(x, df, noncentrality, lower, upper);

@@ -5,8 +5,8 @@
 // answer as narrow ones do.
 #include <cmath>
 
-#include "utilities/distributions/kernels.h"
 #include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 
