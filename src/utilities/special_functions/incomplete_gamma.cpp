@@ -267,21 +267,25 @@ double rlogOfDifference(double d) {
 
 // GRATIO answers "indeterminate" where a e^2 > 3.28e-3 (a beyond 6.7e28)
 // near x = a, because it forms l = x/a, which has lost the digits of x - a
-// there. Here eta comes from the exact difference x - a (rlogOfDifference),
-// so exp(-y) and erfc(sqrt y) are evaluated in full at every a; the Taylor
-// forms of the window |s| <= e0/sqrt(a) serve only the shapes GRATIO allows.
-Ratios largeShape(double a, double x, double acc, double e0, double x0, double e) {
+// there; mIncompleteGamma keeps that answer (written). With exactNearA,
+// eta comes from the exact difference x - a (rlogOfDifference), so exp(-y)
+// and erfc(sqrt y) are evaluated in full at every a; the Taylor forms of
+// the window |s| <= e0/sqrt(a) serve only the shapes GRATIO allows.
+Ratios largeShape(double a, double x, double acc, double e0, double x0, double e,
+                  bool exactNearA = false) {
   const double l = x / a;
   if (l == 0.0) return kZero;
   const double s = 0.5 + (0.5 - l);
   const bool below = x < a;
+  const bool beyondGratio = a * e * e > 3.28e-3;
+  if (beyondGratio && !exactNearA && std::fabs(s) <= 2.0 * e) return kIndeterminate;
   // rlog(l) from l - 1 = (x - a)/a: the difference x - a is exact near
   // l = 1, where the rounded l would cost rlog its relative accuracy.
   const double z = rlogOfDifference((x - a) / a);
   if (z >= 700.0 / a) return below ? kZero : kOne;
   const double y = a * z;
   const double rta = std::sqrt(a);
-  if (std::fabs(s) <= e0 / rta && a * e * e <= 3.28e-3) {
+  if (std::fabs(s) <= e0 / rta && !beyondGratio) {
     // Near l = 1: exp(-y) and exp(y) erfc(sqrt y) by their Taylor forms.
     const double c = 0.5 + (0.5 - y);
     const double w = (0.5 - std::sqrt(y) * (0.5 + (0.5 - y / 3.0)) / kRtpi) / c;
@@ -354,8 +358,8 @@ bool temmeGammaRatios(double a, double x, double* p, double* q) {
   if (!(a >= kTemmeSmallestShape) || !(x > 0.0) || std::isinf(a) || std::isinf(x)) return false;
   const double s = 0.5 + (0.5 - x / a);
   if (!(std::fabs(s) <= kTemmeReach)) return false;
-  const Ratios r =
-      largeShape(a, x, std::max(kAcc0[kLevel], spmpar(1)), kE00[kLevel], kX00[kLevel], spmpar(1));
+  const Ratios r = largeShape(a, x, std::max(kAcc0[kLevel], spmpar(1)), kE00[kLevel], kX00[kLevel],
+                              spmpar(1), true);
   if (r.indeterminate) return false;
   *p = r.p;
   *q = r.q;
