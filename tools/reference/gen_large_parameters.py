@@ -420,7 +420,7 @@ def points(mean, sd, lo=-math.inf, hi=math.inf, integer=False):
 
 
 def continuous(family, params, tails_at, log_pdf_at, mean, sd, lo=-math.inf, hi=math.inf,
-               scale=1.0):
+               scale=1.0, probs=PROBS):
     """pdf/lower/upper rows at the points, quantile rows at PROBS. tails_at
     and log_pdf_at take the standard variable; scale multiplies x."""
     for x in points(mean, sd, lo, hi):
@@ -433,13 +433,13 @@ def continuous(family, params, tails_at, log_pdf_at, mean, sd, lo=-math.inf, hi=
              pdf_condition(x, mean, sd))
         emit(family, "lower", x * scale, params, lower, condition(x, lp, lower, sd * scaled))
         emit(family, "upper", x * scale, params, upper, condition(x, lp, upper, sd * scaled))
-    for p in PROBS:
+    for p in probs:
         emit(family, "inv", p, params, quantile(tails_at, d(p), mean, sd, lo, hi) * scale)
 
 
 def illinois(f, z):
     """A root of the increasing-or-decreasing f near z: a bracket by doubling
-    steps from 1/2 from z, then the Illinois method to 1e-38."""
+    steps from 1/2 from z, then the Illinois method to 1e-32."""
     a, fa = z, f(z)
     step = mpf(1) / 2
     while True:
@@ -456,7 +456,7 @@ def illinois(f, z):
     for _ in range(200):
         c = b - fb * (b - a) / (fb - fa)
         fc = f(c)
-        if fc == 0 or abs(b - a) < mpf(10)**-38:
+        if fc == 0 or abs(b - a) < mpf(10)**-32 or abs(c - b) < mpf(10)**-32:
             return c
         if fc * fb < 0:
             a, fa = b, fb
@@ -560,7 +560,8 @@ def beta_rows():
             m = d(a) / n
             sd = mpmath.sqrt(d(a) * d(b) / (n * n * (n + 1)))
             continuous("beta", (a, b), lambda x: beta_tails(d(a), d(b), x),
-                       lambda x: beta_log_pdf(d(a), d(b), x), m, sd, lo=0.0, hi=1.0)
+                       lambda x: beta_log_pdf(d(a), d(b), x), m, sd, lo=0.0, hi=1.0,
+                       probs=PROBS if b == a else (1e-10, 0.5, 1 - 1e-10))
 
 
 def t_rows():
@@ -573,7 +574,7 @@ def t_rows():
                 emit("t", "lower", x, (n, delta), lower)
                 emit("t", "upper", x, (n, delta), upper)
             for p in PROBS:
-                if n <= 1e10 or p in (0.3, 0.9):
+                if p in (1e-10, 0.5, 0.9):
                     emit("t", "inv", p, (n, delta),
                          quantile(lambda x: nct_tails(d(n), d(delta), x), d(p), delta, 1.0,
                                   -math.inf, math.inf))
@@ -596,7 +597,8 @@ def f_rows():
                             (m_ + n_) / 2 * mpmath.log1p(m_ * x / n_) - log_beta(m_ / 2, n_ / 2))
             mean = 1.0 if m == n else 1.0
             sd = mpmath.sqrt(2 / d(m) + 2 / d(n))
-            continuous("f", (m, n), tails_at, log_pdf, mean, sd, lo=0.0)
+            continuous("f", (m, n), tails_at, log_pdf, mean, sd, lo=0.0,
+                       probs=PROBS if m == n else (0.3, 0.9))
 
 
 def noncentral_rows():
@@ -608,7 +610,7 @@ def noncentral_rows():
                 lower, upper = ncchisq_tails(d(n), d(ncp), d(x))
                 emit("chisq", "lower", x, (n, ncp), lower)
                 emit("chisq", "upper", x, (n, ncp), upper)
-            for p in (0.3, 0.9) if n > 1e10 else PROBS:
+            for p in (1e-10, 0.9):
                 emit("chisq", "inv", p, (n, ncp),
                      quantile(lambda x: ncchisq_tails(d(n), d(ncp), x), d(p), mean, sd, 0.0,
                               math.inf))

@@ -12,6 +12,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/beta_ratio.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/large_parameters.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
@@ -352,7 +353,8 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
   const ElvStatus status = x > kLargestFArgument
                                ? betaMixtureTails(x, df1, df2, noncentrality, lower, upper)
                                : elv_F_ncdf(x, df1, df2, noncentrality, lower, upper);
-  if (ElvFailed(status)) {
+  if (ElvFailed(status) &&
+      !(noncentrality > 0.0 && large::noncentralFTails(x, df1, df2, noncentrality, lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
     return false;
   }

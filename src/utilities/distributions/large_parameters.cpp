@@ -3,7 +3,9 @@
 
 #include <cfloat>
 #include <cmath>
+#include <functional>
 
+#include "utilities/distributions/beta_ratio.h"
 #include "utilities/distributions/gamma_ratio.h"
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/elv/normal_precise.h"
@@ -32,29 +34,36 @@ namespace {
 constexpr double kMaxTerms = 1e5;
 constexpr double kWeightWidth = 12.0;  // Poisson weights within 12 sd: the rest below e^-72
 
-// The smaller tail of the mixture: the lower one (which = 0) sums P(a+j, y)
-// from the last index down, the upper one sums Q(a+j, y) from the first up.
-bool smallerTail(double a, double y, double half, double j0, double j1, bool lowerSide,
-                 double* tail) {
-  double p = 0.0, q = 0.0;
-  const double start = lowerSide ? a + j1 : a + j0;
-  if (!gammaratio::tails(start, y, &p, &q)) return false;
-  double g = lowerSide ? p : q;                               // the gamma tail at the current index
-  double m = saddle::poissonMass(start, y);                   // y^(a+j) e^-y / Gamma(a+j+1)
-  double w = saddle::poissonMass(lowerSide ? j1 : j0, half);  // Poisson weight
+// One family of the mixture: the tails L_j (lower, decreasing in j) and
+// U_j = 1 - L_j at index j, the mass m_j with L_{j+1} = L_j - m_j, and the
+// ratio m_{j+1} / m_j.
+struct Chain {
+  std::function<bool(double j, double* lower, double* upper)> tails;
+  std::function<double(double j)> mass;
+  std::function<double(double j)> ratio;
+};
+
+// sum_j w_j L_j (lowerSide) or sum_j w_j U_j over the Poisson(half) weights
+// on [j0, j1]: L_j summed from j1 down (L_{j-1} = L_j + m_{j-1}), U_j from j0
+// up (U_{j+1} = U_j + m_j), so every step adds a positive term.
+bool smallerTail(const Chain& c, double half, double j0, double j1, bool lowerSide, double* tail) {
+  double lower = 0.0, upper = 0.0;
+  const double first = lowerSide ? j1 : j0;
+  if (!c.tails(first, &lower, &upper)) return false;
+  double g = lowerSide ? lower : upper;
+  double m = c.mass(first);
+  double w = saddle::poissonMass(first, half);
   double sum = 0.0;
-  for (double j = lowerSide ? j1 : j0; lowerSide ? j >= j0 : j <= j1; j += lowerSide ? -1 : 1) {
+  for (double j = first;; j += lowerSide ? -1.0 : 1.0) {
     sum += w * g;
+    if (lowerSide ? j <= j0 : j >= j1) break;
     if (lowerSide) {
-      // P(a+j-1, y) = P(a+j, y) + m_{j-1}, m_{j-1} = m_j (a+j) / y.
-      if (j == j0) break;
-      m *= (a + j) / y;
+      m /= c.ratio(j - 1.0);
       g += m;
       w *= j / half;
     } else {
-      // Q(a+j+1, y) = Q(a+j, y) + m_j, m_{j+1} = m_j y / (a+j+1).
       g += m;
-      m *= y / (a + j + 1.0);
+      m *= c.ratio(j);
       w *= half / (j + 1.0);
     }
   }
@@ -62,20 +71,51 @@ bool smallerTail(double a, double y, double half, double j0, double j1, bool low
   return std::isfinite(sum);
 }
 
+// The mixture over Poisson(half) weights, the smaller tail by the chain and
+// the other as its complement; lowerSide says which is the smaller.
+bool mixture(const Chain& c, double half, bool lowerSide, double* lower, double* upper) {
+  const double spread = kWeightWidth * std::sqrt(half) + 10.0;
+  const double j0 = std::fmax(0.0, std::floor(half - spread)), j1 = std::ceil(half + spread);
+  if (j1 - j0 > kMaxTerms) return false;
+  double tail = 0.0;
+  if (!smallerTail(c, half, j0, j1, lowerSide, &tail)) return false;
+  *lower = lowerSide ? tail : 0.5 + (0.5 - tail);
+  *upper = lowerSide ? 0.5 + (0.5 - tail) : tail;
+  return true;
+}
+
 }  // namespace
 
 bool noncentralChiSqTails(double x, double df, double ncp, double* lower, double* upper) {
   if (!(x > 0.0) || !(df > 0.0) || !(ncp > 0.0) || std::isinf(x) || std::isinf(df)) return false;
   const double a = 0.5 * df, y = 0.5 * x, half = 0.5 * ncp;
-  const double spread = kWeightWidth * std::sqrt(half) + 10.0;
-  const double j0 = std::fmax(0.0, std::floor(half - spread)), j1 = std::ceil(half + spread);
-  if (j1 - j0 > kMaxTerms) return false;
-  const bool lowerSide = y < a + half;
-  double tail = 0.0;
-  if (!smallerTail(a, y, half, j0, j1, lowerSide, &tail)) return false;
-  *lower = lowerSide ? tail : 0.5 + (0.5 - tail);
-  *upper = lowerSide ? 0.5 + (0.5 - tail) : tail;
-  return true;
+  // P(a+j+1, y) = P(a+j, y) - y^(a+j) e^-y / Gamma(a+j+1) (A&S 6.5.21).
+  const Chain c{
+      [a, y](double j, double* l, double* u) { return gammaratio::tails(a + j, y, l, u); },
+      [a, y](double j) { return saddle::poissonMass(a + j, y); },
+      [a, y](double j) { return y / (a + j + 1.0); }};
+  return mixture(c, half, y < a + half, lower, upper);
+}
+
+bool noncentralFTails(double x, double df1, double df2, double ncp, double* lower, double* upper) {
+  if (!(x > 0.0) || !(df1 > 0.0) || !(df2 > 0.0) || !(ncp > 0.0) || std::isinf(x) ||
+      !(df1 + df2 + ncp < 0x1p53)) {
+    return false;
+  }
+  const double a = 0.5 * df1, b = 0.5 * df2, half = 0.5 * ncp;
+  const double sum = df1 * x + df2;
+  if (!std::isfinite(sum)) return false;
+  const double y = df1 * x / sum, z = df2 / sum;  // y and 1 - y
+  // I_y(a+j+1, b) = I_y(a+j, b) - y^(a+j) (1-y)^b / ((a+j) B(a+j, b)) (DLMF
+  // 8.17.20); the mass is y (1-y) / (a+j) times the beta density.
+  const Chain c{
+      [a, b, y, z](double j, double* l, double* u) {
+        return betaratio::anyTails(a + j, b, y, z, l, u);
+      },
+      [a, b, y, z](double j) { return saddle::betaDensity(y, a + j, b) * y * z / (a + j); },
+      [a, b, y](double j) { return y * (a + b + j) / (a + j + 1.0); }};
+  // The mean of the mixture's beta variable sits near (a + half)/(a + half + b).
+  return mixture(c, half, y < (a + half) / (a + half + b), lower, upper);
 }
 
 bool noncentralTTails(double x, double df, double delta, double* lower, double* upper) {
@@ -83,7 +123,14 @@ bool noncentralTTails(double x, double df, double delta, double* lower, double* 
   const double z = x - delta;
   const double ax = 1.0 + std::fabs(x), az = 1.0 + std::fabs(z);
   const double size = ax * ax * az * az;  // (1 + |x|)^2 (1 + |z|)^2, at most ~1e6 here
-  if (!(std::fabs(z) < 38.0) || !(size < 1e-8 * df)) return false;
+  if (!(std::fabs(z) < 38.0)) {
+    // Both tails beyond 1e-300 from the normal limit: W within 1e-5 of 1.
+    if (!(std::fabs(x) < 1e5 && df > 1e12)) return false;
+    *lower = z < 0.0 ? 0.0 : 1.0;
+    *upper = z < 0.0 ? 1.0 : 0.0;
+    return true;
+  }
+  if (!(size < 1e-8 * df)) return false;
   const double density = std::exp(-0.5 * z * z) * 0.3989422804014327;  // phi(z)
   const double correction = density * (x + x * x * z) / (4.0 * df);
   // The smaller tail directly: Phi(-|z|) from the normal upper tail.

@@ -30,6 +30,12 @@ double logStep(double shape);
 // False when a tail fails or the mixture needs more than 10^5 terms.
 bool noncentralChiSqTails(double x, double df, double ncp, double* lower, double* upper);
 
+// Both tails of the noncentral F the same way: sum_j w_j I_y(a+j, b) with
+// y = df1 x / (df1 x + df2), a = df1/2, b = df2/2, the beta tails from
+// BRATIO chained by I_y(a+j+1, b) = I_y(a+j, b) - y^(a+j) (1-y)^b / ((a+j)
+// B(a+j, b)) (DLMF 8.17.20). False also for df1 + df2 + ncp beyond 2^53.
+bool noncentralFTails(double x, double df1, double df2, double ncp, double* lower, double* upper);
+
 // Both tails of the noncentral t on df degrees of freedom with noncentrality
 // delta at x, for a df so large that the first-order term of the expansion
 // of E Phi(x W - delta), W = sqrt(chi2_df / df), in 1/df suffices:
@@ -37,7 +43,7 @@ bool noncentralChiSqTails(double x, double df, double ncp, double* lower, double
 // (from E[W - 1] = -1/(4 df) + O(df^-2) and E[(W - 1)^2] = 1/(2 df) +
 // O(df^-2); Johnson, Kotz & Balakrishnan, ch. 31). False where the left-out
 // term, of the order (1 + |x|)^4 (1 + |z|)^4 / df^2 relative, could reach
-// 1e-16, or z lies beyond the normal tails' range.
+// 1e-16; for |z| >= 38 the tails are 0 and 1 (below 1e-300) when df > 1e12.
 bool noncentralTTails(double x, double df, double delta, double* lower, double* upper);
 
 // The quantile of a discrete law on the integers from lo: the smallest

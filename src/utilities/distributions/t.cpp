@@ -131,7 +131,17 @@ bool tinyDfTails(double t, double n, double* lower, double* upper) {
 }
 
 // The starting bracket of the noncentral quantile search.
+constexpr double kNormalLimitDf = 1e10;
+
 void startingBracket(double p, double df, double noncentrality, double* x1, double* x2) {
+  if (df > kNormalLimitDf) {
+    // The normal limit N(delta, 1): the ln Gamma difference below would
+    // cancel to nothing (and the variance to a negative number).
+    const double a = p >= 0.5 ? p : p / 1.1, b = p >= 0.5 ? 1.0 - (1.0 - p) / 1.1 : p;
+    *x1 = noncentrality + mNormalInvCdf(a, 0.0, 1.0);
+    *x2 = noncentrality + mNormalInvCdf(b, 0.0, 1.0);
+    return;
+  }
   double mean = noncentrality;
   if (df > 1.0) {
     mean = noncentrality * std::sqrt(df / 2.0) *
