@@ -38,7 +38,8 @@ Each row carries a condition number. Tails: |x f(x) / F(x)|, the relative
 change of the tail that one rounding of x causes, written only where
 neighbouring doubles of x are more than a standard deviation apart (there
 the double inputs do not determine the tail to 1e-12) or where x is divided
-by a scale other than 1 (a rounding every method makes); elsewhere 0.
+by a scale other than 1, or enters the F law through y = m x / (m x + n)
+(a rounding every method makes); elsewhere 0.
 Densities: |s| |mean| / sd + 1, s the standardised distance, the change of
 the density that a rounding of x, of the mean or of 1 - p causes (as the
 condition column of extreme_shapes.csv).
@@ -177,12 +178,31 @@ def log_beta(a, b):
     return lgamma_hp(a) + lgamma_hp(b) - lgamma_hp(a + b)
 
 
+def small_shape_beta(a, b, x):
+    """I_x(a, b) for a small shape a (b any size) by DLMF 8.17.8,
+    x^a (1-x)^b / (a B(a, b)) 2F1(a + b, 1; a + 1; x), a series of positive
+    terms (the quadrature would meet the singularity t^(a-1) at 0)."""
+    with mp.workdps(hp_digits(a, b)):
+        a, b, x = mpf(a), mpf(b), mpf(x)
+        pre = mpmath.exp(a * mpmath.log(x) + b * mpmath.log1p(-x) - mpmath.log(a) - log_beta(a, b))
+        return pre * mpmath.hyp2f1(a + b, 1, a + 1, x)
+
+
 def beta_tails(a, b, x):
     """I_x(a, b), 1 - I_x(a, b) for exact a, b with a + b >= 1e3."""
     if x <= 0:
         return mpf(0), mpf(1)
     if x >= 1:
         return mpf(1), mpf(0)
+    if min(a, b) < 50 and max(a, b) >= 1e3:
+        # The tail at the small shape's end by the series, the other as 1 - it.
+        if a < b:
+            low = small_shape_beta(a, b, x)
+            return low, 1 - low
+        with mp.workdps(hp_digits(a, b)):
+            y = 1 - mpf(x)
+        up = small_shape_beta(b, a, y)
+        return 1 - up, up
     dig = hp_digits(a, b, 1 / min(float(x), 1 - float(x)) if 0 < x < 1 else 1)
     with mp.workdps(dig):
         a, b, x = mpf(a), mpf(b), mpf(x)
@@ -420,7 +440,7 @@ def points(mean, sd, lo=-math.inf, hi=math.inf, integer=False):
 
 
 def continuous(family, params, tails_at, log_pdf_at, mean, sd, lo=-math.inf, hi=math.inf,
-               scale=1.0, probs=PROBS):
+               scale=1.0, probs=PROBS, rounded=False):
     """pdf/lower/upper rows at the points, quantile rows at PROBS. tails_at
     and log_pdf_at take the standard variable; scale multiplies x."""
     for x in points(mean, sd, lo, hi):
@@ -428,7 +448,7 @@ def continuous(family, params, tails_at, log_pdf_at, mean, sd, lo=-math.inf, hi=
         lower, upper = tails_at(d(x))
         # A scale other than 1: the rounding of x/scale is part of every
         # method, so its condition counts whatever the spacing of doubles.
-        scaled = 0 if scale == 1.0 else 1e-300
+        scaled = 1e-300 if scale != 1.0 or rounded else 1
         emit(family, "pdf", x * scale, params, mpmath.exp(lp - mpmath.log(scale)),
              pdf_condition(x, mean, sd))
         emit(family, "lower", x * scale, params, lower, condition(x, lp, lower, sd * scaled))
@@ -489,7 +509,10 @@ def quantile(tails_at, p, mean, sd, lo, hi):
     z = mpmath.sqrt(2) * mpmath.erfinv(2 * p - 1) if p > 1e-300 else mpf(-37.5)
     s = illinois(f, z)
     with mp.workdps(dig):
-        return mean + sd * s
+        x = mean + sd * s
+    # A quantile within the solver's tolerance of 0 is 0 (the median of a
+    # symmetric law).
+    return mpf(0) if abs(x) < sd * mpf(10)**-30 else x
 
 
 def discrete(family, params, tails_at, log_pmf_at, mean, sd, lo, hi=math.inf):
@@ -561,7 +584,7 @@ def beta_rows():
             sd = mpmath.sqrt(d(a) * d(b) / (n * n * (n + 1)))
             continuous("beta", (a, b), lambda x: beta_tails(d(a), d(b), x),
                        lambda x: beta_log_pdf(d(a), d(b), x), m, sd, lo=0.0, hi=1.0,
-                       probs=PROBS if b == a else (1e-10, 0.5, 1 - 1e-10))
+                       probs=PROBS if b == a else (1e-10, 0.5))
 
 
 def t_rows():
@@ -597,8 +620,10 @@ def f_rows():
                             (m_ + n_) / 2 * mpmath.log1p(m_ * x / n_) - log_beta(m_ / 2, n_ / 2))
             mean = 1.0 if m == n else 1.0
             sd = mpmath.sqrt(2 / d(m) + 2 / d(n))
+            # x enters through y = m x / (m x + n), a rounding every method
+            # makes: its condition counts.
             continuous("f", (m, n), tails_at, log_pdf, mean, sd, lo=0.0,
-                       probs=PROBS if m == n else (0.3, 0.9))
+                       probs=PROBS if m == n else (0.3, 0.9), rounded=True)
 
 
 def noncentral_rows():
@@ -618,8 +643,15 @@ def noncentral_rows():
         sd = mpmath.sqrt(4 / d(n))
         for x in points(1.0, sd, 0.0):
             lower, upper = ncf_tails(d(n), d(n), d(ncp), d(x))
-            emit("f", "lower", x, (n, n, ncp), lower)
-            emit("f", "upper", x, (n, n, ncp), upper)
+            # The condition of the rounding of y = m x / (m x + n): |x F'/F|
+            # by a central difference of relative step 1e-20.
+            with mp.workdps(hp_digits(n)):
+                h = mpf(10)**-20
+                xu, xd = d(x) * (1 + h), d(x) * (1 - h)
+            slope = (ncf_tails(d(n), d(n), d(ncp), xu)[0] -
+                     ncf_tails(d(n), d(n), d(ncp), xd)[0]) / (2 * h)
+            emit("f", "lower", x, (n, n, ncp), lower, abs(slope / lower) if lower > 0 else 0)
+            emit("f", "upper", x, (n, n, ncp), upper, abs(slope / upper) if upper > 0 else 0)
 
 
 def poisson_rows():
@@ -740,8 +772,8 @@ def self_check():
             else:
                 m_, r_ = mine[1], mpmath.gammainc(a, x, mpmath.inf, regularized=True)
             assert abs(m_ - r_) <= mpf(10)**-25 * r_, ("gamma", a, x, m_, r_)
-    a, b = mpf(400), mpf(600)
-    for x in (mpf("0.3"), mpf("0.4")):
+    for a, b, x in ((mpf(400), mpf(600), mpf("0.3")), (mpf(400), mpf(600), mpf("0.4")),
+                    (mpf("2.5"), mpf(2000), mpf("0.001")), (mpf(2000), mpf("2.5"), mpf("0.999"))):
         mine = beta_tails(a, b, x)
         ref = mpmath.betainc(a, b, 0, x, regularized=True)
         assert abs(mine[0] - ref) <= mpf(10)**-25 * ref, ("beta", x, mine, ref)

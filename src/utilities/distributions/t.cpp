@@ -88,7 +88,11 @@ bool centralTByIncompleteBeta(double t, double n, double* lower, double* upper) 
   const double t2 = t * t;
   const double s = n + t2;
   double ratio = 0.0, complement = 0.0;
-  if (!betaratio::fastTails(n / 2.0, 0.5, n / s, t2 / s, &ratio, &complement)) return false;
+  // Beyond the ELV routine's df, BRATIO's deep tails too (no other route).
+  if (!betaratio::fastTails(n / 2.0, 0.5, n / s, t2 / s, &ratio, &complement) &&
+      !(n > kElvMaxDf && betaratio::anyTails(n / 2.0, 0.5, n / s, t2 / s, &ratio, &complement))) {
+    return false;
+  }
   *(t < 0.0 ? lower : upper) = 0.5 * ratio;
   *(t < 0.0 ? upper : lower) = 0.5 + 0.5 * complement;
   return true;
