@@ -180,7 +180,7 @@ TEST(ExtremeShapes, LargeParametersMatchMpmath) {
     }
     const double small = inv ? std::fmin(x, 1.0 - x) : truth;
     const double tol = (small < 1e-6 ? 1e-12 : 1e-14) + 8 * DBL_EPSILON * kappa;
-    const bool ok = kappa > 1e14          ? v >= 0.0 && v <= std::max(truth, 1.0)
+    const bool ok = kappa > 1e14          ? v >= 0.0 && (r[1] == "pdf" || v <= 1.0)
                     : truth == 0.0 && inv ? std::fabs(v) <= 1e-14
                     : truth == 0.0        ? v >= 0.0 && v <= 1e-280
                                           : std::fabs(v - truth) <= tol * std::fabs(truth);

@@ -194,8 +194,11 @@ def beta_tails(a, b, x):
         return mpf(0), mpf(1)
     if x >= 1:
         return mpf(1), mpf(0)
-    if min(a, b) < 50 and max(a, b) >= 1e3:
-        # The tail at the small shape's end by the series, the other as 1 - it.
+    # The tail at the small shape's end by the series where it converges
+    # within some 1e4 terms ((a + b) times the argument on that side below
+    # 1e3), the other as 1 - it.
+    small_end = x if a < b else 1 - x
+    if min(a, b) < 50 and max(a, b) >= 1e3 and (a + b) * small_end < 1e3:
         if a < b:
             low = small_shape_beta(a, b, x)
             return low, 1 - low
@@ -406,10 +409,14 @@ def emit(family, function, x, params, value, cond=0):
     print(",".join(ROWS[-1]), file=sys.stderr, flush=True)
 
 
-def condition(x, log_pdf_at_x, tail, sd):
-    """|x f / F| where doubles around x are more than sd apart, else 0."""
-    if ulp(x) <= float(sd) or tail == 0:
+def condition(x, log_pdf_at_x, tail, sd, other=1):
+    """|x f / F| where doubles around x are more than sd apart, else 0; where
+    either tail there is below 1e-300, the next double lies beyond the bulk
+    and the tails have no condition to speak of (1e300)."""
+    if ulp(x) <= float(sd):
         return 0
+    if min(tail, other) < mpf(10)**-300:
+        return mpf(10)**300
     c = abs(mpf(x)) * mpmath.exp(log_pdf_at_x) / tail
     return c if c > 1e-300 else 0
 
@@ -451,8 +458,10 @@ def continuous(family, params, tails_at, log_pdf_at, mean, sd, lo=-math.inf, hi=
         scaled = 1e-300 if scale != 1.0 or rounded else 1
         emit(family, "pdf", x * scale, params, mpmath.exp(lp - mpmath.log(scale)),
              pdf_condition(x, mean, sd))
-        emit(family, "lower", x * scale, params, lower, condition(x, lp, lower, sd * scaled))
-        emit(family, "upper", x * scale, params, upper, condition(x, lp, upper, sd * scaled))
+        emit(family, "lower", x * scale, params, lower,
+             condition(x, lp, lower, sd * scaled, upper))
+        emit(family, "upper", x * scale, params, upper,
+             condition(x, lp, upper, sd * scaled, lower))
     for p in probs:
         emit(family, "inv", p, params, quantile(tails_at, d(p), mean, sd, lo, hi) * scale)
 
@@ -520,8 +529,8 @@ def discrete(family, params, tails_at, log_pmf_at, mean, sd, lo, hi=math.inf):
         lp = log_pmf_at(d(x))
         lower, upper = tails_at(d(x))
         emit(family, "pdf", x, params, mpmath.exp(lp), pdf_condition(x, mean, sd))
-        emit(family, "lower", x, params, lower, condition(x, lp, lower, sd))
-        emit(family, "upper", x, params, upper, condition(x, lp, upper, sd))
+        emit(family, "lower", x, params, lower, condition(x, lp, lower, sd, upper))
+        emit(family, "upper", x, params, upper, condition(x, lp, upper, sd, lower))
     for p in PROBS:
         emit(family, "inv", p, params, discrete_quantile(tails_at, d(p), mean, sd, lo))
 
@@ -633,8 +642,10 @@ def noncentral_rows():
             sd = mpmath.sqrt(2 * (d(n) + 2 * ncp))
             for x in points(mean, sd, 0.0):
                 lower, upper = ncchisq_tails(d(n), d(ncp), d(x))
-                emit("chisq", "lower", x, (n, ncp), lower)
-                emit("chisq", "upper", x, (n, ncp), upper)
+                far = ulp(x) > float(sd)
+                c = 1e300 if far and min(lower, upper) < 1e-300 else 0
+                emit("chisq", "lower", x, (n, ncp), lower, c)
+                emit("chisq", "upper", x, (n, ncp), upper, c)
             for p in (1e-10, 0.9):
                 emit("chisq", "inv", p, (n, ncp),
                      quantile(lambda x: ncchisq_tails(d(n), d(ncp), x), d(p), mean, sd, 0.0,
@@ -648,10 +659,15 @@ def noncentral_rows():
             with mp.workdps(hp_digits(n)):
                 h = mpf(10)**-20
                 xu, xd = d(x) * (1 + h), d(x) * (1 - h)
-            slope = (ncf_tails(d(n), d(n), d(ncp), xu)[0] -
-                     ncf_tails(d(n), d(n), d(ncp), xd)[0]) / (2 * h)
-            emit("f", "lower", x, (n, n, ncp), lower, abs(slope / lower) if lower > 0 else 0)
-            emit("f", "upper", x, (n, n, ncp), upper, abs(slope / upper) if upper > 0 else 0)
+            k = 0 if lower < upper else 1  # the smaller tail keeps the digits of the change
+            slope = (ncf_tails(d(n), d(n), d(ncp), xu)[k] -
+                     ncf_tails(d(n), d(n), d(ncp), xd)[k]) / (2 * h)
+            far = ulp(x) > float(sd)  # neighbouring doubles more than sd apart
+            deep = min(lower, upper) < 1e-300
+            emit("f", "lower", x, (n, n, ncp), lower,
+                 1e300 if far and deep else abs(slope / lower) if lower > 1e-300 else 0)
+            emit("f", "upper", x, (n, n, ncp), upper,
+                 1e300 if far and deep else abs(slope / upper) if upper > 1e-300 else 0)
 
 
 def poisson_rows():

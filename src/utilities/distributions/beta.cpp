@@ -11,6 +11,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/beta_ratio.h"
+#include "utilities/distributions/gamma_ratio.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/large_parameters.h"
 #include "utilities/distributions/log_gamma.h"
@@ -321,6 +322,18 @@ double mFPdf(double x, double df1, double df2) {
 
 constexpr double kLargeMixtureDf = 1e5;
 
+// df1 x + df2 without overflow (a trap in the armed state).
+bool productsFit(double x, double df1, double df2) {
+  return x <= 0.25 * DBL_MAX / df1 && df2 <= 0.25 * DBL_MAX;
+}
+
+bool chiSqLimit(double df1, double df2) {
+  // df2 >= 1e18 max(1, df1^2), without squaring df1 (an overflow trap).
+  return df2 >= 1e18 && std::isfinite(df2) && df1 <= std::fmax(1.0, std::sqrt(df2 * 1e-18));
+}
+// Both df beyond this and the ELV routines refused: the large-df routes.
+constexpr double kLargeFDf = 1e8;
+
 bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower, double* upper) {
   if (mIsNumericMissing(x)) {
     *lower = *upper = x;
@@ -343,12 +356,25 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
     *lower = *upper = mGetMissingValueCode();
     return false;
   }
+  // df2 beyond 1e18 df1^2: df1 F is chi-square on df1 to O(df1^2 / df2)
+  // relative (E[chi2_df2 / df2] = 1, so the first-order term vanishes),
+  // where y = df1 x / (df1 x + df2) would have lost the digits of x.
+  if (noncentrality == 0.0 && chiSqLimit(df1, df2) && productsFit(x, df1, df2)) {
+    if (gammaratio::tails(0.5 * df1, 0.5 * df1 * x, lower, upper)) return true;
+  }
   // Central: I_z(df1/2, df2/2) at z = df1 x/(df1 x + df2), whose complement
   // df2/(df1 x + df2) is formed apart (TOMS 708).
   if (noncentrality == 0.0 && centralFArgumentsFit(x, df1, df2)) {
     const double scaled = df1 * x, sum = scaled + df2;
     if (std::isfinite(sum) &&
         betaratio::fastTails(df1 / 2.0, df2 / 2.0, scaled / sum, df2 / sum, lower, upper)) {
+      return true;
+    }
+  }
+  if (noncentrality == 0.0 && std::fmin(df1, df2) > kLargeFDf && productsFit(x, df1, df2)) {
+    // Beyond the ELV routine's df, BRATIO's deep tails too (no other route).
+    const double scaled = df1 * x, sum = scaled + df2;
+    if (betaratio::anyTails(df1 / 2.0, df2 / 2.0, scaled / sum, df2 / sum, lower, upper)) {
       return true;
     }
   }
@@ -397,6 +423,10 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
     };
     return smallshape::quantile(tails, p, TailSupport::Positive, 1.0);
   }
+  if (noncentrality == 0.0 && chiSqLimit(df1, df2) && p > 0.0 && p < 1.0) {
+    const double q = mGammaInvCdf(p, 0.5 * df1, 2.0 / df1, 0.0);  // chi2_df1 / df1
+    if (!mIsNumericMissing(q)) return q;
+  }
   if (noncentrality == 0.0) {
     // P(F <= x) = I_w(df1/2, df2/2), w = df1 x/(df2 + df1 x), and
     // P(F > x) = I_y(df2/2, df1/2), y = 1 - w: the tails of the central law
@@ -418,6 +448,17 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
     const ElvStatus status =
         p <= 0.5 ? elv_F_lower_quant(p, df1, df2, &q) : elv_F_upper_quant(1.0 - p, df1, df2, &q);
     if (!ElvFailed(status)) return mPolishedQuantile(tails, p, TailSupport::Positive, q);
+    if (std::fmin(df1, df2) > kLargeFDf && p > 0.0 && p < 1.0) {
+      // Large df: ln F is about normal with variance 2/df1 + 2/df2; the
+      // search on mFCdf's tails from there, by steps of that spread.
+      const TailPair exact = [df1, df2](double x, double* lower, double* upper) {
+        return mFCdf(x, df1, df2, 0.0, lower, upper);
+      };
+      const double sd = std::sqrt(2.0 / df1 + 2.0 / df2);
+      const double start = std::exp(sd * elv::normalQuantile(p));
+      return mTailQuantile(exact, p, TailSupport::Positive, start,
+                           std::fmax(0.5 * sd, 8.0 * DBL_EPSILON));
+    }
     return mTailQuantile(tails, p, TailSupport::Positive, 1.0);
   }
   // The noncentral law: the smaller tail, solved in logarithms from about

@@ -44,41 +44,51 @@ struct Chain {
 };
 
 // sum_j w_j L_j (lowerSide) or sum_j w_j U_j over the Poisson(half) weights
-// on [j0, j1]: L_j summed from j1 down (L_{j-1} = L_j + m_{j-1}), U_j from j0
-// up (U_{j+1} = U_j + m_j), so every step adds a positive term.
-bool smallerTail(const Chain& c, double half, double j0, double j1, bool lowerSide, double* tail) {
+// on [j0, j1]. U_j is summed from j0 up (U_{j+1} = U_j + m_j), L_j from j1
+// down (L_{j-1} = L_j + m_{j-1}), so every step adds a positive term; where
+// the shape at j1 is not a double (a + j1 rounds, a beyond 2^52), L_j comes
+// from j = 0 up (L_{j+1} = L_j - m_j), whose terms are then a part in
+// sqrt(a) of L_j, and the tails are only formed at the exact shape.
+bool smallerTail(const Chain& c, double a, double half, double j0, double j1, bool lowerSide,
+                 double* tail) {
+  const bool exactShapes = (a + j1) - a == j1;
+  const bool down = lowerSide && exactShapes;
+  double first = down ? j1 : exactShapes ? j0 : 0.0;
   double lower = 0.0, upper = 0.0;
-  const double first = lowerSide ? j1 : j0;
   if (!c.tails(first, &lower, &upper)) return false;
   double g = lowerSide ? lower : upper;
   double m = c.mass(first);
+  for (; first < j0; first += 1.0) {  // from the exact shape to the window
+    g += lowerSide ? -m : m;
+    m *= c.ratio(first);
+  }
   double w = saddle::poissonMass(first, half);
   double sum = 0.0;
-  for (double j = first;; j += lowerSide ? -1.0 : 1.0) {
+  for (double j = first;; j += down ? -1.0 : 1.0) {
     sum += w * g;
-    if (lowerSide ? j <= j0 : j >= j1) break;
-    if (lowerSide) {
+    if (down ? j <= j0 : j >= j1) break;
+    if (down) {
       m /= c.ratio(j - 1.0);
       g += m;
       w *= j / half;
     } else {
-      g += m;
+      g += lowerSide ? -m : m;
       m *= c.ratio(j);
       w *= half / (j + 1.0);
     }
   }
   *tail = sum;
-  return std::isfinite(sum);
+  return std::isfinite(sum) && sum >= 0.0;
 }
 
 // The mixture over Poisson(half) weights, the smaller tail by the chain and
 // the other as its complement; lowerSide says which is the smaller.
-bool mixture(const Chain& c, double half, bool lowerSide, double* lower, double* upper) {
+bool mixture(const Chain& c, double a, double half, bool lowerSide, double* lower, double* upper) {
   const double spread = kWeightWidth * std::sqrt(half) + 10.0;
   const double j0 = std::fmax(0.0, std::floor(half - spread)), j1 = std::ceil(half + spread);
   if (j1 - j0 > kMaxTerms) return false;
   double tail = 0.0;
-  if (!smallerTail(c, half, j0, j1, lowerSide, &tail)) return false;
+  if (!smallerTail(c, a, half, j0, j1, lowerSide, &tail)) return false;
   *lower = lowerSide ? tail : 0.5 + (0.5 - tail);
   *upper = lowerSide ? 0.5 + (0.5 - tail) : tail;
   return true;
@@ -94,17 +104,17 @@ bool noncentralChiSqTails(double x, double df, double ncp, double* lower, double
       [a, y](double j, double* l, double* u) { return gammaratio::tails(a + j, y, l, u); },
       [a, y](double j) { return saddle::poissonMass(a + j, y); },
       [a, y](double j) { return y / (a + j + 1.0); }};
-  return mixture(c, half, y < a + half, lower, upper);
+  return mixture(c, a, half, y < a + half, lower, upper);
 }
 
 bool noncentralFTails(double x, double df1, double df2, double ncp, double* lower, double* upper) {
   if (!(x > 0.0) || !(df1 > 0.0) || !(df2 > 0.0) || !(ncp > 0.0) || std::isinf(x) ||
-      !(df1 + df2 + ncp < 0x1p53)) {
+      !(df1 + df2 + ncp < 1e306)) {
     return false;
   }
+  if (!(x <= 0.25 * DBL_MAX / df1 && df2 <= 0.25 * DBL_MAX)) return false;  // no overflow trap
   const double a = 0.5 * df1, b = 0.5 * df2, half = 0.5 * ncp;
   const double sum = df1 * x + df2;
-  if (!std::isfinite(sum)) return false;
   const double y = df1 * x / sum, z = df2 / sum;  // y and 1 - y
   // I_y(a+j+1, b) = I_y(a+j, b) - y^(a+j) (1-y)^b / ((a+j) B(a+j, b)) (DLMF
   // 8.17.20); the mass is y (1-y) / (a+j) times the beta density.
@@ -115,7 +125,7 @@ bool noncentralFTails(double x, double df1, double df2, double ncp, double* lowe
       [a, b, y, z](double j) { return saddle::betaDensity(y, a + j, b) * y * z / (a + j); },
       [a, b, y](double j) { return y * (a + b + j) / (a + j + 1.0); }};
   // The mean of the mixture's beta variable sits near (a + half)/(a + half + b).
-  return mixture(c, half, y < (a + half) / (a + half + b), lower, upper);
+  return mixture(c, a, half, y < (a + half) / (a + half + b), lower, upper);
 }
 
 bool noncentralTTails(double x, double df, double delta, double* lower, double* upper) {

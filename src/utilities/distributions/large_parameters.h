@@ -33,7 +33,7 @@ bool noncentralChiSqTails(double x, double df, double ncp, double* lower, double
 // Both tails of the noncentral F the same way: sum_j w_j I_y(a+j, b) with
 // y = df1 x / (df1 x + df2), a = df1/2, b = df2/2, the beta tails from
 // BRATIO chained by I_y(a+j+1, b) = I_y(a+j, b) - y^(a+j) (1-y)^b / ((a+j)
-// B(a+j, b)) (DLMF 8.17.20). False also for df1 + df2 + ncp beyond 2^53.
+// B(a+j, b)) (DLMF 8.17.20). False also for df1 + df2 + ncp beyond 1e306.
 bool noncentralFTails(double x, double df1, double df2, double ncp, double* lower, double* upper);
 
 // Both tails of the noncentral t on df degrees of freedom with noncentrality

@@ -158,10 +158,8 @@ double mNegBinomialCdf(double x, double p, double r, bool upperTail) {
   if (!isGeometric(r) && (k - r >= kExactCountLimit || r >= kExactCountLimit) && k > r && p > 0.0 &&
       p < 1.0) {
     double lower = 0.0, upper = 0.0;
-    if (!largeCountTails(k, p, r, &lower, &upper)) {
-      return mGetMissingValueCode();
-    }
-    return upperTail ? upper : lower;
+    // Where BRATIO refuses (a count near DBL_MAX), the binomial route below.
+    if (largeCountTails(k, p, r, &lower, &upper)) return upperTail ? upper : lower;
   }
   if (!upperTail) {
     if (k < r) return 0.0;

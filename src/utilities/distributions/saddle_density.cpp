@@ -196,6 +196,8 @@ struct UnitPoint {
 // ln of Gamma(x+y+1)/(Gamma(x+1) Gamma(y+1)) p^x q^y as core + lf, with the
 // direct factor in *f (0 when not formed); x, y >= 0 given apart so that
 // neither is lost in the rounding of x + y.
+constexpr double kLargeDirect = 1e300;
+
 double binomialCore(double x, double y, const UnitPoint& u, double* f, double* lf) {
   *f = 1.0;
   *lf = 0.0;
@@ -208,6 +210,10 @@ double binomialCore(double x, double y, const UnitPoint& u, double* f, double* l
   const double lx = checkedLog(x), ly = checkedLog(y);
   *lf = 0.5 * (ln - lx - ly) - kLnSqrt2Pi;
   *f = direct({x, y, n}) ? std::sqrt(n / (k2Pi * x * y)) : 0.0;
+  // Large counts: the same factor as sqrt((n/x) / (2 pi y)), free of
+  // overflow, rather than through logarithms near 690, whose rounding would
+  // cost the density 1e-13.
+  if (*f == 0.0 && x >= 1.0 && y >= 1.0 && y <= kLargeDirect) *f = std::sqrt((n / x) / (k2Pi * y));
   return core;
 }
 
@@ -216,7 +222,8 @@ double binomialCore(double x, double y, const UnitPoint& u, double* f, double* l
 // a + b trials times a b / ((a + b) p q).
 double betaAt(const UnitPoint& u, double a, double b) {
   double f = 0.0, lf = 0.0, core = 0.0;
-  if (a >= 1.0 && b >= 1.0) {
+  // Shapes from 2^53 on, where a - 1 rounds, take the second form.
+  if (a >= 1.0 && b >= 1.0 && a < 0x1p53 && b < 0x1p53) {
     core = binomialCore(a - 1.0, b - 1.0, u, &f, &lf);
     const double c = a + b - 1.0;
     lf += checkedLog(c);
@@ -224,7 +231,8 @@ double betaAt(const UnitPoint& u, double a, double b) {
   } else {
     core = binomialCore(a, b, u, &f, &lf);
     lf += checkedLog(a) + checkedLog(b) - checkedLog(a + b) - u.lp - u.lq;
-    f = direct({a, b, u.p, u.q}) ? f * (a / (a + b)) * (b / (u.p * u.q)) : 0.0;
+    const bool large = f > 0.0 && b <= kLargeDirect && u.p * u.q >= 1e-8;
+    f = direct({a, b, u.p, u.q}) || large ? f * (a / (a + b)) * (b / (u.p * u.q)) : 0.0;
   }
   return scaledExp(core, f, lf);
 }
@@ -331,7 +339,10 @@ double fDensity(double x, double m, double n) {
   const double core = stirlerr(N) - stirlerr(a) - stirlerr(b) - relativeDeviance(a, t, ut) -
                       relativeDeviance(b, s, us);
   const double lf = 0.5 * (checkedLog(a) + checkedLog(b) - checkedLog(N)) - kLnSqrt2Pi - lx;
-  const double f = direct({wa, b, x}) ? std::sqrt(wa * b / k2Pi) / x : 0.0;
+  // wa b <= b: no overflow for any b up to 1e300 (logarithms near 690
+  // would cost 1e-13).
+  const bool large = wa >= kDirectLow && b <= kLargeDirect && x >= kDirectLow && x <= kDirectHigh;
+  const double f = direct({wa, b, x}) || large ? std::sqrt(wa * b / k2Pi) / x : 0.0;
   return scaledExp(core, f, lf);
 }
 

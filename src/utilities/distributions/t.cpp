@@ -21,6 +21,7 @@
 #include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/normal_precise.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -37,6 +38,8 @@ constexpr double kElvWidthFactor = 6.1738;
 constexpr int kElvDomainStatus = 3;
 
 // The central t quantile by the ELV routine for the nearer tail.
+constexpr double kNormalQuantileDf = 1e20;
+
 double centralTQuantile(double p, double df) {
   if (!mPositiveShapes(df)) return mGetMissingValueCode();
   if (std::islessequal(df, smallshape::kTinyShape) && p > 0.0 && p < 1.0) {
@@ -47,6 +50,12 @@ double centralTQuantile(double p, double df) {
       return mTCdf(x, df, 0.0, lower, upper);
     };
     return smallshape::quantile(tails, p, TailSupport::RealLine, p < 0.5 ? -1.0 : 1.0);
+  }
+  if (df > kNormalQuantileDf && p > 0.0 && p < 1.0) {
+    // z + (z^3 + z) / (4 df) + O(df^-2) (Abramowitz & Stegun 26.7.5): the
+    // second term is below 1e-17 z for |z| < 40 at these df.
+    const double z = elv::normalQuantile(p);
+    return z + (z * z * z + z) / (4.0 * df);
   }
   double q = 0.0;
   const ElvStatus status =
