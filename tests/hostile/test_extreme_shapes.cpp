@@ -113,3 +113,83 @@ TEST(ExtremeShapes, QuantilesAtTinyShapesMatchMpmath) {
   EXPECT_EQ(wrong, 0) << "of " << count;
   EXPECT_GT(count, 300);
 }
+
+namespace {
+
+// Every exported family at a parameter of 1e6..1e300 (gen_large_parameters.py).
+double callLarge(const std::string& f, const std::string& fn, double x, double a, double b,
+                 double c) {
+  using namespace qel;
+  const bool pdf = fn == "pdf", inv = fn == "inv", up = fn == "upper";
+  if (f == "gamma")
+    return pdf ? GammaPdf(x, a, b, 0) : inv ? GammaInvCdf(x, a, b, 0) : GammaCdf(x, a, b, 0, up);
+  if (f == "chisq")
+    return pdf ? ChiSqPdf(x, a) : inv ? ChiSqInvCdf(x, a, b) : ChiSqCdf(x, a, b, up);
+  if (f == "beta") return pdf ? BetaPdf(x, a, b) : inv ? BetaInvCdf(x, a, b) : BetaCdf(x, a, b, up);
+  if (f == "t") return pdf ? TPdf(x, a, b) : inv ? TInvCdf(x, a, b) : TCdf(x, a, b, up);
+  if (f == "f") return pdf ? FPdf(x, a, b) : inv ? FInvCdf(x, a, b, c) : FCdf(x, a, b, c, up);
+  if (f == "poisson")
+    return pdf ? PoissonPdf(x, a) : inv ? PoissonInvCdf(x, a) : PoissonCdf(x, a, up);
+  if (f == "binomial") {
+    const bool small = a < 2e9;  // Pdf and InvCdf take an int n
+    if (!small && (pdf || inv)) return std::nan("");
+    return pdf   ? BinomialPdf(x, int(a), b)
+           : inv ? BinomialInvCdf(x, int(a), b)
+                 : BinomialCdf(x, a, b, up);
+  }
+  if (f == "negbinomial")
+    return pdf   ? NegBinomialPdf(x, a, b)
+           : inv ? NegBinomialInvCdf(x, a, b)
+                 : NegBinomialCdf(x, a, b, up);
+  if (f == "geometric")
+    return pdf ? GeometricPdf(x, a) : inv ? GeometricInvCdf(x, a) : GeometricCdf(x, a, up);
+  if (f == "normal")
+    return pdf ? NormalPdf(x, a, b) : inv ? NormalInvCdf(x, a, b) : NormalCdf(x, a, b, up);
+  if (f == "logistic") return pdf ? LogisticPdf(x, a, b) : LogisticCdf(x, a, b, up);
+  if (f == "laplace") return pdf ? LaplacePdf(x, a, b) : LaplaceCdf(x, a, b, up);
+  if (f == "cauchy") return pdf ? CauchyPdf(x, a, b) : CauchyCdf(x, a, b, up);
+  if (f == "lev")
+    return pdf ? LargestExtremeValuePdf(x, a, b) : LargestExtremeValueCdf(x, a, b, up);
+  if (f == "sev")
+    return pdf ? SmallestExtremeValuePdf(x, a, b) : SmallestExtremeValueCdf(x, a, b, up);
+  return pdf ? WeibullPdf(x, a, b, 0) : WeibullCdf(x, a, b, 0, up);
+}
+
+}  // namespace
+
+// Values to 1e-14 relative (1e-12 where below 1e-6; quantiles in x, by p),
+// plus 8 eps times the row's condition number (densities; tails where
+// neighbouring doubles of x lie more than a standard deviation apart or x is
+// divided by a scale; range only beyond 1e14). Discrete quantiles thus
+// exactly below 1e14 (the smallest double at or above the integer quantile);
+// true values below 1e-300 as at most 1e-280; counts beyond 2^53 NaN.
+TEST(ExtremeShapes, LargeParametersMatchMpmath) {
+  std::map<std::string, int> rows, failures;
+  for (const auto& r : rowsOf("large_parameters.csv")) {
+    const double x = number(r[2]), truth = number(r[6]), kappa = number(r[7]);
+    const bool inv = r[1] == "inv";
+    if (r[0] == "binomial" && number(r[3]) > 2e9 && (inv || r[1] == "pdf")) continue;
+    const double v = callLarge(r[0], r[1], x, number(r[3]), number(r[4]), number(r[5]));
+    // Counts n and r are whole numbers up to 2^53: beyond, NaN.
+    const double count = r[0] == "binomial"      ? number(r[3])
+                         : r[0] == "negbinomial" ? number(r[4])
+                                                 : 0.0;
+    if (count > 0x1p53) {
+      EXPECT_TRUE(std::isnan(v)) << r[0] << " " << r[1] << " at count " << r[3] << ", " << r[4];
+      continue;
+    }
+    const double small = inv ? std::fmin(x, 1.0 - x) : truth;
+    const double tol = (small < 1e-6 ? 1e-12 : 1e-14) + 8 * DBL_EPSILON * kappa;
+    const bool ok = kappa > 1e14          ? v >= 0.0 && (r[1] == "pdf" || v <= 1.0)
+                    : truth == 0.0 && inv ? std::fabs(v) <= 1e-14
+                    : truth == 0.0        ? v >= 0.0 && v <= 1e-280
+                                          : std::fabs(v - truth) <= tol * std::fabs(truth);
+    const std::string what = r[0] + " " + r[1];
+    ++rows[what];
+    if (!ok && failures[what]++ < 6)
+      ADD_FAILURE() << what << " at " << r[2] << "; " << r[3] << ", " << r[4] << ", " << r[5]
+                    << " = " << v << " (mpmath " << r[6] << ")";
+  }
+  for (const auto& [what, count] : rows) EXPECT_EQ(failures[what], 0) << what << " of " << count;
+  EXPECT_GT(rows.size(), 40u);
+}

@@ -11,7 +11,9 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/beta_ratio.h"
+#include "utilities/distributions/gamma_ratio.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/large_parameters.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
@@ -19,6 +21,7 @@
 #include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/normal_precise.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
 
@@ -229,9 +232,38 @@ double mBetaCdf(double x, double a, double b, bool upperTail) {
   if (betaratio::fastTails(a, b, x, 0.5 + (0.5 - x), &lower, &upper)) {
     return upperTail ? upper : lower;
   }
-  if (ElvFailed(elv_beta_df(x, a, b, &lower, &upper, &density))) return mGetMissingValueCode();
+  if (ElvFailed(elv_beta_df(x, a, b, &lower, &upper, &density)) &&
+      !betaratio::anyTails(a, b, x, 0.5 + (0.5 - x), &lower, &upper)) {
+    return mGetMissingValueCode();
+  }
   return upperTail ? upper : lower;
 }
+
+namespace {
+
+// Both shapes beyond this and the ELV quantile routines refused: the search
+// below. (Their shapes end near 9.5e7.)
+constexpr double kLargeBetaShape = 1e6;
+
+// The beta quantile at large shapes, 0 < p < 1: the search on BRATIO's tails
+// (basym there, TOMS 708) from the Cornish-Fisher start m + sd (z + (z^2 - 1)
+// skew / 6), by first steps of a standard deviation in the logit.
+double largeShapeBetaQuantile(double p, double a, double b) {
+  const TailPair tails = [a, b](double x, double* lower, double* upper) {
+    return betaratio::anyTails(a, b, x, 0.5 + (0.5 - x), lower, upper);
+  };
+  const double n = a + b, m = a / n, y = b / n;
+  const double sd = std::sqrt(m * y / (n + 1.0));
+  const double skew = 2.0 * (y - m) / (n + 2.0) / sd;
+  const double z = elv::normalQuantile(p);
+  double start = m + sd * (z + (z * z - 1.0) * skew / 6.0);
+  if (!(start > 0.0 && start < 1.0)) start = m;
+  const double logit = std::fabs(std::log(m) - std::log1p(-m));
+  const double step = std::fmax(0.5 * sd / (m * y), 8.0 * DBL_EPSILON * std::fmax(1.0, logit));
+  return mTailQuantile(tails, p, TailSupport::Unit, start, step);
+}
+
+}  // namespace
 
 double mBetaInvCdf(double p, double a, double b) {
   if (!mPositiveShapes(a, b)) return mGetMissingValueCode();
@@ -262,6 +294,7 @@ double mBetaInvCdf(double p, double a, double b) {
     return !ElvFailed(elv_beta_df(x, a, b, lower, upper, &density));
   };
   if (!ElvFailed(status)) return mPolishedQuantile(tails, p, TailSupport::Unit, q);
+  if (std::isgreater(std::fmin(a, b), kLargeBetaShape)) return largeShapeBetaQuantile(p, a, b);
   // Beyond the routines' range of tails: the smaller tail in logarithms.
   const double x = mTailQuantile(tails, p, TailSupport::Unit, a / (a + b));
   if (!mIsNumericMissing(x) || !(p > 0.0 && p < 1.0)) return x;
@@ -295,6 +328,20 @@ double mFPdf(double x, double df1, double df2) {
   }
 }
 
+constexpr double kLargeMixtureDf = 1e5;
+
+// df1 x + df2 without overflow (a trap in the armed state).
+bool productsFit(double x, double df1, double df2) {
+  return x <= 0.25 * DBL_MAX / df1 && df2 <= 0.25 * DBL_MAX;
+}
+
+bool chiSqLimit(double df1, double df2) {
+  // df2 >= 1e18 max(1, df1^2), without squaring df1 (an overflow trap).
+  return df2 >= 1e18 && std::isfinite(df2) && df1 <= std::fmax(1.0, std::sqrt(df2 * 1e-18));
+}
+// Both df beyond this and the ELV routines refused: the large-df routes.
+constexpr double kLargeFDf = 1e8;
+
 bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower, double* upper) {
   if (mIsNumericMissing(x)) {
     *lower = *upper = x;
@@ -317,6 +364,12 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
     *lower = *upper = mGetMissingValueCode();
     return false;
   }
+  // df2 beyond 1e18 df1^2: df1 F is chi-square on df1 to O(df1^2 / df2)
+  // relative (E[chi2_df2 / df2] = 1, so the first-order term vanishes),
+  // where y = df1 x / (df1 x + df2) would have lost the digits of x.
+  if (noncentrality == 0.0 && chiSqLimit(df1, df2) && productsFit(x, df1, df2)) {
+    if (gammaratio::tails(0.5 * df1, 0.5 * df1 * x, lower, upper)) return true;
+  }
   // Central: I_z(df1/2, df2/2) at z = df1 x/(df1 x + df2), whose complement
   // df2/(df1 x + df2) is formed apart (TOMS 708).
   if (noncentrality == 0.0 && centralFArgumentsFit(x, df1, df2)) {
@@ -326,10 +379,25 @@ bool mFCdf(double x, double df1, double df2, double noncentrality, double* lower
       return true;
     }
   }
+  if (noncentrality == 0.0 && std::fmin(df1, df2) > kLargeFDf && productsFit(x, df1, df2)) {
+    // Beyond the ELV routine's df, BRATIO's deep tails too (no other route).
+    const double scaled = df1 * x, sum = scaled + df2;
+    if (betaratio::anyTails(df1 / 2.0, df2 / 2.0, scaled / sum, df2 / sum, lower, upper)) {
+      return true;
+    }
+  }
+  // Large df: the chained mixture, which keeps the digits the ELV routine's
+  // noncentral F loses there (2e-13 in the body, 1e-10 in the far tails at
+  // df 1e6).
+  if (noncentrality > 0.0 && df1 + df2 > kLargeMixtureDf &&
+      large::noncentralFTails(x, df1, df2, noncentrality, lower, upper)) {
+    return true;
+  }
   const ElvStatus status = x > kLargestFArgument
                                ? betaMixtureTails(x, df1, df2, noncentrality, lower, upper)
                                : elv_F_ncdf(x, df1, df2, noncentrality, lower, upper);
-  if (ElvFailed(status)) {
+  if (ElvFailed(status) &&
+      !(noncentrality > 0.0 && large::noncentralFTails(x, df1, df2, noncentrality, lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
     return false;
   }
@@ -363,6 +431,10 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
     };
     return smallshape::quantile(tails, p, TailSupport::Positive, 1.0);
   }
+  if (noncentrality == 0.0 && chiSqLimit(df1, df2) && p > 0.0 && p < 1.0) {
+    const double q = mGammaInvCdf(p, 0.5 * df1, 2.0 / df1, 0.0);  // chi2_df1 / df1
+    if (!mIsNumericMissing(q)) return q;
+  }
   if (noncentrality == 0.0) {
     // P(F <= x) = I_w(df1/2, df2/2), w = df1 x/(df2 + df1 x), and
     // P(F > x) = I_y(df2/2, df1/2), y = 1 - w: the tails of the central law
@@ -384,6 +456,17 @@ double mFInvCdf(double p, double df1, double df2, double noncentrality) {
     const ElvStatus status =
         p <= 0.5 ? elv_F_lower_quant(p, df1, df2, &q) : elv_F_upper_quant(1.0 - p, df1, df2, &q);
     if (!ElvFailed(status)) return mPolishedQuantile(tails, p, TailSupport::Positive, q);
+    if (std::fmin(df1, df2) > kLargeFDf && p > 0.0 && p < 1.0) {
+      // Large df: ln F is about normal with variance 2/df1 + 2/df2; the
+      // search on mFCdf's tails from there, by steps of that spread.
+      const TailPair exact = [df1, df2](double x, double* lower, double* upper) {
+        return mFCdf(x, df1, df2, 0.0, lower, upper);
+      };
+      const double sd = std::sqrt(2.0 / df1 + 2.0 / df2);
+      const double start = std::exp(sd * elv::normalQuantile(p));
+      return mTailQuantile(exact, p, TailSupport::Positive, start,
+                           std::fmax(0.5 * sd, 8.0 * DBL_EPSILON));
+    }
     return mTailQuantile(tails, p, TailSupport::Positive, 1.0);
   }
   // The noncentral law: the smaller tail, solved in logarithms from about

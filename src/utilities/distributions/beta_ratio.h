@@ -15,6 +15,12 @@ namespace betaratio {
 // tails as logarithms down to the smallest normal double.
 bool fastTails(double a, double b, double x, double y, double* lower, double* upper);
 
+// Both tails from BRATIO whatever their size, at either precision setting:
+// for shapes beyond the ELV routines, which have no other route. A tail
+// below 1e-280 may have lost digits (it is below every tail the library
+// promises).
+bool anyTails(double a, double b, double x, double y, double* lower, double* upper);
+
 }  // namespace betaratio
 }  // namespace qel
 

@@ -3,11 +3,11 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/distributions/classes.h"
-#include "utilities/distributions/kernels.h"
+#include "utilities/CheckedFunctions.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/CheckedFunctions.h"
+#include "utilities/distributions/classes.h"
+#include "utilities/distributions/kernels.h"
 
 namespace qel {
 

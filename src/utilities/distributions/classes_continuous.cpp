@@ -3,10 +3,10 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/CheckedFunctions.h"
+#include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/classes.h"
 #include "utilities/distributions/kernels.h"
-#include "utilities/LYNBasicTypes.h"
-#include "utilities/CheckedFunctions.h"
 
 namespace qel {
 

@@ -13,11 +13,11 @@
 #include <cmath>
 #include <stdexcept>
 
+#include "utilities/LYNBasicTypes.h"
+#include "utilities/MathUtilities.h"
 #include "utilities/distributions/classes.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/special_functions/incomplete_beta.h"
-#include "utilities/LYNBasicTypes.h"
-#include "utilities/MathUtilities.h"
 #include "utilities/special_functions/transcendental.h"
 
 namespace qel {

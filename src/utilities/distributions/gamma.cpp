@@ -13,6 +13,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/gamma_ratio.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/large_parameters.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/pvalue.h"
 #include "utilities/distributions/saddle_density.h"
@@ -21,6 +22,7 @@
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/standardize.h"
 #include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -102,6 +104,23 @@ double chiSqQuantileFromElv(double p, double df) {
   const ElvStatus status =
       p <= 0.5 ? elv_chi2_lower_quant(p, df, &q) : elv_chi2_upper_quant(1.0 - p, df, &q);
   return ElvFailed(status) ? mGetMissingValueCode() : q;
+}
+
+// The standard gamma quantile at a shape beyond the ELV routines, 0 < p < 1:
+// the search on the tails of gamma_ratio.h (Temme's expansion there) from
+// the Wilson-Hilferty start, by first steps of a standard deviation of ln X.
+// It resolves the quantile to the last unit of x, so no check follows.
+double largeShapeGammaQuantile(double p, double shape) {
+  const TailPair tails = [shape](double x, double* lower, double* upper) {
+    return gammaratio::tails(shape, x, lower, upper);
+  };
+  const double start = large::gammaQuantileStart(p, shape);
+  return mTailQuantile(tails, p, TailSupport::Positive, start > 0.0 ? start : shape,
+                       large::logStep(shape));
+}
+
+bool largeShape(double shape, double p) {
+  return std::isgreater(shape, elv::kMaxShape) && p > 0.0 && p < 1.0;
 }
 
 // True when the lower tail F(q) is within 1e-9 p of p.
@@ -189,7 +208,8 @@ double CmChiSqCdf::operator()(double x) {
   if (mIsNumericMissing(x)) return x;
   if (x <= 0.0) return -mP;
   double lower = 0.0, upper = 0.0;
-  if (ElvFailed(elv_chi2_ncdf(x, mDf, mNoncentrality, &lower, &upper))) {
+  if (ElvFailed(elv_chi2_ncdf(x, mDf, mNoncentrality, &lower, &upper)) &&
+      !mChiSqCdf(x, mDf, mNoncentrality, &lower, &upper)) {
     return mGetMissingValueCode();
   }
   return lower - mP;
@@ -250,6 +270,10 @@ double mGammaInvCdf(double p, double shape, double scale, double threshold) {
   if (seriesquantile::gammaQuantile(p, shape, &q)) {
     return q == 0.0 ? q : scaledQuantile(q, scale, threshold);
   }
+  if (largeShape(shape, p)) {
+    q = largeShapeGammaQuantile(p, shape);
+    return mIsNumericMissing(q) ? q : scaledQuantile(q, scale, threshold);
+  }
   if (p != 0.0) {
     q = gammaQuantileFromElv(p, shape);
     if (mIsNumericMissing(q)) return q;
@@ -308,7 +332,8 @@ bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double*
     return true;
   }
   if (noncentrality == 0.0 && gammaratio::fastTails(df / 2.0, x / 2.0, lower, upper)) return true;
-  if (ElvFailed(elv_chi2_ncdf(x, df, noncentrality, lower, upper))) {
+  if (ElvFailed(elv_chi2_ncdf(x, df, noncentrality, lower, upper)) &&
+      !large::noncentralChiSqTails(x, df, noncentrality, lower, upper)) {
     *lower = *upper = mGetMissingValueCode();
     return false;
   }
@@ -335,12 +360,19 @@ double mChiSqInvCdf(double p, double df, double noncentrality) {
   if (noncentrality == 0.0 && seriesquantile::gammaQuantile(p, df / 2.0, &half)) {
     return 2.0 * half;
   }
+  if (noncentrality == 0.0 && largeShape(0.5 * df, p)) {
+    const double large = largeShapeGammaQuantile(p, 0.5 * df);
+    return mIsNumericMissing(large) ? large : scaledQuantile(large, 2.0, 0.0);
+  }
   if (noncentrality == 0.0) return centralChiSqQuantile(p, df);
   // The smaller tail, solved in logarithms from the mean.
   const TailPair tails = [df, noncentrality](double x, double* lower, double* upper) {
     return mChiSqCdf(x, df, noncentrality, lower, upper);
   };
-  return mTailQuantile(tails, p, TailSupport::Positive, df + noncentrality);
+  // From the mean; at large df by steps of a standard deviation of log X.
+  const double mean = df + noncentrality;
+  return mTailQuantile(tails, p, TailSupport::Positive, mean,
+                       mean > 1e6 ? large::logStep(0.5 * mean) : 1.0);
 }
 
 double mChiSqInvCdfByRootFinder(double p, double df, double noncentrality, double start) {

@@ -5,6 +5,7 @@
 #include <exception>
 
 #include "utilities/distributions/saddle_density.h"
+#include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
 #include "utilities/special_functions/transcendental.h"
 
@@ -16,6 +17,13 @@ namespace {
 // Direct tails below this are left to the ELV routine: the prefactor nears
 // the subnormal range, where it would lose digits.
 constexpr double kSmallestDirectTail = 1e-280;
+// Beyond the ELV routines' shapes nothing else reaches the deep tails:
+// there Temme's expansion answers for any tail (it carries its prefactor
+// e^-y whole, and gives 0 where y = a rlog(x/a) passes 700, a tail below
+// 2e-306).
+bool temmeFloorApplies(double a) {
+  return !(a > elv::kMaxShape);
+}
 // A term below 2^-56 of the sum no longer changes it; a continued-fraction
 // step within one unit in the last place of 1 leaves the value unchanged.
 constexpr double kRelativeStop = 1.4e-17;
@@ -78,8 +86,9 @@ bool upperFraction(double a, double x, double* value) {
   return false;
 }
 
-bool finish(double direct, bool directIsLower, double* lower, double* upper) {
-  if (!(direct >= kSmallestDirectTail) || !(direct <= 1.0)) return false;
+bool finish(double direct, bool directIsLower, double* lower, double* upper,
+            double floor = kSmallestDirectTail) {
+  if (!(direct >= floor) || !(direct <= 1.0)) return false;
   *lower = directIsLower ? direct : 0.5 + (0.5 - direct);
   *upper = directIsLower ? 0.5 + (0.5 - direct) : direct;
   return true;
@@ -97,7 +106,8 @@ static bool tailsUnguarded(double a, double x, double* lower, double* upper) {
   if (smallShapeGammaRatios(a, x, &p, &q)) return finish(p < q ? p : q, p < q, lower, upper);
   if (temmeGammaRatios(a, x, &p, &q)) {
     // The expansion forms P below a and Q above; the other is 1 minus it.
-    return x < a ? finish(p, true, lower, upper) : finish(q, false, lower, upper);
+    const double floor = temmeFloorApplies(a) ? kSmallestDirectTail : 0.0;
+    return x < a ? finish(p, true, lower, upper, floor) : finish(q, false, lower, upper, floor);
   }
   const double mass = saddle::poissonMass(a, x);  // x^a e^-x / Gamma(a + 1)
   if (!(mass > 0.0)) return false;

@@ -15,7 +15,9 @@ namespace qel {
 namespace gammaratio {
 
 // Both tails for finite a > 0 and x > 0 when the direct tail is at least
-// 1e-280; false otherwise (deep tails, non-convergence), and
+// 1e-280 (at shapes beyond the ELV routines, from Temme's expansion: any
+// tail, 0 below about 2e-306); false
+// otherwise (deep tails, non-convergence), and
 // the caller takes the ELV routine, which carries tails as logarithms.
 bool tails(double a, double x, double* lower, double* upper);
 

@@ -14,6 +14,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
+#include "utilities/distributions/beta_ratio.h"
 #include "utilities/distributions/discrete_rules.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/saddle_density.h"
@@ -22,6 +23,11 @@
 namespace qel {
 
 namespace {
+
+// From here on counts take Loader's mass and the tails the exact-shape
+// route below (k - r + 1 rounds beyond 2^53).
+constexpr double kLargeCount = 1e5;
+constexpr double kExactCountLimit = 9007199254740992.0;
 
 bool isGeometric(double r) {
   return mEqualWithinFuzz(r, 1.0, 0.0);
@@ -54,6 +60,11 @@ double negBinomialMass(double k, double p, double r) {
     value = m == j ? 1.0 : 0.0;
   } else if (j < 0.0 || j > m) {
     value = 0.0;
+  } else if (m >= kLargeCount || j >= kLargeCount) {
+    // C(k-1, r-1) p^r q^(k-r) = (r/k) C(k, r) p^r q^(k-r) by Loader's
+    // saddle-point mass, whose digits do not depend on the size of k and r
+    // (differences of ln Gamma lose them: 1e-9 at r = 1e6).
+    return r / k * saddle::binomialMass(r, k, p, 0.5 + (0.5 - p));
   } else {
     // p b(j; m, p): Loader's saddle-point binomial mass keeps the relative
     // accuracy that ln C(m, j) + j ln p + (m - j) ln(1 - p) loses to the
@@ -63,28 +74,57 @@ double negBinomialMass(double k, double p, double r) {
   return value * p;
 }
 
+// Both tails at a count k > r with m = k - r as the shape (exact where
+// k - r + 1 is not): P(X >= k) = 1 - I_p(r, m) = I_q(m, r), and P(X <= k) =
+// I_p(r, m + 1) = I_p(r, m) + P(X = k) (DLMF 8.17.21). False when BRATIO
+// fails.
+bool largeCountTails(double k, double p, double r, double* lower, double* upper) {
+  const double m = k - r;
+  double w = 0.0, w1 = 0.0;
+  if (!betaratio::anyTails(r, m, p, 0.5 + (0.5 - p), &w, &w1)) return false;
+  *upper = w1;
+  *lower = std::fmin(w + negBinomialMass(k, p, r), 1.0);
+  return true;
+}
+
 // The smallest count k >= r with F(k) >= p, by doubling the distance from r
 // and then bisecting on whole numbers. Both loops are bounded: the doubling
 // ends at the double range, and the bisection stops when no whole number
 // lies strictly between its ends (beyond 2^53 neighbouring doubles differ by
 // more than 1, where a unit step would never move).
+// Whether F(k) >= p, decided on the smaller tail: P(X > k) <= 1 - p for
+// p > 1/2, where F(k) near 1 has lost the digits of 1 - F(k). Missing when
+// a tail has no value.
+double reaches(double k, double p, double prob, double r) {
+  if (p <= 0.5) {
+    const double f = mNegBinomialCdf(k, prob, r, false);
+    return mIsNumericMissing(f) ? f : (f >= p ? 1.0 : 0.0);
+  }
+  // P(X > k) = P(X >= k + 1), or P(X >= k) - P(X = k) where k + 1 rounds.
+  const double above = k + 1.0 < kExactCountLimit
+                           ? mNegBinomialCdf(k + 1.0, prob, r, true)
+                           : mNegBinomialCdf(k, prob, r, true) - mNegBinomialPdf(k, prob, r);
+  return mIsNumericMissing(above) ? above : (above <= 0.5 + (0.5 - p) ? 1.0 : 0.0);
+}
+
 double smallestCountReaching(double p, double prob, double r, double start) {
   double lo = r, hi = start;
   for (;;) {
-    const double f = mNegBinomialCdf(hi, prob, r, false);
+    const double f = reaches(hi, p, prob, r);
     if (mIsNumericMissing(f)) return f;
-    if (f >= p) break;
+    if (f == 1.0) break;
     lo = hi;
     if (hi >= DBL_MAX / 4.0) return mGetMissingValueCode();
     hi = r + 2.0 * (hi - r) + 1.0;
   }
-  if (mNegBinomialCdf(lo, prob, r, false) >= p) return lo;
+  const double atLo = reaches(lo, p, prob, r);
+  if (mIsNumericMissing(atLo) || atLo == 1.0) return atLo == 1.0 ? lo : atLo;
   for (;;) {
     const double mid = std::floor(lo + (hi - lo) / 2.0);
     if (!(mid > lo && mid < hi)) return hi;
-    const double f = mNegBinomialCdf(mid, prob, r, false);
+    const double f = reaches(mid, p, prob, r);
     if (mIsNumericMissing(f)) return f;
-    (f >= p ? hi : lo) = mid;
+    (f == 1.0 ? hi : lo) = mid;
   }
 }
 
@@ -112,6 +152,12 @@ double mNegBinomialPdf(double x, double p, double r) {
 
 double mNegBinomialCdf(double x, double p, double r, bool upperTail) {
   const double k = upperTail ? discrete::upperPoint(x) : discrete::cdfPoint(x);
+  if (!isGeometric(r) && (k - r >= kExactCountLimit || r >= kExactCountLimit) && k > r && p > 0.0 &&
+      p < 1.0) {
+    double lower = 0.0, upper = 0.0;
+    // Where BRATIO refuses (a count near DBL_MAX), the binomial route below.
+    if (largeCountTails(k, p, r, &lower, &upper)) return upperTail ? upper : lower;
+  }
   if (!upperTail) {
     if (k < r) return 0.0;
     if (isGeometric(r)) return oneMinusComplementPower(p, k);
@@ -127,7 +173,7 @@ double mNegBinomialCdf(double x, double p, double r, bool upperTail) {
 double mNegBinomialInvCdf(double p, double prob, double r) {
   try {
     if (p <= mRaiseToPower(prob, r, true)) return r;
-    if (mEqualWithinFuzz(p, 1.0, 0.0) || mEqualWithinFuzz(prob, 0.0, 0.0)) {
+    if (mEqualWithinFuzz(p, 1.0, 0.0) || !(prob > 0.0)) {  // a tiny prob is a valid one
       return mGetMissingValueCode();
     }
     if (isGeometric(r)) {

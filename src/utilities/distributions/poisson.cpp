@@ -11,8 +11,10 @@
 #include "utilities/distributions/discrete_rules.h"
 #include "utilities/distributions/gamma_ratio.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/large_parameters.h"
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/limits.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
 
@@ -33,9 +35,9 @@ double mPoissonPdf(double x, double mean) {
 namespace {
 
 // Beyond this mean the leading term of Temme's expansion alone gives the
-// tails to double precision, and every quantile rounds to the mean (the
-// spread 40 sqrt(mean) is below half its last place); the general route
-// has no answer there (2 mean may even overflow).
+// tails to double precision (the spread 40 sqrt(mean) is below half the
+// mean's last place); the chi-square route has no answer there (2 mean may
+// even overflow).
 constexpr double kHugeMean = 1e40;
 
 // P(X <= k) = Q(k + 1, mean) for a mean beyond kHugeMean by the leading term
@@ -59,10 +61,37 @@ void hugeMeanTails(double k, double mean, double* lower, double* upper) {
   *upper = 0.5 * erfc1(0, -v);
 }
 
+// Counts from 2^53 on, where k + 1 and k - 1 round: P(X <= k) = Q(k, mean) +
+// m_k and P(X > k) = P(k, mean) - m_k, m_k = mean^k e^-mean / k! (the
+// recurrence of the incomplete gamma ratios in the shape, A&S 6.5.21), with
+// the shape k itself exact. A tail that gamma_ratio.h does not give is 0 or
+// 1 to double precision: such a k lies beyond |1 - mean/k| = 1/4.
+void largeCountTails(double k, double mean, double* lower, double* above) {
+  double p = 0.0, q = 0.0;
+  if (!gammaratio::tails(k, mean, &p, &q)) {
+    *lower = k < mean ? 0.0 : 1.0;
+    *above = k < mean ? 1.0 : 0.0;
+    return;
+  }
+  const double m = saddle::poissonMass(k, mean);
+  *lower = std::fmin(q + m, 1.0);
+  *above = std::fmax(p - m, 0.0);
+}
+
+constexpr double kExactCountLimit = 0x1p53;
+
 }  // namespace
 
 // The upper tail P(X >= k) is P(X > k - 1).
 double mPoissonCdf(double x, double mean, bool upperTail) {
+  if (std::isgreaterequal(x, kExactCountLimit) && std::isfinite(mean) && mean > 0.0) {
+    // P(X >= k) = P(k, mean); P(X <= k) from the recurrence.
+    const double j = upperTail ? discrete::upperPoint(x) : discrete::cdfPoint(x);
+    double lower = 0.0, above = 0.0, p = 0.0, q = 0.0;
+    if (upperTail) return gammaratio::tails(j, mean, &p, &q) ? p : (j < mean ? 1.0 : 0.0);
+    largeCountTails(j, mean, &lower, &above);
+    return lower;
+  }
   const double k = upperTail ? discrete::upperPoint(x) - 1.0 : discrete::cdfPoint(x);
   if (k < 0.0) return upperTail ? 1.0 : 0.0;
   if (std::isgreater(mean, kHugeMean)) {
@@ -88,9 +117,24 @@ double mPoissonCdf(double x, double mean, bool upperTail) {
 double mPoissonInvCdf(double p, double mean) {
   if (p == 0.0) return 0.0;
   if (p == 1.0) return mGetMissingValueCode();
-  // The quantile mean + z sqrt(mean) + O(z^2) rounds to the mean itself for
-  // every p the doubles hold (|z| < 40).
-  if (std::isgreater(mean, kHugeMean) && p > 0.0 && p < 1.0) return std::floor(mean);
+  if (std::isgreater(mean, elv::kMaxShape) && p > 0.0 && p < 1.0) {
+    // Beyond the ELV routine's means: the search on the tails from the
+    // Cornish-Fisher start; beyond 2^53 the smallest double at or above the
+    // quantile (large_parameters.h).
+    const TailPair tails = [mean](double j, double* lower, double* above) {
+      if (j >= kExactCountLimit) {
+        largeCountTails(j, mean, lower, above);
+      } else {
+        *lower = mPoissonCdf(j, mean, false);
+        *above = mPoissonCdf(j + 1.0, mean, true);
+      }
+      return !mIsNumericMissing(*lower) && !mIsNumericMissing(*above);
+    };
+    const double sd = std::sqrt(mean);
+    const double start = large::cornishFisherStart(p, mean, sd, 1.0 / sd, 0.0);
+    const double q = large::discreteQuantile(tails, p, 0.0, start, sd);
+    return std::isnan(q) ? mGetMissingValueCode() : q;
+  }
   unsigned long k = 0;
   double fraction = 0.0;
   const bool lowerRoutine = p <= 0.5;

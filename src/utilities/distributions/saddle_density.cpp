@@ -99,11 +99,13 @@ double bd0(double x, double m) {
   // The series has terms of one sign; Loader takes it for |v| < 0.1, taken
   // here up to |v| < 0.5 (some 25 terms), where the closed form would lose
   // up to a digit and a half to cancellation.
-  if (std::fabs(x - m) < 0.5 * (x + m)) {
+  // x + m is formed from the halves: at x = m = DBL_MAX it would overflow.
+  const double halfSum = 0.5 * x + 0.5 * m;
+  if (std::fabs(x - m) < halfSum) {
     // With v = (x - m)/(x + m) the deviance is (x - m) v + 2 x sum v^(2j+1)/(2j+1).
-    double v = (x - m) / (x + m);
+    double v = (0.5 * x - 0.5 * m) / halfSum;
     double s = (x - m) * v;
-    double term = 2.0 * x * v;
+    double term = x * (2.0 * v);
     v *= v;
     for (int j = 1; j < 1000; ++j) {
       term *= v;
@@ -124,7 +126,8 @@ double poissonMass(double x, double m) {
   if (m == 0.0) return x == 0.0 ? 1.0 : 0.0;
   if (x < 0.0) return 0.0;
   if (x == 0.0) return checkedExp(-m);
-  return checkedExp(-stirlerr(x) - bd0(x, m)) / std::sqrt(k2Pi * x);
+  // sqrt(2 pi) sqrt(x): 2 pi x overflows near DBL_MAX.
+  return checkedExp(-stirlerr(x) - bd0(x, m)) / (2.5066282746310005024 * std::sqrt(x));
 }
 
 double binomialMass(double x, double n, double p, double q) {
@@ -196,6 +199,8 @@ struct UnitPoint {
 // ln of Gamma(x+y+1)/(Gamma(x+1) Gamma(y+1)) p^x q^y as core + lf, with the
 // direct factor in *f (0 when not formed); x, y >= 0 given apart so that
 // neither is lost in the rounding of x + y.
+constexpr double kLargeDirect = 1e300;
+
 double binomialCore(double x, double y, const UnitPoint& u, double* f, double* lf) {
   *f = 1.0;
   *lf = 0.0;
@@ -208,6 +213,10 @@ double binomialCore(double x, double y, const UnitPoint& u, double* f, double* l
   const double lx = checkedLog(x), ly = checkedLog(y);
   *lf = 0.5 * (ln - lx - ly) - kLnSqrt2Pi;
   *f = direct({x, y, n}) ? std::sqrt(n / (k2Pi * x * y)) : 0.0;
+  // Large counts: the same factor as sqrt((n/x) / (2 pi y)), free of
+  // overflow, rather than through logarithms near 690, whose rounding would
+  // cost the density 1e-13.
+  if (*f == 0.0 && x >= 1.0 && y >= 1.0 && y <= kLargeDirect) *f = std::sqrt((n / x) / (k2Pi * y));
   return core;
 }
 
@@ -216,7 +225,8 @@ double binomialCore(double x, double y, const UnitPoint& u, double* f, double* l
 // a + b trials times a b / ((a + b) p q).
 double betaAt(const UnitPoint& u, double a, double b) {
   double f = 0.0, lf = 0.0, core = 0.0;
-  if (a >= 1.0 && b >= 1.0) {
+  // Shapes from 2^53 on, where a - 1 rounds, take the second form.
+  if (a >= 1.0 && b >= 1.0 && a < 0x1p53 && b < 0x1p53) {
     core = binomialCore(a - 1.0, b - 1.0, u, &f, &lf);
     const double c = a + b - 1.0;
     lf += checkedLog(c);
@@ -224,7 +234,8 @@ double betaAt(const UnitPoint& u, double a, double b) {
   } else {
     core = binomialCore(a, b, u, &f, &lf);
     lf += checkedLog(a) + checkedLog(b) - checkedLog(a + b) - u.lp - u.lq;
-    f = direct({a, b, u.p, u.q}) ? f * (a / (a + b)) * (b / (u.p * u.q)) : 0.0;
+    const bool large = f > 0.0 && b <= kLargeDirect && u.p * u.q >= 1e-8;
+    f = direct({a, b, u.p, u.q}) || large ? f * (a / (a + b)) * (b / (u.p * u.q)) : 0.0;
   }
   return scaledExp(core, f, lf);
 }
@@ -237,14 +248,18 @@ double gammaDensity(double d, double shape, double scale) {
   if (!(d > 0.0)) return 0.0;
   const double ls = checkedLog(scale), lz = checkedLog(d) - ls;
   const double z = lz > 708.0 ? HUGE_VAL : lz < -708.0 ? 0.0 : d / scale;
-  const double k = shape < 1.0 ? shape : shape - 1.0;
+  // z^(shape-1) e^-z / Gamma(shape) as the Poisson mass at shape - 1, or, for
+  // a shape below 1 or beyond 2^53 (where shape - 1 rounds), as shape/z times
+  // the mass at shape.
+  const bool byShape = shape < 1.0 || shape >= 0x1p53;
+  const double k = byShape ? shape : shape - 1.0;
   double core = -z, lf = -ls, f = 1.0 / scale;
   if (k > 0.0) {
     core = -stirlerr(k) - deviance(k, z, lz);
     lf -= kLnSqrt2Pi + 0.5 * checkedLog(k);
     f = direct({k, scale}) ? f / std::sqrt(k2Pi * k) : 0.0;
   }
-  if (shape < 1.0) {
+  if (byShape) {
     lf += checkedLog(shape) - lz;
     f = direct({shape, z, scale}) ? f * (shape / z) : 0.0;
   }
@@ -327,7 +342,10 @@ double fDensity(double x, double m, double n) {
   const double core = stirlerr(N) - stirlerr(a) - stirlerr(b) - relativeDeviance(a, t, ut) -
                       relativeDeviance(b, s, us);
   const double lf = 0.5 * (checkedLog(a) + checkedLog(b) - checkedLog(N)) - kLnSqrt2Pi - lx;
-  const double f = direct({wa, b, x}) ? std::sqrt(wa * b / k2Pi) / x : 0.0;
+  // wa b <= b: no overflow for any b up to 1e300 (logarithms near 690
+  // would cost 1e-13).
+  const bool large = wa >= kDirectLow && b <= kLargeDirect && x >= kDirectLow && x <= kDirectHigh;
+  const double f = direct({wa, b, x}) || large ? std::sqrt(wa * b / k2Pi) / x : 0.0;
   return scaledExp(core, f, lf);
 }
 

@@ -13,6 +13,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/beta_ratio.h"
 #include "utilities/distributions/kernels.h"
+#include "utilities/distributions/large_parameters.h"
 #include "utilities/distributions/log_gamma.h"
 #include "utilities/distributions/noncentral_t.h"
 #include "utilities/distributions/pvalue.h"
@@ -20,6 +21,7 @@
 #include "utilities/distributions/small_shape_quantile.h"
 #include "utilities/distributions/small_shape_tails.h"
 #include "utilities/distributions/tail_quantile.h"
+#include "utilities/elv/normal_precise.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
 #include "utilities/special_functions/transcendental.h"
@@ -36,6 +38,8 @@ constexpr double kElvWidthFactor = 6.1738;
 constexpr int kElvDomainStatus = 3;
 
 // The central t quantile by the ELV routine for the nearer tail.
+constexpr double kNormalQuantileDf = 1e20;
+
 double centralTQuantile(double p, double df) {
   if (!mPositiveShapes(df)) return mGetMissingValueCode();
   if (std::islessequal(df, smallshape::kTinyShape) && p > 0.0 && p < 1.0) {
@@ -46,6 +50,12 @@ double centralTQuantile(double p, double df) {
       return mTCdf(x, df, 0.0, lower, upper);
     };
     return smallshape::quantile(tails, p, TailSupport::RealLine, p < 0.5 ? -1.0 : 1.0);
+  }
+  if (df > kNormalQuantileDf && p > 0.0 && p < 1.0) {
+    // z + (z^3 + z) / (4 df) + O(df^-2) (Abramowitz & Stegun 26.7.5): the
+    // second term is below 1e-17 z for |z| < 40 at these df.
+    const double z = elv::normalQuantile(p);
+    return z + (z * z * z + z) / (4.0 * df);
   }
   double q = 0.0;
   const ElvStatus status =
@@ -87,7 +97,11 @@ bool centralTByIncompleteBeta(double t, double n, double* lower, double* upper) 
   const double t2 = t * t;
   const double s = n + t2;
   double ratio = 0.0, complement = 0.0;
-  if (!betaratio::fastTails(n / 2.0, 0.5, n / s, t2 / s, &ratio, &complement)) return false;
+  // Beyond the ELV routine's df, BRATIO's deep tails too (no other route).
+  if (!betaratio::fastTails(n / 2.0, 0.5, n / s, t2 / s, &ratio, &complement) &&
+      !(n > kElvMaxDf && betaratio::anyTails(n / 2.0, 0.5, n / s, t2 / s, &ratio, &complement))) {
+    return false;
+  }
   *(t < 0.0 ? lower : upper) = 0.5 * ratio;
   *(t < 0.0 ? upper : lower) = 0.5 + 0.5 * complement;
   return true;
@@ -130,7 +144,17 @@ bool tinyDfTails(double t, double n, double* lower, double* upper) {
 }
 
 // The starting bracket of the noncentral quantile search.
+constexpr double kNormalLimitDf = 1e10;
+
 void startingBracket(double p, double df, double noncentrality, double* x1, double* x2) {
+  if (df > kNormalLimitDf) {
+    // The normal limit N(delta, 1): the ln Gamma difference below would
+    // cancel to nothing (and the variance to a negative number).
+    const double a = p >= 0.5 ? p : p / 1.1, b = p >= 0.5 ? 1.0 - (1.0 - p) / 1.1 : p;
+    *x1 = noncentrality + mNormalInvCdf(a, 0.0, 1.0);
+    *x2 = noncentrality + mNormalInvCdf(b, 0.0, 1.0);
+    return;
+  }
   double mean = noncentrality;
   if (df > 1.0) {
     mean = noncentrality * std::sqrt(df / 2.0) *
@@ -218,6 +242,9 @@ bool mTCdf(double x, double df, double noncentrality, double* lower, double* upp
     }
     if (noncentrality != 0.0 && elv::elvPrecision() == elv::ElvPrecision::Full &&
         nct::tails(x, df, noncentrality, lower, upper)) {
+      return true;
+    }
+    if (noncentrality != 0.0 && large::noncentralTTails(x, df, noncentrality, lower, upper)) {
       return true;
     }
     status = elv_t_ncdf(x, df, noncentrality, lower, upper);

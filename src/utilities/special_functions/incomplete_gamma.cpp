@@ -216,11 +216,13 @@ Ratios fromPrefactor(double a, double x, double r, double acc, double x0, double
 }
 
 // Temme's expansion with c = e^-y and w = exp(y) erfc(sqrt y)/2 (or their
-// forms at l = 1); full coefficient set unless |s| is small.
-Ratios temme(double a, double l, double z, double c, double w, bool shortForm, double rta) {
+// forms at l = 1); full coefficient set unless |s| is small. below: x < a
+// (the sign of eta, from the exact difference x - a rather than the rounded
+// ratio l = x/a, which is 1 for neighbouring doubles at a beyond 1e16).
+Ratios temme(double a, bool below, double z, double c, double w, bool shortForm, double rta) {
   const double u = 1.0 / a;
   z = std::sqrt(z + z);
-  if (l < 1.0) z = -z;
+  if (below) z = -z;
   double c0, c1, c2, c3, c4, c5, c6;
   if (shortForm) {
     c0 = temmeCoefficient(-kThird, kD0, 7, z);
@@ -240,7 +242,7 @@ Ratios temme(double a, double l, double z, double c, double w, bool shortForm, d
     c6 = temmeCoefficient(kD60, kD6, 2, z);
   }
   const double t = ((((((kD70 * u + c6) * u + c5) * u + c4) * u + c3) * u + c2) * u + c1) * u + c0;
-  if (l >= 1.0) return fromQ(c * (w + kRt2pin * t / rta));
+  if (!below) return fromQ(c * (w + kRt2pin * t / rta));
   return fromP(c * (w - kRt2pin * t / rta));
 }
 
@@ -263,31 +265,36 @@ double rlogOfDifference(double d) {
   return d * v - sum;
 }
 
-Ratios largeShape(double a, double x, double acc, double e0, double x0, double e) {
+// GRATIO answers "indeterminate" where a e^2 > 3.28e-3 (a beyond 6.7e28)
+// near x = a, because it forms l = x/a, which has lost the digits of x - a
+// there; mIncompleteGamma keeps that answer (written). With exactNearA,
+// eta comes from the exact difference x - a (rlogOfDifference), so exp(-y)
+// and erfc(sqrt y) are evaluated in full at every a; the Taylor forms of
+// the window |s| <= e0/sqrt(a) serve only the shapes GRATIO allows.
+Ratios largeShape(double a, double x, double acc, double e0, double x0, double e,
+                  bool exactNearA = false) {
   const double l = x / a;
   if (l == 0.0) return kZero;
   const double s = 0.5 + (0.5 - l);
+  const bool below = x < a;
+  const bool beyondGratio = a * e * e > 3.28e-3;
+  if (beyondGratio && !exactNearA && std::fabs(s) <= 2.0 * e) return kIndeterminate;
   // rlog(l) from l - 1 = (x - a)/a: the difference x - a is exact near
   // l = 1, where the rounded l would cost rlog its relative accuracy.
   const double z = rlogOfDifference((x - a) / a);
-  if (z >= 700.0 / a) {
-    if (std::fabs(s) <= 2.0 * e) return kIndeterminate;
-    return (x <= a) ? kZero : kOne;
-  }
+  if (z >= 700.0 / a) return below ? kZero : kOne;
   const double y = a * z;
   const double rta = std::sqrt(a);
-  if (std::fabs(s) <= e0 / rta) {
+  if (std::fabs(s) <= e0 / rta && !beyondGratio) {
     // Near l = 1: exp(-y) and exp(y) erfc(sqrt y) by their Taylor forms.
-    if (a * e * e > 3.28e-3) return kIndeterminate;
     const double c = 0.5 + (0.5 - y);
     const double w = (0.5 - std::sqrt(y) * (0.5 + (0.5 - y / 3.0)) / kRtpi) / c;
-    return temme(a, l, z, c, w, true, rta);
+    return temme(a, below, z, c, w, true, rta);
   }
   if (std::fabs(s) <= 0.4) {
-    if (std::fabs(s) <= 2.0 * e && a * e * e > 3.28e-3) return kIndeterminate;
     const double c = std::exp(-y);
     const double w = 0.5 * erfc1(1, std::sqrt(y));
-    return temme(a, l, z, c, w, std::fabs(s) <= 1.e-3, rta);
+    return temme(a, below, z, c, w, std::fabs(s) <= 1.e-3, rta);
   }
   // Stirling's series for Gamma(a) in the prefactor.
   const double t = (1.0 / a) * (1.0 / a);
@@ -351,8 +358,8 @@ bool temmeGammaRatios(double a, double x, double* p, double* q) {
   if (!(a >= kTemmeSmallestShape) || !(x > 0.0) || std::isinf(a) || std::isinf(x)) return false;
   const double s = 0.5 + (0.5 - x / a);
   if (!(std::fabs(s) <= kTemmeReach)) return false;
-  const Ratios r =
-      largeShape(a, x, std::max(kAcc0[kLevel], spmpar(1)), kE00[kLevel], kX00[kLevel], spmpar(1));
+  const Ratios r = largeShape(a, x, std::max(kAcc0[kLevel], spmpar(1)), kE00[kLevel], kX00[kLevel],
+                              spmpar(1), true);
   if (r.indeterminate) return false;
   *p = r.p;
   *q = r.q;
