@@ -279,6 +279,17 @@ bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double*
     return true;
   }
   if (noncentrality == 0.0 && gammaratio::fastTails(df / 2.0, x / 2.0, lower, upper)) return true;
+  if (noncentrality > 0.0 && x < 2.0 * smallshape::kTinyArgument && df >= 2.0 * DBL_MIN &&
+      smallShapeGammaTails(df / 2.0, x / 2.0, x, 2.0, true, lower, upper)) {
+    // Below 2e-280 only the first term of the Poisson mixture
+    // sum_j e^-L L^j/j! P(df/2 + j, x/2), L = noncentrality/2, counts (the
+    // next is smaller by x L/(df + 2)); the ELV routine underflows there.
+    const double L = 0.5 * noncentrality;
+    const double weight = L > 708.0 ? 0.0 : std::exp(-L);
+    *lower *= weight;
+    *upper = -std::expm1(-L) + weight * *upper;
+    return true;
+  }
   if (ElvFailed(elv_chi2_ncdf(x, df, noncentrality, lower, upper))) {
     *lower = *upper = mGetMissingValueCode();
     return false;
