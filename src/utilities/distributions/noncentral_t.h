@@ -21,6 +21,11 @@ constexpr double kTinyDfLimit = 0.01;
 // (noncentral_t_tiny_df.cpp). False outside that range.
 bool tinyDfTails(double t, double df, double delta, double* lower, double* upper);
 
+// The density at t != 0 for 4 DBL_MIN <= df < kTinyDfLimit (NaN outside),
+// by the same integral, where the recurrence between distribution
+// functions at df and df + 2 cancels.
+double tinyDfDensity(double t, double df, double delta);
+
 }  // namespace nct
 }  // namespace qel
 

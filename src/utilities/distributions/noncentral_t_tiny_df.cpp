@@ -39,14 +39,17 @@ namespace nct {
 
 namespace {
 
-constexpr double kLnSqrt2Pi = 0.91893853320467274178;
+constexpr double kInvSqrt2Pi = 0.39894228040143267794;
 constexpr double kLnTwo = 0.69314718055994530942;
 // Exponents below this give exp() = 0 (and the armed state would trap on
 // the subnormal result).
 constexpr double kExpFloor = -708.39;
 // Agreement of a panel with its halves, relative to the first estimate of
-// the integral, and the depth of the halving.
-constexpr double kPanelTolerance = 1e-16;
+// the integral, and the depth of the halving. The difference bounds the
+// error of the whole panel's rule; the halves', returned, is smaller by
+// orders of magnitude (the rule converges geometrically in the panel width
+// for these analytic integrands), so 1e-13 leaves them near rounding.
+constexpr double kPanelTolerance = 1e-13;
 constexpr int kMaxDepth = 8;
 
 // Positive nodes and weights of the 16-point Gauss-Legendre rule on [-1, 1].
@@ -71,28 +74,58 @@ struct Pair {
 // the logarithmic piece, times the Jacobian v) or at v (the linear piece).
 class Integrand {
  public:
-  Integrand(double n, double a, double c) : shape_(0.5 * n), c_(c) {
+  // With density set, the first integrand is phi(c + v) v^n e^-z instead
+  // (the second 0): the density of T up to a factor.
+  Integrand(double n, double a, double c, bool density = false)
+      : shape_(0.5 * n), c_(c), density_(density) {
     // ln z = ln(n/2) - 2 ln a + 2 ln v.
     lzOffset_ = std::log(shape_) - 2.0 * std::log(a);
+    // phi(c) with c^2 split exactly into hi + lo (fma), so that no rounding
+    // of c^2/2 (up to 700) enters the exponent.
+    const double hi = c * c, lo = std::fma(c, c, -hi);
+    phiC_ = 0.5 * hi > -kExpFloor ? 0.0 : std::exp(-0.5 * hi) * (1.0 - 0.5 * lo) * kInvSqrt2Pi;
   }
 
   // ln v at which z = 1.
   double turn() const { return -0.5 * lzOffset_; }
 
   Pair atLog(double w) const {
-    const double v = w < kExpFloor ? 0.0 : std::exp(w);
-    return at(v, lzOffset_ + 2.0 * w, w);
+    if (w < kExpFloor) return Pair{};
+    const double v = std::exp(w);
+    return at(v, lzOffset_ + 2.0 * w, v * shifted(v));
   }
 
-  Pair atLinear(double v) const { return at(v, lzOffset_ + 2.0 * std::log(v), 0.0); }
+  // The linear piece runs over r = v for c >= 0 and over r = c + v for
+  // c < 0: the variable that is small where phi(c + v) counts, so that its
+  // nodes, not a rounded sum with c, carry the normal factor (the rounding
+  // of c + v moves phi by |c + v| ulp(c), 2e-14 at c = 10, and more for
+  // larger c).
+  Pair atLinear(double r) const {
+    if (c_ >= 0.0) return at(r, lzOffset_ + 2.0 * std::log(r), shifted(r));
+    const double e = -0.5 * r * r;
+    if (e < kExpFloor) return Pair{};
+    const double v = r - c_;
+    return at(v, lzOffset_ + 2.0 * std::log(v), kInvSqrt2Pi * std::exp(e));
+  }
 
  private:
-  Pair at(double v, double lz, double logJacobian) const {
-    const double u = c_ + v;
-    const double e = logJacobian - 0.5 * u * u - kLnSqrt2Pi;
+  // phi(c + v) as phi(c) e^(-v (c + v/2)), for v small beside 1/|c| or
+  // c >= 0.
+  double shifted(double v) const {
+    const double e = -v * (c_ + 0.5 * v);
+    return e < kExpFloor ? 0.0 : phiC_ * std::exp(e);
+  }
+
+  // density times G(v/a) and G~(v/a), z = e^lz.
+  Pair at(double v, double lz, double density) const {
     Pair p;
-    if (e < kExpFloor) return p;
-    const double density = std::exp(e);
+    if (!(density > 0.0) || !(v > 0.0)) return p;
+    if (density_) {
+      // v^n e^-z = e^(n ln v - z), with 2 ln v = lz - lzOffset.
+      const double e = shape_ * (lz - lzOffset_) - (lz > 709.0 ? HUGE_VAL : std::exp(lz));
+      p.g = e < kExpFloor ? 0.0 : density * std::exp(e);
+      return p;
+    }
     double lower = 0.0, upper = 0.0;
     chiTails(lz, &lower, &upper);
     p.g = density * lower;
@@ -118,7 +151,8 @@ class Integrand {
     *upper = 0.0;
   }
 
-  double shape_, c_, lzOffset_;
+  double shape_, c_, lzOffset_, phiC_;
+  bool density_;
 };
 
 template <class F>
@@ -179,37 +213,43 @@ void logPanels(const Integrand& f, double top, Panel* panels, int* count, int ca
 }
 
 // Panels of the linear piece, v from v0 = 1/(1 + |c|) (or from where
-// phi(c + v) < 1e-330 for c < -39): widths growing from v0/2 by half each
-// step (the turn of G may sit just above v0) up to 2/(1 + max(c + v, 0))
-// and at most 1, until the normal factor has fallen below 1e-21 of its
-// largest value on the piece.
+// phi(c + v) < 1e-330 for c < -39), in the variable r of
+// Integrand::atLinear: widths growing from v0/2 by half each step (the turn
+// of G may sit just above v0) up to 2/(1 + max(c + v, 0)) and at most 1,
+// until the normal factor has fallen below 1e-21 of its largest value on
+// the piece.
 void linearPanels(const Integrand& f, double c, double v0, Panel* panels, int* count, int capacity,
                   Pair* sum) {
   const double start = std::max(v0, -c - 39.0);
   const double u0 = c + start;
   const double uEnd = u0 > 0.0 ? std::sqrt(u0 * u0 + 97.0) : 9.9;
-  const double vEnd = uEnd - c;
-  auto atLinear = [&f](double v) { return f.atLinear(v); };
-  double lo = start;
-  while (lo < vEnd && *count < capacity) {
-    const double width = std::min({0.5 * lo, 2.0 / (1.0 + std::max(c + lo, 0.0)), 1.0});
-    const double hi = std::min(lo + width, vEnd);
-    const Pair v = gauss16(atLinear, lo, hi);
-    panels[(*count)++] = {false, lo, hi, v};
-    *sum += v;
+  const double shift = c >= 0.0 ? 0.0 : c;  // r = v - shift
+  const double rEnd = c >= 0.0 ? uEnd - c : uEnd;
+  auto atLinear = [&f](double r) { return f.atLinear(r); };
+  double lo = c >= 0.0 ? start : u0;
+  while (lo < rEnd && *count < capacity) {
+    const double v = lo - shift, u = c + v;
+    const double width = std::min({0.5 * v, 2.0 / (1.0 + std::max(u, 0.0)), 1.0});
+    const double hi = std::min(lo + width, rEnd);
+    const Pair value = gauss16(atLinear, lo, hi);
+    panels[(*count)++] = {false, lo, hi, value};
+    *sum += value;
     lo = hi;
   }
 }
 
 // int_0^inf phi(c + v) G(v/a) dv and the same with G~, for a > 0.
-Pair integrals(double n, double a, double c) {
-  const Integrand f(n, a, c);
+Pair integrals(double n, double a, double c, bool density = false) {
+  const Integrand f(n, a, c, density);
   constexpr int kCapacity = 400;
   Panel panels[kCapacity];
   int count = 0;
   Pair first;
   const double v0 = 1.0 / (1.0 + std::fabs(c));
-  logPanels(f, std::log(v0), panels, &count, kCapacity / 2, &first);
+  // The density's integrand vanishes (e^-z, z > e^8) beyond the turn + 4,
+  // and its mass may lie anywhere below.
+  const double top = density ? std::min(std::log(v0), f.turn() + 4.0) : std::log(v0);
+  logPanels(f, top, panels, &count, kCapacity / 2, &first);
   linearPanels(f, c, v0, panels, &count, kCapacity, &first);
   const Pair tolerance{kPanelTolerance * first.g, kPanelTolerance * first.gc};
   auto atLog = [&f](double w) { return f.atLog(w); };
@@ -217,6 +257,10 @@ Pair integrals(double n, double a, double c) {
   Pair sum;
   for (int i = 0; i < count; ++i) {
     const Panel& p = panels[i];
+    if (std::fabs(p.value.g) <= tolerance.g && std::fabs(p.value.gc) <= tolerance.gc) {
+      sum += p.value;  // too small for its error to count
+      continue;
+    }
     sum += p.logarithmic ? refine(atLog, p.lo, p.hi, p.value, tolerance, kMaxDepth)
                          : refine(atLinear, p.lo, p.hi, p.value, tolerance, kMaxDepth);
   }
@@ -252,6 +296,24 @@ bool tinyDfTails(double t, double df, double delta, double* lower, double* upper
   *lower = std::min(std::max(lo, 0.0), 1.0);
   *upper = std::min(std::max(up, 0.0), 1.0);
   return true;
+}
+
+// f(t) = E[S phi(t S - delta)] over the density C s^(n-1) e^(-n s^2/2) of
+// S, C = 2 (n/2)^(n/2)/Gamma(n/2); with v = |t| s,
+//   f(t) = C |t|^-(1+n) int_0^inf phi(v -+ delta) v^n e^(-n v^2/(2 t^2)) dv,
+// a positive integrand on the panels of the tails.
+double tinyDfDensity(double t, double df, double delta) {
+  if (!(df >= 4.0 * DBL_MIN && df < kTinyDfLimit) || !std::isfinite(t) || t == 0.0 ||
+      !std::isfinite(delta)) {
+    return std::nan("");
+  }
+  const double a = std::fabs(t), c = t > 0.0 ? -delta : delta;
+  const double integral = integrals(df, a, c, true).g;
+  if (!(integral > 0.0)) return 0.0;
+  const double m = 0.5 * df;
+  const double logC = kLnTwo + m * std::log(m) - std::lgamma(m);
+  const double e = logC - (1.0 + df) * std::log(a) + std::log(integral);
+  return e < kExpFloor ? 0.0 : e > 709.0 ? HUGE_VAL : std::exp(e);
 }
 
 }  // namespace nct
