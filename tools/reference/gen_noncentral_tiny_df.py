@@ -10,14 +10,18 @@ taken as an integral over the density of y = ln S,
 which at tiny n is nearly flat (about n) over the hundreds of units of y
 that separate the mass of S near 0 from its chi-square body at
 sqrt(2/n); mpmath's tanh-sinh rule on unit pieces of y, with extra points
-where Phi(t e^y - delta) turns, resolves it. Below t e^y = 1e-60 the
-bracket is phi(delta) t e^y and the piece is summed in closed form. The
+where Phi(t e^y - delta) turns, resolves it. Below t e^y = 1e-25 the
+bracket is phi(delta) t e^y (to 1e-25 of itself) and the piece is summed in
+closed form. The
 differences of Phi are formed from the smaller tails, so no digits go in
 the subtraction. Working precision 30 digits.
 
 Checks (assertions): at delta = 0 the tails equal the central t's beta
 expression (1/2) I_{n/(n+t^2)}(n/2, 1/2); at n = 1e-300 they equal the
-n -> 0 limits Phi(-delta), Phi(delta) to 1e-290; lower + upper = 1.
+n -> 0 limits Phi(-delta), Phi(delta) to 1e-290; lower + upper = 1; at a
+few points they equal the integral over the normal law of the chi-square
+tails, P(T <= t) = int_0^inf phi(v + delta) P(n/2, n v^2/(2 t^2)) dv for
+t < 0 (and Phi(-delta) plus the same with phi(v - delta) and Q for t > 0).
 
 Each quantile solves P(T <= q) = p in w = ln|q| on the side of 0 given by
 the sign of p - Phi(-delta) (Illinois method after a bisection to unit
@@ -72,8 +76,8 @@ def log_chi_constant(n):
 
 
 def pieces(t, n, delta, y0, y_top):
-    """Break points in y: unit steps within 8 of where Phi(t e^y - delta)
-    turns (t e^y near delta and near 1) and of the chi body at
+    """Break points in y: unit steps up to 8 past where Phi(t e^y - delta)
+    turns (t e^y near delta and near 1) and within 8 of the chi body at
     ln sqrt(2/n), steps of 1/2 in t e^y across delta -+ 12, steps of 16
     between."""
     at = abs(t)
@@ -81,10 +85,13 @@ def pieces(t, n, delta, y0, y_top):
     if delta != 0:
         centres.append(mpmath.log(abs(delta) / at))
     points = {y0, y_top}
+    # Unit steps left of where t e^y reaches 1, in which the integrand falls
+    # like e^y (wider pieces lose digits there), steps of 16 right of it,
+    # where it is nearly flat.
     y = y0
     while y < y_top:
         points.add(y)
-        y += 16
+        y += 1 if y < centres[0] else 16
     for c in centres:
         for k in range(-8, 9):
             v = c + k
@@ -94,6 +101,13 @@ def pieces(t, n, delta, y0, y_top):
         v = delta + k / mpf(2)
         if v > 0 and y0 < mpmath.log(v / at) < y_top:
             points.add(mpmath.log(v / at))
+    # Where |t| e^y is near 1/(|delta| + 1), the scale on which
+    # Phi(t e^y - delta) moves when t and delta have opposite signs: steps
+    # of ln(2)/2.
+    for k in range(-30, 15):
+        v = mpmath.log(mpf(2) ** (k / mpf(2)) / (abs(delta) + 1) / at)
+        if y0 < v < y_top:
+            points.add(v)
     return sorted(points)
 
 
@@ -105,14 +119,19 @@ def integral_j(t, n, delta):
         return mpmath.exp(log_c + n * y - n * mpmath.exp(2 * y) / 2)
 
     at = abs(t)
-    y0 = mpmath.log(mpf(10) ** -60 / at)
+    y0 = mpmath.log(mpf(10) ** -25 / at)
     y_top = mpmath.log(mpmath.sqrt(400 / n))
     # Closed form below y0: C phi(delta) t int e^((1 + n) y) dy, with
     # e^(-n e^(2y)/2) = 1 there.
     head = mpmath.exp(log_c + (1 + n) * y0) * mpmath.npdf(delta) * t / (1 + n)
-    body = mpmath.quad(lambda y: g(y) * phi_difference(t * mpmath.exp(y) - delta, -delta),
-                       pieces(t, n, delta, y0, y_top))
-    return head + body
+    # mpmath's quad stops on an absolute error of about 10^-dps: the
+    # integrand is divided by n Phi(-|delta|), within a factor 1e4 of |J| or
+    # above it, so that the stop is relative to J.
+    scale = n * upper_normal(abs(delta))
+    body = mpmath.quad(
+        lambda y: g(y) * phi_difference(t * mpmath.exp(y) - delta, -delta) / scale,
+        pieces(t, n, delta, y0, y_top))
+    return head + body * scale
 
 
 def density(t, n, delta):
@@ -121,9 +140,10 @@ def density(t, n, delta):
         log_c = log_chi_constant(n)
         y0 = mpmath.log(mpf(10) ** -30 / abs(t))
         y_top = mpmath.log(mpmath.sqrt(400 / n))
-        return mpmath.quad(
+        scale = n * upper_normal(abs(delta)) / max(1, abs(t))  # as in integral_j
+        return scale * mpmath.quad(
             lambda y: mpmath.exp(log_c + (1 + n) * y - n * mpmath.exp(2 * y) / 2) *
-            mpmath.npdf(t * mpmath.exp(y) - delta), pieces(t, n, delta, y0, y_top))
+            mpmath.npdf(t * mpmath.exp(y) - delta) / scale, pieces(t, n, delta, y0, y_top))
 
 
 def tails(t, n, delta):
@@ -183,7 +203,26 @@ def quantile(p, n, delta):
     return q, abs(p / (q * density(q, n, delta)))
 
 
+def by_parts_lower(t, n, delta):
+    """P(T <= t) as the integral over the normal law of the chi-square tails
+    (mpmath's incomplete gamma): a second route for the checks."""
+    def g(v):
+        return mpmath.gammainc(n / 2, 0, n * v * v / (2 * t * t), regularized=True)
+
+    cuts = [0] + [mpf(2) ** k for k in range(-12, 7)] + [mpmath.inf]
+    scale = upper_normal(abs(delta))  # a relative stop for quad, as in integral_j
+    if t > 0:
+        return lower_normal(-delta) + scale * mpmath.quad(
+            lambda v: mpmath.npdf(v - delta) * (1 - g(v)) / scale, cuts)
+    return scale * mpmath.quad(lambda v: mpmath.npdf(v + delta) * g(v) / scale, cuts)
+
+
 def self_checks():
+    for t, n, delta in ((-1e10, 1e-3, 10.0), (2.0, 1e-3, 1.0), (-2.0, 1e-6, 0.5),
+                        (1e10, 1e-3, 10.0)):
+        lo = tails(d(t), d(n), d(delta))[0]
+        other = by_parts_lower(d(t), d(n), d(delta))
+        assert abs(lo - other) <= mpf(10) ** -22 * lo, (t, n, delta, lo, other)
     for n in (1e-300, 1e-20, 1e-3):
         for t in (-2.0, 1e-5, 1e10):
             lo, up = tails(d(t), d(n), mpf(0))
