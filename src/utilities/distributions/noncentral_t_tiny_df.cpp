@@ -1,4 +1,4 @@
-// Noncentral t tails at df below 0.01 (see noncentral_t.h).
+// Noncentral t tails and density at df below 0.01 (see noncentral_t.h).
 //
 // T = (Z + delta)/S with S = sqrt(V/n), V chi-square with n df. At tiny n
 // almost all the mass of S lies near 0 (P(S <= s) = P(n/2, n s^2/2), about
@@ -24,7 +24,7 @@
 // v = 1/(1 + delta)), and the normal factor in v itself beyond. Each piece
 // is cut into panels of the 16-point Gauss-Legendre rule, each panel halved
 // until its two halves agree with it (adaptive bisection; Davis &
-// Rabinowitz, Methods of Numerical Integration, 2nd ed., 1984, section 6.2).
+// Rabinowitz, Methods of Numerical Integration, 2nd ed., 1984, chapter 6).
 #include <algorithm>
 #include <cfloat>
 #include <cmath>
@@ -52,7 +52,8 @@ constexpr double kExpFloor = -708.39;
 constexpr double kPanelTolerance = 1e-13;
 constexpr int kMaxDepth = 8;
 
-// Positive nodes and weights of the 16-point Gauss-Legendre rule on [-1, 1].
+// Positive nodes and weights of the 16-point Gauss-Legendre rule on [-1, 1]
+// (Abramowitz & Stegun 25.4.30).
 constexpr double kNode[8] = {0.98940093499164993, 0.94457502307323258, 0.86563120238783174,
                              0.75540440835500303, 0.61787624440264375, 0.45801677765722739,
                              0.28160355077925891, 0.09501250983763744};
