@@ -90,6 +90,29 @@ bool tinyBetaLogLower(double lz, double s, double t, double* out) {
 // component that counts underflows (otherwise no answer: *lower = NaN).
 // Tails below a bound under e^-760 are 0 without further work.
 // False where neither argument is that small, for the routines to answer.
+// The noncentral mixture at w = df2/(df1 x + df2) < 1e-280 (ln w = lw):
+// P(F > x) = sum_j W(j) I_w(d, c + j), W(j) = e^-L L^j/j!, each I_w by its
+// leading term in logarithms, and P(F <= x) = sum_j W(j) (1 - I_w(d, c + j)),
+// positive terms of the order of d where d is tiny. NaN where a term is out
+// of reach.
+bool tinyWMixture(double lw, double c, double d, double L, double* lower, double* upper) {
+  const double spread = 40.0 * std::sqrt(L) + 40.0;
+  double lo = 0.0, up = 0.0;
+  for (double j = std::max(0.0, std::floor(L - spread)); j <= L + spread; j += 1.0) {
+    const double weight = saddle::poissonMass(j, L);
+    double lnTail = 0.0;
+    if (!tinyBetaLogLower(lw, d, c + j, &lnTail)) {
+      *lower = *upper = mQuietNaN();
+      return true;
+    }
+    up += weight * (lnTail < -708.39 ? 0.0 : std::exp(lnTail));
+    lo += weight * -std::expm1(lnTail);
+  }
+  *lower = std::min(lo, 1.0);
+  *upper = std::min(up, 1.0);
+  return true;
+}
+
 bool tinyBetaArgument(double x, double df1, double df2, double noncentrality, double* lower,
                       double* upper) {
   const double c = 0.5 * df1, d = 0.5 * df2, L = 0.5 * noncentrality;
@@ -121,8 +144,7 @@ bool tinyBetaArgument(double x, double df1, double df2, double noncentrality, do
   if (lnBound(lw, d, L > 0.0 ? top : c) < -760.0) {
     lnTail = -HUGE_VAL;
   } else if (L > 0.0) {
-    *lower = *upper = mQuietNaN();
-    return true;
+    return tinyWMixture(lw, c, d, L, lower, upper);
   } else if (!tinyBetaLogLower(lw, d, c, &lnTail)) {
     return false;
   }

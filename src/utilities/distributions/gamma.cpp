@@ -181,6 +181,40 @@ bool tinyGammaShape(double shape, double p) {
   return std::islessequal(shape, smallshape::kTinyShape) && shape >= DBL_MIN && p > 0.0 && p < 1.0;
 }
 
+// Both tails of the noncentral chi-square at df <= 2e-5 as the Poisson
+// mixtures sum_j W(j) P(df/2 + j, x/2) and sum_j W(j) Q(df/2 + j, x/2),
+// W(j) = e^-L L^j/j!, L = noncentrality/2, each a sum of positive terms with
+// both ratios taken directly (the tiny-shape series for j = 0): the ELV
+// routine forms the upper tail as a complement (2e-14 off at x = 1e-10).
+// False for L > 1e4 (long sums) or where a ratio is out of reach.
+bool tinyDfNoncentralChiSq(double x, double df, double noncentrality, double* lower,
+                           double* upper) {
+  const double L = 0.5 * noncentrality, z = 0.5 * x;
+  if (!(df >= 2.0 * DBL_MIN && df <= 2.0 * smallshape::kTinyShape && L > 0.0 && L <= 1e4 &&
+        z >= DBL_MIN && std::isfinite(z))) {
+    return false;
+  }
+  const double spread = 40.0 * std::sqrt(L) + 40.0, lz = std::log(z);
+  double lo = 0.0, up = 0.0;
+  for (double j = std::max(0.0, std::floor(L - spread)); j <= L + spread; j += 1.0) {
+    const double a = 0.5 * df + j;
+    double p = 0.0, q = 0.0;
+    if (j == 0.0) {
+      if (!smallshape::gammaTails(a, z, lz, &p, &q)) return false;
+    } else if (!gammaratio::tails(a, z, &p, &q)) {
+      // The direct tail lies below 1e-280: the one on the side of z.
+      p = z < a ? 0.0 : 1.0;
+      q = 1.0 - p;
+    }
+    const double w = saddle::poissonMass(j, L);
+    lo += w * p;
+    up += w * q;
+  }
+  *lower = std::min(lo, 1.0);
+  *upper = std::min(up, 1.0);
+  return true;
+}
+
 }  // namespace
 
 // --- Function objects ------------------------------------------------------
@@ -332,6 +366,18 @@ bool mChiSqCdf(double x, double df, double noncentrality, double* lower, double*
     return true;
   }
   if (noncentrality == 0.0 && gammaratio::fastTails(df / 2.0, x / 2.0, lower, upper)) return true;
+  if (noncentrality > 0.0 && tinyDfNoncentralChiSq(x, df, noncentrality, lower, upper)) return true;
+  if (noncentrality > 0.0 && x < 2.0 * smallshape::kTinyArgument && df >= 2.0 * DBL_MIN &&
+      smallShapeGammaTails(df / 2.0, x / 2.0, x, 2.0, true, lower, upper)) {
+    // Below 2e-280 only the first term of the Poisson mixture
+    // sum_j e^-L L^j/j! P(df/2 + j, x/2), L = noncentrality/2, counts (the
+    // next is smaller by x L/(df + 2)); the ELV routine underflows there.
+    const double L = 0.5 * noncentrality;
+    const double weight = L > 708.0 ? 0.0 : std::exp(-L);
+    *lower *= weight;
+    *upper = -std::expm1(-L) + weight * *upper;
+    return true;
+  }
   if (ElvFailed(elv_chi2_ncdf(x, df, noncentrality, lower, upper)) &&
       !large::noncentralChiSqTails(x, df, noncentrality, lower, upper)) {
     *lower = *upper = mGetMissingValueCode();

@@ -62,7 +62,7 @@ constexpr double kMixtureDeltaLimit = 1.25;
 // the squeeze's own scale.
 constexpr double kSqueeze = 2.0;
 // Smallest df taken here: the peak of the integral widens like 1/df.
-constexpr double kMinDf = 0.01;
+constexpr double kMinDf = kTinyDfLimit;
 // Below this x the tails are those at t = 0, and the backward walk's
 // division by x could overflow.
 constexpr double kTinyX = 1e-290;
@@ -283,6 +283,7 @@ double oppositeSignsIntegral(double t, double n, double delta) {
 }  // namespace
 
 bool tails(double t, double df, double delta, double* lower, double* upper) {
+  if (df < kTinyDfLimit) return tinyDfTails(t, df, delta, lower, upper);
   // Beyond these the walks and the integral grow long (or, for a delta
   // whose square underflows, have no weights to walk); the ELV routine
   // answers there.

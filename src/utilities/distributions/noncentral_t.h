@@ -13,6 +13,19 @@ namespace nct {
 // falls back on the ELV routine there).
 bool tails(double t, double df, double delta, double* lower, double* upper);
 
+// Below this df, tails() takes tinyDfTails().
+constexpr double kTinyDfLimit = 0.01;
+
+// tails() for 0 < df < kTinyDfLimit, any finite t and delta, by the
+// integral over the normal law of the tails of the chi-square part
+// (noncentral_t_tiny_df.cpp). False outside that range.
+bool tinyDfTails(double t, double df, double delta, double* lower, double* upper);
+
+// The density at t != 0 for 4 DBL_MIN <= df < kTinyDfLimit (NaN outside),
+// by the same integral, where the recurrence between distribution
+// functions at df and df + 2 cancels.
+double tinyDfDensity(double t, double df, double delta);
+
 }  // namespace nct
 }  // namespace qel
 

@@ -212,6 +212,9 @@ double mTPdf(double x, double df, double noncentrality) {
                               noncentrality * noncentrality / 2.0,
                           true);
     }
+    if (df < nct::kTinyDfLimit && elv::elvPrecision() == elv::ElvPrecision::Full) {
+      return nct::tinyDfDensity(x, df, noncentrality);
+    }
     const double f1 = mTCdf(x * std::sqrt((df + 2.0) / df), df + 2.0, noncentrality, false);
     const double f2 = mTCdf(x, df, noncentrality, false);
     if (mIsNumericMissing(f1) || mIsNumericMissing(f2)) return mGetMissingValueCode();
