@@ -78,6 +78,26 @@ TEST(StudentizedMaximum, TenDistinctLambdasMatchMpmath) {
   }
 }
 
+// Lambdas 0.99 to 0.9999 repeated up to 100 times, alone and mixed
+// (tools/reference/gen_studentized_maximum_near1.py): the narrow steps in z
+// of the factors, sharpened by their powers, set the z-lattice.
+TEST(StudentizedMaximum, RepeatedLambdasNearOneMatchReference) {
+  const auto rows = qeltest::loadReferenceData("studentized_maximum_near1_mp.csv", 2);
+  ASSERT_EQ(rows.size(), 120u);
+  for (const auto& row : rows) {
+    std::vector<double> l;
+    std::stringstream in(row.text[1]);
+    std::string group;
+    while (std::getline(in, group, '+')) {
+      const size_t star = group.find('*');
+      l.insert(l.end(), std::stoul(group.substr(star + 1)), std::stod(group.substr(0, star)));
+    }
+    const double p = pValue(row.text[0] == "mod", row.numbers[1], row.numbers[0], l);
+    EXPECT_LE(std::fabs(p - row.numbers[2]), 1e-9) << row.line;
+    EXPECT_LE(relativeError(p, row.numbers[2]), 1e-7) << row.line;
+  }
+}
+
 // The order of the lambdas does not matter; for the modulus neither does
 // their sign.
 TEST(StudentizedMaximum, LambdaOrderAndSign) {

@@ -258,14 +258,19 @@ double CmMaximumInner::zIntegral(double w) const {
     peakLo = first ? p : std::min(peakLo, p);
     peakHi = first ? p : std::max(peakHi, p);
     first = false;
-    narrowest = std::min(narrowest, f.c / std::sqrt(1.0 + 0.5 * std::log(f.m)));
+    narrowest = std::min(narrowest, f.c / std::sqrt(1.0 + std::log(f.m)));
   }
   // Each piece phi(z) (1 - F_j^m_j) is about as wide as a normal of sd c_j
   // (the curvature of log phi(z) Q((w - l z)/c) is 1/c^2 at its peak),
-  // narrowed by a power m_j (its step sharpens like sqrt(log m)). A step of
-  // 0.62 of that width holds the trapezoidal error below 1e-13 relative,
-  // also for ten distinct lambdas 0.9 to 0.99 (checked against steps a third
-  // as large).
+  // narrowed by a power m_j: near its step F^m = exp(-m Q(u)) is a Gumbel
+  // law in u = (w - l z)/c of scale 1/u*, m Q(u*) = 1, u*^2 ~ 2 log m, and
+  // the trapezoidal error falls like exp(-pi^2 / (h u*)) with the step h in
+  // u. The step 0.62 c/sqrt(1 + log m) keeps h u* below 0.9 for every m;
+  // with sqrt(1 + log(m)/2) h u* grew towards 1.24 and cost 8e-8 relative
+  // for 100 lambdas 0.99, where the z-width c/l of a factor is no wider than
+  // c. The error is below 1e-13 relative for ten distinct lambdas 0.9 to 0.99
+  // and 4e-10 for lambdas 0.99 to 0.9999 repeated up to 100 times (checked
+  // against steps a third as large and against mpmath).
   const double h = 0.62 * narrowest;
   // A normal tail beyond cut, summed over the k factors and the z-lattice
   // (whose weights sum to about 1), is below 1e-17 of the lower bound
