@@ -119,7 +119,7 @@ def lambda_lower(x, lam, m, s):
 def lambda_pdf(x, lam, m, s):
     # The lower tail by bisection on ln p (p near DBL_MIN), then 1 / (s Q'(p)).
     z = (x - m) / s
-    lo, hi = mpf(-800), mpf(0)
+    lo, hi = mpf(-1000000), mpf(0)
     for _ in range(400):
         mid = (lo + hi) / 2
         if lambda_q(mpmath.exp(mid), lam) < z:
@@ -238,6 +238,13 @@ CASES = [
      (1.6047995271775233e+288, 3.1101496755184713e-292)),
     ("HalfNormal", "inv", halfnormal_inv, 3.0e-300, (1.0, 0.0)),
     ("HalfNormal", "inv", halfnormal_inv, 9.9e-9, (1.0, 0.0)),
+    # Tukey lambda density whose lower tail is a denormal while a scale near
+    # DBL_MIN keeps the density an ordinary number
+    ("Lambda", "pdf", lambda_pdf, -4.87e-298, (0.001, 0.0, 1.0e-300)),
+    ("Lambda", "pdf", lambda_pdf, -1.5306e-305, (0.001, 0.0, 3.0e-308)),
+    ("Lambda", "pdf", lambda_pdf, -1.53e-305, (0.001, 0.0, 3.0e-308)),
+    ("Lambda", "pdf", lambda_pdf, -1.0e-297, (-0.001, 0.0, 1.0e-300)),
+    ("Lambda", "pdf", lambda_pdf, -9.5e-298, (-0.001, 0.0, 1.0e-300)),
     # central t density at a df whose half is subnormal
     ("T", "pdf", t_pdf, 1.0, (3.0e-308, 0.0)),
     ("T", "pdf", t_pdf, 1.0e-154, (3.0e-308, 0.0)),

@@ -124,12 +124,44 @@ double CmLambdaTransform::operator()(double p) {
 
 // At lambda < 0 the powers refuse p = 0 or p = 1 (zero to a negative power);
 // that failure, like an overflow, gives the prepared missing value.
+namespace {
+
+// The density where the lower tail p at w = -|z| is below 1e-290, for lambda
+// below 1: there (1 - p)^lambda = 1 to double precision, so p^lambda =
+// 1 + lambda w and ln p = ln(1 + lambda w) / lambda, and p^(lambda - 1) is
+// the whole of Q'(p): f = p^(1 - lambda) / scale, formed as one exponential.
+// The plain form would meet p below DBL_MIN as a denormal, read as zero by
+// the armed state, while a scale near DBL_MIN can make the density an
+// ordinary number (it gave 3424.8 for 711.3). False where p is not that small.
+bool tinyTailDensity(double w, double lambda, double scale, double* density) {
+  if (!(lambda < 1.0)) return false;
+  const double t = lambda > 0.0 || w > -1e10 ? lambda * w : 0.0;
+  if (t <= -1.0) {
+    *density = 0.0;  // the end of a bounded support
+    return true;
+  }
+  // lambda w beyond 1e10 (lambda < 0): ln(lambda w) + ln(1 + 1/(lambda w)).
+  const double logOnePlus = lambda < 0.0 && w <= -1e10
+                                ? std::log(-lambda) + std::log(-w) + std::log1p(1.0 / lambda / w)
+                                : std::log1p(t);
+  const double logP = logOnePlus / lambda;
+  if (!(logP < -667.0)) return false;
+  const double logDensity = (1.0 - lambda) * logP - std::log(scale);
+  if (logDensity > 709.0) return false;
+  *density = logDensity < -745.0 ? 0.0 : std::exp(logDensity);
+  return true;
+}
+
+}  // namespace
+
 double mLambdaPdf(double x, double lambda, double location, double scale) {
   double result = mGetMissingValueCode();
   try {
     const double z = mStandardize(x, location, scale);
     if (isLogisticLimit(lambda)) return mLogisticPdf(x, location, scale);
     if (lambda > 0.0 && (z < -1.0 / lambda || z > 1.0 / lambda)) return 0.0;
+    double tiny = 0.0;
+    if (tinyTailDensity(-std::fabs(z), lambda, scale, &tiny)) return tiny;
     // The density is symmetric: search on the lower side, where p is small
     // and carries its full relative accuracy into p^(lambda - 1).
     const double p = lambdaLowerTail(-std::fabs(z), lambda);
