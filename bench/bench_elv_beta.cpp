@@ -8,7 +8,7 @@
 #include <boost/math/distributions/binomial.hpp>
 #include <boost/math/distributions/non_central_beta.hpp>
 #include <boost/math/distributions/non_central_f.hpp>
-#include <boost/math/special_functions/beta.hpp>
+#include <boost/math/higher_functions/beta.hpp>
 #include <vector>
 
 namespace {

@@ -7,7 +7,7 @@
 #include <qel/elv.h>
 
 #include <boost/math/distributions/non_central_chi_squared.hpp>
-#include <boost/math/special_functions/gamma.hpp>
+#include <boost/math/higher_functions/gamma.hpp>
 #include <cmath>
 #include <vector>
 

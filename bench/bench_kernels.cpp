@@ -12,7 +12,7 @@
 #include <boost/math/distributions/normal.hpp>
 #include <boost/math/distributions/poisson.hpp>
 #include <boost/math/distributions/students_t.hpp>
-#include <boost/math/special_functions/gamma.hpp>
+#include <boost/math/higher_functions/gamma.hpp>
 #include <vector>
 
 #include "utilities/distributions/kernels.h"

@@ -3,13 +3,13 @@
 // the same points, in the default floating-point state.
 #include <benchmark/benchmark.h>
 
-#include <boost/math/special_functions/beta.hpp>
-#include <boost/math/special_functions/gamma.hpp>
+#include <boost/math/higher_functions/beta.hpp>
+#include <boost/math/higher_functions/gamma.hpp>
 #include <cmath>
 #include <vector>
 
-#include "utilities/special_functions/incomplete_beta.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/incomplete_beta.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace {
 

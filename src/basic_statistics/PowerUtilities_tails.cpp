@@ -18,7 +18,7 @@
 
 #include "basic_statistics/PowerUtilities.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

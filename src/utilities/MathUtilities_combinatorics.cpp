@@ -5,7 +5,7 @@
 
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

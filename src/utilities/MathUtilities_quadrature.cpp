@@ -10,7 +10,7 @@
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
 #include "utilities/RootsAndOptima.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace {

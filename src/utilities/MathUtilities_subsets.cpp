@@ -2,7 +2,7 @@
 #include <cmath>
 
 #include "utilities/MathUtilities.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

@@ -9,8 +9,8 @@
 
 #include "reference_data.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/special_functions/incomplete_beta.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/incomplete_beta.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace {
 

@@ -11,7 +11,7 @@
 
 #include "reference_data.h"
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace {
 

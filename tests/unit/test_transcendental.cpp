@@ -12,9 +12,9 @@
 #include <vector>
 
 #include "reference_data.h"
-#include "utilities/special_functions/double_double.h"
-#include "utilities/special_functions/incomplete_beta.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/double_double.h"
+#include "utilities/higher_functions/incomplete_beta.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace {
 

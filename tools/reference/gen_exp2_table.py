@@ -3,7 +3,7 @@
 hi + lo equal to the value to about 1e-32, for the double-double exponential.
 
 Run from the repository root:
-  python3 tools/reference/gen_exp2_table.py > src/utilities/special_functions/exp2_table.inc
+  python3 tools/reference/gen_exp2_table.py > src/utilities/higher_functions/exp2_table.inc
 """
 from mpmath import mp, mpf
 

@@ -16,7 +16,7 @@
 #include "interfaces/basic_statistics/fits.h"
 #include "interfaces/basic_statistics/utilities.h"
 #include "interfaces/math/random_distributions_v1.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace {

@@ -7,7 +7,7 @@
 #include <limits>
 
 #include "interfaces/basic_statistics/utilities.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace {

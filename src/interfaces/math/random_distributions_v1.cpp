@@ -6,7 +6,7 @@
 
 #include "interfaces/math/transcendental_v1.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/special_functions/incomplete_beta.h"
+#include "utilities/higher_functions/incomplete_beta.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/MathUtilities.h"
 

@@ -12,7 +12,7 @@
 #include "interfaces/math/rngs_sampling.h"
 #include "utilities/LYNBasicTypes.h"
 #include "utilities/distributions/classes.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace {

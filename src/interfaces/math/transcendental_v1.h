@@ -1,6 +1,6 @@
 // Helpers of the v1 distribution layer: NaN instead of exceptions.
-#ifndef QEL_SRC_INTERFACES_MATH_SPECIAL_FUNCTIONS_V1_H
-#define QEL_SRC_INTERFACES_MATH_SPECIAL_FUNCTIONS_V1_H
+#ifndef QEL_SRC_INTERFACES_MATH_HIGHER_FUNCTIONS_V1_H
+#define QEL_SRC_INTERFACES_MATH_HIGHER_FUNCTIONS_V1_H
 
 namespace qel {
 namespace v1 {

@@ -5,7 +5,7 @@
 #include <exception>
 
 #include "utilities/elv/precision.h"
-#include "utilities/special_functions/incomplete_beta.h"
+#include "utilities/higher_functions/incomplete_beta.h"
 
 namespace qel {
 namespace betaratio {

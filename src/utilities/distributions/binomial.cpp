@@ -22,7 +22,7 @@
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/special_functions/incomplete_beta.h"
+#include "utilities/higher_functions/incomplete_beta.h"
 
 namespace qel {
 

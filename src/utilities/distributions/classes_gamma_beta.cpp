@@ -17,8 +17,8 @@
 #include "utilities/MathUtilities.h"
 #include "utilities/distributions/classes.h"
 #include "utilities/distributions/kernels.h"
-#include "utilities/special_functions/incomplete_beta.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/incomplete_beta.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

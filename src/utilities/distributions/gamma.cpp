@@ -25,7 +25,7 @@
 #include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

@@ -7,7 +7,7 @@
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/elv/limits.h"
 #include "utilities/elv/precision.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace gammaratio {

@@ -12,7 +12,7 @@
 #include "utilities/MathUtilities.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/standardize.h"
-#include "utilities/special_functions/double_double.h"
+#include "utilities/higher_functions/double_double.h"
 
 namespace qel {
 

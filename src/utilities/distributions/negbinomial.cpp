@@ -18,7 +18,7 @@
 #include "utilities/distributions/discrete_rules.h"
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/saddle_density.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

@@ -39,8 +39,8 @@
 
 #include "utilities/distributions/saddle_density.h"
 #include "utilities/elv/normal_precise.h"
-#include "utilities/special_functions/incomplete_beta.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/incomplete_beta.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace nct {

@@ -16,7 +16,7 @@
 #include "utilities/distributions/tail_quantile.h"
 #include "utilities/elv/limits.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

@@ -14,9 +14,9 @@
 #include <cmath>
 
 #include "utilities/elv/precision.h"
-#include "utilities/special_functions/double_double.h"
-#include "utilities/special_functions/incomplete_beta.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/double_double.h"
+#include "utilities/higher_functions/incomplete_beta.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace seriesquantile {

@@ -6,7 +6,7 @@
 #include <utility>
 
 #include "utilities/distributions/saddle_density.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace smallshape {

@@ -8,7 +8,7 @@
 #include <algorithm>
 #include <cmath>
 
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace studentized {

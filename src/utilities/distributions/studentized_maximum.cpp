@@ -46,7 +46,7 @@
 #include "utilities/distributions/normal_range.h"
 #include "utilities/distributions/studentized_common.h"
 #include "utilities/distributions/studentized_maximum_inner.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace {

@@ -35,7 +35,7 @@
 #include "utilities/distributions/kernels.h"
 #include "utilities/distributions/normal_range.h"
 #include "utilities/distributions/studentized_common.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace {

@@ -24,7 +24,7 @@
 #include "utilities/elv/normal_precise.h"
 #include "utilities/elv/precision.h"
 #include "utilities/elv/wrappers.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

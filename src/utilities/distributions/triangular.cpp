@@ -8,7 +8,7 @@
 
 #include "utilities/CheckedFunctions.h"
 #include "utilities/distributions/kernels.h"
-#include "utilities/special_functions/double_double.h"
+#include "utilities/higher_functions/double_double.h"
 
 namespace qel {
 

@@ -16,8 +16,8 @@
 
 #include <cmath>
 
-#include "utilities/special_functions/double_double.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/double_double.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 namespace elv {

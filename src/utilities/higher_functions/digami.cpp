@@ -7,7 +7,7 @@
 #include <stdexcept>
 
 #include "utilities/LYNBasicTypes.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

@@ -4,7 +4,7 @@
 #include <cmath>
 #include <limits>
 
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

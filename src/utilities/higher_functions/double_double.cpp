@@ -4,7 +4,7 @@
 // a = (32 m + j) ln2/32 + r with |r| <= ln2/64, e^a = 2^m 2^(j/32) e^r.
 // The reduction and the leading terms 1 + r are carried in double-double;
 // the rest of the series, at most r^2/2 < 6e-5, needs only double precision.
-#include "utilities/special_functions/double_double.h"
+#include "utilities/higher_functions/double_double.h"
 
 #include <cmath>
 
@@ -12,7 +12,7 @@ namespace qel {
 namespace {
 
 const DoubleDouble kExp2Table[32] = {
-#include "utilities/special_functions/exp2_table.inc"
+#include "utilities/higher_functions/exp2_table.inc"
 };
 
 }  // namespace

@@ -8,7 +8,7 @@
 #include <cmath>
 #include <stdexcept>
 
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

@@ -6,8 +6,8 @@
 // multiply-add is assumed, so the code is exact on any IEEE double machine.
 // Operands stay far from overflow in the callers (the split multiplies by
 // 2^27 + 1).
-#ifndef QEL_SRC_UTILITIES_SPECIAL_FUNCTIONS_DOUBLE_DOUBLE_H
-#define QEL_SRC_UTILITIES_SPECIAL_FUNCTIONS_DOUBLE_DOUBLE_H
+#ifndef QEL_SRC_UTILITIES_HIGHER_FUNCTIONS_DOUBLE_DOUBLE_H
+#define QEL_SRC_UTILITIES_HIGHER_FUNCTIONS_DOUBLE_DOUBLE_H
 
 namespace qel {
 

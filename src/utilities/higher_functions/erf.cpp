@@ -3,7 +3,7 @@
 // |x| > 4, coefficients as published (stored highest power first).
 #include <cmath>
 
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 

@@ -5,8 +5,8 @@
 #include <algorithm>
 #include <cmath>
 
-#include "utilities/special_functions/incomplete_beta.h"
-#include "utilities/special_functions/transcendental.h"
+#include "utilities/higher_functions/incomplete_beta.h"
+#include "utilities/higher_functions/transcendental.h"
 
 namespace qel {
 
